@@ -27,9 +27,6 @@ void PnicImpl::GetPauseParams(PnicPauseParams&) const {
 void PnicImpl::GetDriverInfo(PnicDriverInfo&) const {
   Unavailable();
 }
-void PnicImpl::GetHwCapabilities(PnicHwCapabilities&) const {
-  Unavailable();
-}
 void PnicImpl::SetPnicInfo(const PnicInfo&) {
   Unavailable();
 }
@@ -48,10 +45,11 @@ std::vector<PnicAttachment> PnicImpl::GetAttachments() const {
 void PnicImpl::GetPnicStats(PnicStats&) const {
   Unavailable();
 }
-std::string PnicImpl::GetHwCapName(int) {
+void PnicImpl::SetSpeedDuplex(uint32_t, uint32_t) {
   Unavailable();
 }
-void PnicImpl::SetSpeedDuplex(uint32_t, uint32_t) {
+
+void PnicImpl::SetPauseParams(const PnicPauseParams&) {
   Unavailable();
 }
 

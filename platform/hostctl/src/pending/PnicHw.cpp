@@ -36,9 +36,6 @@ void PnicImpl::GetRingParams(PnicRingParams&, PnicRingParams&) const {
 void PnicImpl::SetRingParams(const PnicRingParams&) {
   Unavailable();
 }
-void PnicImpl::SetPauseParams(const PnicPauseParams&) {
-  Unavailable();
-}
 void PnicImpl::GetNetqueueInfo(PnicNetqueueInfo&) const {
   Unavailable();
 }
@@ -64,6 +61,13 @@ void PnicImpl::GetRegisterDump(std::vector<uint32_t>&) const {
   Unavailable();
 }
 void PnicImpl::RunSelfTest(PnicSelfTestResult&, bool) {
+  Unavailable();
+}
+
+void PnicImpl::GetHwCapabilities(PnicHwCapabilities&) const {
+  Unavailable();
+}
+std::string PnicImpl::GetHwCapName(int) {
   Unavailable();
 }
 
