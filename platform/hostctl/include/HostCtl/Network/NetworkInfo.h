@@ -1,0 +1,48 @@
+//===- HostCtl/Network/NetworkInfo.h - The host's network information -----===//
+//
+// The root through which commands reach the host's network objects. Each
+// area adds its operations in its own section below.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "HostCtl/Network/Pnic.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace HostCtl::Network {
+
+class NetworkInfo {
+public:
+  virtual ~NetworkInfo() = default;
+
+  // --- Physical NICs.
+  /// Every physical NIC, in the host's order (both selection codes select all).
+  virtual std::vector<std::unique_ptr<Pnic>> GetPnics(PnicGetType type) = 0;
+  /// The NIC of that name, or null.
+  virtual std::unique_ptr<Pnic> GetPnicByName(const std::string& name) = 0;
+
+  // --- SR-IOV.
+
+  // --- Netstacks and the kernel IPv6 switch.
+
+  // --- Kernel interfaces.
+
+  // --- Port groups.
+
+  // --- ENS contexts.
+};
+
+/// Opens network roots and looks up switching objects by name.
+class NetworkFactory {
+public:
+  /// The network information root, owned by the caller.
+  static std::unique_ptr<NetworkInfo> GetNetworkInfo();
+
+  // --- Switching lookups.
+};
+
+} // namespace HostCtl::Network

@@ -1,0 +1,29 @@
+//===- TvkCtl/Network/NetworkInfoImpl.h - Network root of the host --------===//
+#pragma once
+
+#include "HostCtl/Network/NetworkInfo.h"
+
+namespace TvkCtl::Network {
+
+class NetworkInfoImpl : public HostCtl::Network::NetworkInfo {
+public:
+  NetworkInfoImpl();
+  ~NetworkInfoImpl() override;
+
+  // --- Physical NICs.
+  std::vector<std::unique_ptr<HostCtl::Network::Pnic>>
+  GetPnics(HostCtl::Network::PnicGetType type) override;
+  std::unique_ptr<HostCtl::Network::Pnic> GetPnicByName(const std::string& name) override;
+
+  // --- SR-IOV.
+
+  // --- Netstacks and the kernel IPv6 switch.
+
+  // --- Kernel interfaces.
+
+  // --- Port groups.
+
+  // --- ENS contexts.
+};
+
+} // namespace TvkCtl::Network

@@ -1,0 +1,280 @@
+//===- model/CorePart.cpp - Tables shared by every area of the host --------===//
+//
+// The core part owns the tables that several areas read: host-wide settings,
+// declared faults, physical NICs, and the skeleton of the switching world
+// (switches, uplinks, port groups, distributed ports, ports, worlds) and of
+// the IP world (netstacks, kernel interfaces and their addresses). Other parts
+// add side tables keyed by these; they do not change these tables' layout.
+//
+// Import of the shared tables is done by the part that owns the description
+// keys (vswitches by the switching part, interfaces by the IP part, ...); the
+// core part imports "faults" and the basic fields of "nics".
+//
+//===----------------------------------------------------------------------===//
+#include "model/CoreModel.h"
+
+#include "HostCtl/Lib.h"
+#include "HostCtl/Network/Address.h"
+#include "model/JsonRead.h"
+#include "model/Part.h"
+
+namespace Model {
+
+using nlohmann::ordered_json;
+
+namespace {
+
+const char* const kCoreSchema = R"sql(
+-- Host-wide values by key (each area names its own keys).
+CREATE TABLE setting(key TEXT PRIMARY KEY, value TEXT NOT NULL) WITHOUT ROWID;
+
+-- Declared faults: `operation` on `object` (or on every object with "*")
+-- throws `message`.
+CREATE TABLE fault(operation TEXT NOT NULL, object TEXT NOT NULL, message TEXT NOT NULL);
+
+-- Physical NICs. A NIC without PCI function has pci_address NULL and a
+-- pseudo-device description. `link_up` is the carrier of the PHY; the
+-- effective link is up when the NIC is administratively up and has carrier.
+CREATE TABLE pnic(
+  name TEXT PRIMARY KEY,
+  ord INTEGER NOT NULL,
+  pci_address TEXT,
+  vendor TEXT NOT NULL DEFAULT '',
+  device TEXT NOT NULL DEFAULT '',
+  pseudo_desc TEXT NOT NULL DEFAULT '',
+  driver TEXT NOT NULL DEFAULT '',
+  admin_up INTEGER NOT NULL DEFAULT 1,
+  link_up INTEGER NOT NULL DEFAULT 1,
+  speed INTEGER NOT NULL DEFAULT 0,
+  duplex INTEGER NOT NULL DEFAULT 1,
+  mac TEXT NOT NULL,
+  mtu INTEGER NOT NULL DEFAULT 1500,
+  dpu_id TEXT
+) WITHOUT ROWID;
+
+-- Netstack instances (TCP/IP stacks of the kernel).
+CREATE TABLE netstack(
+  key TEXT PRIMARY KEY,
+  ord INTEGER NOT NULL,
+  name TEXT NOT NULL,
+  state INTEGER NOT NULL DEFAULT 4660,
+  max_conn INTEGER NOT NULL DEFAULT 11000,
+  cur_max_conn INTEGER NOT NULL DEFAULT 11000,
+  ccalgo TEXT NOT NULL DEFAULT 'newreno',
+  ipv6 INTEGER NOT NULL DEFAULT 1,
+  cur_ipv6 INTEGER NOT NULL DEFAULT 1,
+  ecn TEXT NOT NULL DEFAULT 'enabled',
+  predefined INTEGER NOT NULL DEFAULT 0
+) WITHOUT ROWID;
+
+-- Switches of every kind ("portsets").
+CREATE TABLE portset(
+  id INTEGER PRIMARY KEY,
+  name TEXT NOT NULL UNIQUE,
+  kind TEXT NOT NULL CHECK(kind IN ('standard', 'dvs', 'opaque')),
+  system INTEGER NOT NULL DEFAULT 0,
+  ord INTEGER NOT NULL,
+  num_ports INTEGER NOT NULL DEFAULT 128,
+  mtu INTEGER NOT NULL DEFAULT 1500
+);
+
+-- Uplinks of a switch, in order. A distributed switch may name uplinks that
+-- are not NICs of this host.
+CREATE TABLE uplink(
+  portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
+  nic TEXT NOT NULL,
+  ord INTEGER NOT NULL,
+  vlan_stats INTEGER NOT NULL DEFAULT 0,
+  PRIMARY KEY(portset_id, nic)
+) WITHOUT ROWID;
+
+-- Port groups of standard switches; names are unique on the host.
+CREATE TABLE portgroup(
+  id INTEGER PRIMARY KEY,
+  name TEXT NOT NULL UNIQUE,
+  portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
+  vlan_id INTEGER NOT NULL DEFAULT 0,
+  system INTEGER NOT NULL DEFAULT 0,
+  ord INTEGER NOT NULL
+);
+CREATE INDEX portgroup_by_portset ON portgroup(portset_id);
+
+-- Ports of distributed switches, by their port key (a string).
+CREATE TABLE dvport(
+  portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
+  port_key TEXT NOT NULL,
+  portgroup_key TEXT NOT NULL DEFAULT '',
+  connection_id INTEGER NOT NULL DEFAULT 0,
+  is_uplink INTEGER NOT NULL DEFAULT 0,
+  ord INTEGER NOT NULL,
+  PRIMARY KEY(portset_id, port_key)
+) WITHOUT ROWID;
+
+-- Virtual ports in use: each has one client (an uplink NIC, a kernel
+-- interface or a VM's adapter) and sits on a port group (standard switch) or
+-- a distributed port.
+CREATE TABLE port(
+  id INTEGER PRIMARY KEY,
+  portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
+  portgroup_id INTEGER REFERENCES portgroup(id),
+  dvport_key TEXT,
+  client_kind TEXT NOT NULL CHECK(client_kind IN ('uplink', 'tvknic', 'vm')),
+  client TEXT NOT NULL,
+  world_id INTEGER NOT NULL DEFAULT 0,
+  port_type INTEGER NOT NULL DEFAULT 0
+);
+CREATE INDEX port_by_portset ON port(portset_id);
+CREATE INDEX port_by_portgroup ON port(portgroup_id);
+CREATE INDEX port_by_world ON port(world_id);
+
+-- Worlds (processes) of the host that own ports: the VMs.
+CREATE TABLE world(id INTEGER PRIMARY KEY, name TEXT NOT NULL);
+
+-- Kernel network interfaces. The ipv4_* columns hold the running IPv4
+-- configuration (for DHCP the lease); ipv4_mode is 'static', 'dhcp' or 'none'.
+CREATE TABLE tvknic(
+  name TEXT PRIMARY KEY,
+  ord INTEGER NOT NULL,
+  netstack TEXT NOT NULL REFERENCES netstack(key),
+  port_id INTEGER REFERENCES port(id),
+  mac TEXT NOT NULL,
+  mtu INTEGER NOT NULL DEFAULT 1500,
+  enabled INTEGER NOT NULL DEFAULT 1,
+  system INTEGER NOT NULL DEFAULT 0,
+  ipv4_mode TEXT NOT NULL DEFAULT 'none',
+  ipv4_address TEXT NOT NULL DEFAULT '0.0.0.0',
+  ipv4_netmask TEXT NOT NULL DEFAULT '0.0.0.0',
+  ipv4_gateway TEXT NOT NULL DEFAULT '0.0.0.0'
+) WITHOUT ROWID;
+CREATE INDEX tvknic_by_netstack ON tvknic(netstack);
+
+-- IPv6 addresses of kernel interfaces, in order.
+CREATE TABLE tvknic_ipv6(
+  nic TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
+  address TEXT NOT NULL,
+  prefix INTEGER NOT NULL,
+  type INTEGER NOT NULL DEFAULT 0,
+  status INTEGER NOT NULL DEFAULT 0,
+  ord INTEGER NOT NULL,
+  PRIMARY KEY(nic, address, prefix)
+) WITHOUT ROWID;
+)sql";
+
+void ImportCore(const ordered_json& host, Store& store) {
+  JsonObject root(host, "");
+  for (const JsonObject& fault : root.Objects("faults")) {
+    store.Prepare("INSERT INTO fault(operation, object, message) VALUES(?, ?, ?)")
+        .BindAll(fault.String("operation"), fault.String("object", "*"), fault.String("message"))
+        .Run();
+  }
+  int ord = 0;
+  for (const JsonObject& nic : root.Objects("nics")) {
+    std::string name = nic.String("name");
+    if (name.empty())
+      nic.Fail("name", "must not be empty");
+    std::string mac = nic.String("mac");
+    if (!HostCtl::Network::MacAddress::IsValid(mac))
+      nic.Fail("mac", "expected a unicast MAC address such as 00:50:56:01:02:03");
+    Statement insert = store.Prepare(
+        "INSERT INTO pnic(name, ord, pci_address, vendor, device, pseudo_desc, driver, admin_up, "
+        "link_up, speed, duplex, mac, mtu, dpu_id) VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
+    insert.BindAll(name, ord++);
+    if (nic.Has("pciAddress"))
+      insert.Bind(3, nic.String("pciAddress"));
+    else
+      insert.BindNull(3);
+    insert.Bind(4, nic.String("vendor", ""))
+        .Bind(5, nic.String("device", ""))
+        .Bind(6, nic.String("pseudoDevice", ""))
+        .Bind(7, nic.String("driver", ""))
+        .Bind(8, nic.Bool("adminUp", true))
+        .Bind(9, nic.Bool("linkUp", true))
+        .Bind(10, nic.Int("speed", 0, 400000, 0))
+        .Bind(11, nic.Int("duplex", 0, 255, 1))
+        .Bind(12, HostCtl::Network::MacAddress(mac).GetStringAddress())
+        .Bind(13, nic.Int("mtu", 68, 9000, 1500));
+    if (nic.Has("dpuId"))
+      insert.Bind(14, nic.String("dpuId"));
+    else
+      insert.BindNull(14);
+    try {
+      insert.Run();
+    } catch (const HostCtl::Lib::HostCtlException&) {
+      nic.Fail("name", "\"" + name + "\" is used by another NIC");
+    }
+  }
+}
+
+void ExportCore(ordered_json& host, Store& store) {
+  ordered_json nics = ordered_json::array();
+  Statement rows = store.Prepare(
+      "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, speed, "
+      "duplex, mac, mtu, dpu_id FROM pnic ORDER BY ord");
+  while (rows.Step()) {
+    ordered_json nic = ordered_json::object();
+    nic["name"] = rows.Text(0);
+    if (!rows.IsNull(1))
+      nic["pciAddress"] = rows.Text(1);
+    nic["vendor"] = rows.Text(2);
+    nic["device"] = rows.Text(3);
+    if (!rows.Text(4).empty())
+      nic["pseudoDevice"] = rows.Text(4);
+    nic["driver"] = rows.Text(5);
+    nic["adminUp"] = rows.Bool(6);
+    nic["linkUp"] = rows.Bool(7);
+    nic["speed"] = rows.Int(8);
+    nic["duplex"] = rows.Int(9);
+    nic["mac"] = rows.Text(10);
+    nic["mtu"] = rows.Int(11);
+    if (!rows.IsNull(12))
+      nic["dpuId"] = rows.Text(12);
+    nics.push_back(std::move(nic));
+  }
+  host["nics"] = std::move(nics);
+  ordered_json faults = ordered_json::array();
+  Statement fault = store.Prepare("SELECT operation, object, message FROM fault ORDER BY rowid");
+  while (fault.Step())
+    faults.push_back(
+        {{"operation", fault.Text(0)}, {"object", fault.Text(1)}, {"message", fault.Text(2)}});
+  if (!faults.empty())
+    host["faults"] = std::move(faults);
+}
+
+} // namespace
+
+extern const Part kCorePart;
+const Part kCorePart = {
+    "core",
+    kCoreSchema,
+    {{"", {"nics", "faults"}},
+     {"nics",
+      {"name", "pciAddress", "vendor", "device", "pseudoDevice", "driver", "adminUp", "linkUp",
+       "speed", "duplex", "mac", "mtu", "dpuId"}},
+     {"faults", {"operation", "object", "message"}}},
+    ImportCore,
+    ExportCore,
+};
+
+int64_t AllocatePortId(Store& store) {
+  Statement next = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 FROM port");
+  next.Step();
+  return next.Int(0);
+}
+
+std::optional<std::string> GetSetting(Store& store, std::string_view key) {
+  Statement get = store.Prepare("SELECT value FROM setting WHERE key = ?");
+  get.Bind(1, key);
+  if (!get.Step())
+    return std::nullopt;
+  return get.Text(0);
+}
+
+void PutSetting(Store& store, std::string_view key, std::string_view value) {
+  store
+      .Prepare("INSERT INTO setting(key, value) VALUES(?, ?) "
+               "ON CONFLICT(key) DO UPDATE SET value = excluded.value")
+      .BindAll(key, value)
+      .Run();
+}
+
+} // namespace Model

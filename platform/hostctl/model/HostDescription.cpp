@@ -1,0 +1,182 @@
+//===- model/HostDescription.cpp - The JSON form of a whole host -----------===//
+#include "model/HostDescription.h"
+
+#include "HostCtl/Lib.h"
+#include "model/JsonRead.h"
+#include "model/Part.h"
+#include "model/Store.h"
+
+#include <cerrno>
+#include <cstring>
+#include <map>
+#include <set>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace Model {
+
+using nlohmann::ordered_json;
+
+namespace {
+
+/// The keys every part accepts, by collection.
+std::map<std::string, std::set<std::string>> KnownKeys() {
+  std::map<std::string, std::set<std::string>> known;
+  for (const Part* part : AllParts())
+    for (const PartKeys& keys : part->keys)
+      known[keys.collection].insert(keys.keys.begin(), keys.keys.end());
+  return known;
+}
+
+/// Refuses fields that no part reads, so that a typo in a host description is
+/// reported instead of silently ignored.
+void CheckKeys(const ordered_json& object, const std::string& collection, const std::string& path,
+               const std::map<std::string, std::set<std::string>>& known) {
+  if (!object.is_object())
+    throw ImportError((path.empty() ? std::string("the host description") : path) +
+                      ": expected an object");
+  auto allowed = known.find(collection);
+  for (const auto& [key, value] : object.items()) {
+    std::string where = path.empty() ? key : path + "." + key;
+    if (allowed == known.end() || !allowed->second.count(key))
+      throw ImportError(where + ": unknown field");
+    std::string child = collection.empty() ? key : collection + "." + key;
+    if (!known.count(child))
+      continue;
+    if (!value.is_array())
+      throw ImportError(where + ": expected an array of objects");
+    for (std::size_t i = 0; i < value.size(); ++i)
+      CheckKeys(value[i], child, where + "[" + std::to_string(i) + "]", known);
+  }
+}
+
+const ordered_json* IdentityOf(const ordered_json& element) {
+  if (!element.is_object())
+    return nullptr;
+  for (const char* key : {"name", "key"}) {
+    auto it = element.find(key);
+    if (it != element.end())
+      return &*it;
+  }
+  return nullptr;
+}
+
+} // namespace
+
+void MergeDescription(ordered_json& into, const ordered_json& fragment) {
+  if (into.is_object() && fragment.is_object()) {
+    for (const auto& [key, value] : fragment.items()) {
+      auto it = into.find(key);
+      if (it == into.end())
+        into[key] = value;
+      else
+        MergeDescription(*it, value);
+    }
+    return;
+  }
+  if (into.is_array() && fragment.is_array()) {
+    for (const ordered_json& element : fragment) {
+      const ordered_json* id = IdentityOf(element);
+      bool merged = false;
+      if (id) {
+        for (ordered_json& existing : into) {
+          const ordered_json* other = IdentityOf(existing);
+          if (other && *other == *id) {
+            MergeDescription(existing, element);
+            merged = true;
+            break;
+          }
+        }
+      }
+      if (!merged)
+        into.push_back(element);
+    }
+    return;
+  }
+  into = fragment;
+}
+
+void ImportHost(Store& store, const ordered_json& host) {
+  CheckKeys(host, "", "", KnownKeys());
+  store.Write([&] {
+    store.Exec("PRAGMA defer_foreign_keys=ON");
+    std::vector<std::string> tables;
+    {
+      Statement list = store.Prepare(
+          "SELECT name FROM sqlite_master WHERE type='table' AND name NOT LIKE 'sqlite_%'");
+      while (list.Step())
+        tables.push_back(list.Text(0));
+    }
+    for (const std::string& table : tables)
+      store.Exec(("DELETE FROM \"" + table + "\"").c_str());
+    for (const Part* part : AllParts())
+      part->importFn(host, store);
+  });
+}
+
+ordered_json ExportHost(Store& store) {
+  ordered_json host = ordered_json::object();
+  store.Read([&] {
+    for (const Part* part : AllParts())
+      part->exportFn(host, store);
+  });
+  return host;
+}
+
+std::vector<std::string> ProfileNames() {
+  return {"demo", "empty"};
+}
+
+ordered_json Profile(const std::string& name) {
+  if (name == "empty")
+    return ordered_json::object();
+  if (name != "demo")
+    throw ImportError("unknown profile \"" + name + "\" (known: demo, empty)");
+  ordered_json host = ordered_json::object();
+  for (std::string_view fragment : DemoProfileFragments())
+    MergeDescription(host, ordered_json::parse(fragment));
+  return host;
+}
+
+void CreateDemoHost(const std::string& path) {
+  std::size_t slash = path.find_last_of('/');
+  if (slash != std::string::npos && slash > 0) {
+    std::string dir = path.substr(0, slash);
+    std::string partial;
+    for (std::size_t pos = 0; pos != std::string::npos;) {
+      std::size_t next = dir.find('/', pos + 1);
+      partial = dir.substr(0, next);
+      if (!partial.empty())
+        ::mkdir(partial.c_str(), 0755);
+      pos = next;
+    }
+  }
+  // Build the host beside its final name and link it into place, so that a
+  // process that starts at the same moment never sees a half-made host.
+  std::string temp = path + ".new." + std::to_string(::getpid());
+  try {
+    std::unique_ptr<Store> store = Store::Create(temp);
+    ImportHost(*store, Profile("demo"));
+    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+  } catch (const ImportError& error) {
+    for (const char* suffix : {"", "-wal", "-shm"})
+      ::unlink((temp + suffix).c_str());
+    throw HostCtl::Lib::HostCtlException(std::string("The demo host cannot be built: ") +
+                                         error.what());
+  } catch (...) {
+    for (const char* suffix : {"", "-wal", "-shm"})
+      ::unlink((temp + suffix).c_str());
+    throw;
+  }
+  if (::link(temp.c_str(), path.c_str()) != 0 && errno != EEXIST) {
+    int error = errno;
+    for (const char* suffix : {"", "-wal", "-shm"})
+      ::unlink((temp + suffix).c_str());
+    throw HostCtl::Lib::HostCtlException("Cannot create the host state at " + path + ": " +
+                                         std::strerror(error));
+  }
+  for (const char* suffix : {"", "-wal", "-shm"})
+    ::unlink((temp + suffix).c_str());
+}
+
+} // namespace Model

@@ -1,0 +1,50 @@
+//===- model/Part.h - One part of the host model ---------------------------===//
+//
+// The host model is split into parts, one per area (NICs, switches, IP, ...).
+// A part owns some tables of the store and some keys of the JSON host
+// description; it creates its tables, imports its keys and exports them.
+// Parts are listed explicitly in Parts.cpp (no static registration).
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "model/Store.h"
+
+#include <nlohmann/json_fwd.hpp>
+
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace Model {
+
+/// Keys a part accepts in the objects of one collection of the host
+/// description. Collection "" is the top level of the document; any other
+/// name is a top-level array of objects (such as "nics"), or a nested array
+/// written as "parent.child" (such as "vswitches.portgroups").
+struct PartKeys {
+  std::string collection;        ///< Where the keys are accepted.
+  std::vector<std::string> keys; ///< The keys this part reads there.
+};
+
+/// One part of the host model.
+struct Part {
+  /// Short name, such as "nic".
+  const char* name;
+  /// SQL that creates the part's tables.
+  const char* schema;
+  /// The keys the part reads from the host description.
+  std::vector<PartKeys> keys;
+  /// Reads the part's keys from \p host into the store (inside the import's
+  /// write transaction). Parts import in list order; a part may rely on the
+  /// rows of the parts before it. Throws ImportError on a bad value.
+  void (*importFn)(const nlohmann::ordered_json& host, Store& store);
+  /// Adds the part's keys to \p host (inside a read transaction). Parts
+  /// export in list order and may add keys to objects made by earlier parts.
+  void (*exportFn)(nlohmann::ordered_json& host, Store& store);
+};
+
+/// All parts, in import order.
+const std::vector<const Part*>& AllParts();
+
+} // namespace Model

@@ -1,0 +1,49 @@
+//===- model/Parts.cpp - The list of model parts ---------------------------===//
+//
+// Parts import in this order, so a part may refer to rows of the parts listed
+// before it (kernel interfaces refer to port groups, VMs to switches, ...).
+//
+//===----------------------------------------------------------------------===//
+#include "model/Part.h"
+
+namespace Model {
+
+extern const Part kCorePart;
+
+// Physical NICs: information, counters, SR-IOV, attachments.
+
+// NIC hardware settings.
+
+// Switching: standard and distributed switches, port groups, policies, LACP.
+
+// IP: netstacks, kernel interfaces, addresses, tags, multicast.
+
+// IP services: routes, DNS, hosts, neighbours, connections, IPsec.
+
+// Datapath: VMs and their ports, port statistics, ENS.
+
+// Firewall.
+
+const std::vector<const Part*>& AllParts() {
+  static const std::vector<const Part*> parts = {
+      &kCorePart,
+
+      // Physical NICs.
+
+      // NIC hardware settings.
+
+      // Switching.
+
+      // IP.
+
+      // IP services.
+
+      // Datapath.
+
+      // Firewall.
+
+  };
+  return parts;
+}
+
+} // namespace Model

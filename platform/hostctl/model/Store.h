@@ -1,0 +1,169 @@
+//===- model/Store.h - The SQLite store of the simulated host --------------===//
+//
+// One SQLite database file holds one host. Every host operation runs in one
+// transaction: Read() for operations that only look, Write() for operations
+// that change the host (committed durably before Write returns). Statements
+// are prepared once per connection and reused.
+//
+// Failures of the store itself (missing, corrupt, read-only, full, locked for
+// longer than the busy timeout) surface as HostCtl::Lib::HostCtlException
+// with a clear message, like any refusal of the host.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <type_traits>
+
+struct sqlite3;
+struct sqlite3_stmt;
+
+namespace Model {
+
+class Store;
+
+/// A prepared statement in use; it is reset and its bindings cleared when the
+/// object goes away, so the cached statement can be used again.
+class Statement {
+public:
+  Statement(Store& store, sqlite3_stmt* stmt) : store_(&store), stmt_(stmt) {}
+  Statement(Statement&& other) noexcept;
+  Statement(const Statement&) = delete;
+  Statement& operator=(const Statement&) = delete;
+  ~Statement();
+
+  /// Binds parameter \p index (1-based).
+  Statement& Bind(int index, int64_t value);
+  Statement& Bind(int index, int value) { return Bind(index, static_cast<int64_t>(value)); }
+  Statement& Bind(int index, uint32_t value) { return Bind(index, static_cast<int64_t>(value)); }
+  Statement& Bind(int index, bool value) { return Bind(index, static_cast<int64_t>(value)); }
+  Statement& Bind(int index, std::string_view value);
+  Statement& Bind(int index, const std::string& value) {
+    return Bind(index, std::string_view(value));
+  }
+  Statement& Bind(int index, const char* value) { return Bind(index, std::string_view(value)); }
+  Statement& BindNull(int index);
+  /// Binds all arguments to parameters 1, 2, ...
+  template <typename... Args> Statement& BindAll(const Args&... args) {
+    int index = 0;
+    (Bind(++index, args), ...);
+    return *this;
+  }
+
+  /// Steps once; true when a row is available.
+  bool Step();
+  /// Steps to completion (statements that return no rows).
+  void Run();
+
+  int64_t Int(int column) const;
+  std::string Text(int column) const;
+  bool Bool(int column) const { return Int(column) != 0; }
+  bool IsNull(int column) const;
+  /// The column as text, or nothing for NULL.
+  std::optional<std::string> OptText(int column) const;
+
+private:
+  Store* store_;       ///< Owner of the connection, for error texts.
+  sqlite3_stmt* stmt_; ///< Cached statement; null after a move.
+};
+
+/// The open store of the host this process works on.
+class Store {
+public:
+  /// The host store of this process, opened on first use. Its path is
+  /// SetPath's, else $OSTRACLI_HOST, else DefaultPath(); the default path is
+  /// created from the demo profile when it does not exist, any other path must
+  /// exist.
+  static Store& Host();
+  /// Chooses the host database before first use (the --host option).
+  static void SetPath(const std::string& path);
+  /// ${XDG_STATE_HOME:-$HOME/.local/state}/ostracli/host.db
+  static std::string DefaultPath();
+  /// Closes the process's host store (the next Host() opens it again).
+  static void CloseHost();
+
+  /// Opens an existing store; throws HostCtlException when it cannot.
+  explicit Store(const std::string& path);
+  ~Store();
+  Store(const Store&) = delete;
+  Store& operator=(const Store&) = delete;
+
+  /// Creates a new, empty store file with every part's schema; fails when the
+  /// file exists.
+  static std::unique_ptr<Store> Create(const std::string& path);
+
+  /// Runs \p fn in a read transaction.
+  template <typename Fn> auto Read(Fn&& fn) -> decltype(fn()) {
+    Scope scope(*this, false);
+    if constexpr (std::is_void_v<decltype(fn())>) {
+      fn();
+      scope.Commit();
+    } else {
+      auto result = fn();
+      scope.Commit();
+      return result;
+    }
+  }
+  /// Runs \p fn in a write transaction, committed durably when \p fn returns
+  /// and rolled back when it throws.
+  template <typename Fn> auto Write(Fn&& fn) -> decltype(fn()) {
+    Scope scope(*this, true);
+    if constexpr (std::is_void_v<decltype(fn())>) {
+      fn();
+      scope.Commit();
+    } else {
+      auto result = fn();
+      scope.Commit();
+      return result;
+    }
+  }
+
+  /// A statement from the cache (prepared on first use).
+  Statement Prepare(const char* sql);
+  /// Runs SQL text that returns no rows (schema, pragmas).
+  void Exec(const char* sql);
+  int64_t LastInsertId() const;
+  int Changes() const;
+
+  /// Throws the fault the host description declares for \p operation on
+  /// \p object (or on "*"), if any.
+  void CheckFault(std::string_view operation, std::string_view object);
+
+  const std::string& GetPath() const { return path_; }
+  sqlite3* Handle() const { return db_; }
+  /// Throws HostCtlException describing SQLite result code \p rc.
+  [[noreturn]] void Fail(int rc, std::string_view doing) const;
+
+private:
+  /// One transaction; nested scopes join the outer one.
+  class Scope {
+  public:
+    Scope(Store& store, bool write);
+    ~Scope();
+    void Commit();
+
+  private:
+    Store& store_;
+    bool outer_;
+    bool done_ = false;
+  };
+
+  void LoadFaults();
+
+  struct Cache;
+  std::string path_;             ///< Database file.
+  sqlite3* db_ = nullptr;        ///< Connection.
+  std::unique_ptr<Cache> cache_; ///< Prepared statements and faults.
+  int depth_ = 0;                ///< Nesting of transaction scopes.
+  bool writing_ = false;         ///< The open transaction is a write.
+};
+
+/// Shorthand for Store::Host().CheckFault(...).
+void CheckFault(std::string_view operation, std::string_view object);
+
+} // namespace Model

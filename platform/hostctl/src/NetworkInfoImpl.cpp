@@ -1,0 +1,94 @@
+//===- NetworkInfoImpl.cpp - Physical NICs of the network root ------------===//
+#include "TvkCtl/Network/NetworkInfoImpl.h"
+
+#include "HostCtl/SmartNic.h"
+#include "TvkCtl/Network/PnicImpl.h"
+#include "model/Store.h"
+
+namespace TvkCtl::Network {
+
+bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
+
+using Model::Statement;
+using Model::Store;
+
+NetworkInfoImpl::NetworkInfoImpl() = default;
+NetworkInfoImpl::~NetworkInfoImpl() = default;
+
+std::vector<std::unique_ptr<HostCtl::Network::Pnic>>
+NetworkInfoImpl::GetPnics(HostCtl::Network::PnicGetType type) {
+  Store& store = Store::Host();
+  store.CheckFault("GetPnics", "*");
+  std::vector<std::unique_ptr<HostCtl::Network::Pnic>> nics;
+  store.Read([&] {
+    Statement rows = store.Prepare(
+        "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, "
+        "speed, duplex, mac, mtu FROM pnic ORDER BY ord");
+    while (rows.Step()) {
+      PnicData data;
+      data.name = rows.Text(0);
+      data.hasPci = !rows.IsNull(1);
+      data.pciAddress = rows.Text(1);
+      data.vendor = rows.Text(2);
+      data.device = rows.Text(3);
+      data.pseudoDevice = rows.Text(4);
+      data.driver = rows.Text(5);
+      data.adminUp = rows.Bool(6);
+      data.carrier = rows.Bool(7);
+      data.speed = static_cast<uint32_t>(rows.Int(8));
+      data.duplex = static_cast<uint32_t>(rows.Int(9));
+      data.mac = rows.Text(10);
+      data.mtu = static_cast<uint32_t>(rows.Int(11));
+      nics.push_back(std::make_unique<PnicImpl>(std::move(data)));
+    }
+  });
+  return nics;
+}
+
+std::unique_ptr<HostCtl::Network::Pnic> NetworkInfoImpl::GetPnicByName(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("GetPnicByName", name);
+  PnicData data;
+  bool found = store.Read([&] { return LoadPnicData(store, name, data); });
+  if (!found)
+    return nullptr;
+  return std::make_unique<PnicImpl>(std::move(data));
+}
+
+} // namespace TvkCtl::Network
+
+namespace HostCtl::Network {
+
+std::unique_ptr<NetworkInfo> NetworkFactory::GetNetworkInfo() {
+  return std::make_unique<TvkCtl::Network::NetworkInfoImpl>();
+}
+
+} // namespace HostCtl::Network
+
+namespace HostCtl::SmartNic {
+
+namespace {
+class SmartNicImpl : public SmartNic {
+public:
+  explicit SmartNicImpl(std::string id) : id_(std::move(id)) {}
+  std::string GetId() const override { return id_; }
+
+private:
+  std::string id_; ///< DPU identifier.
+};
+} // namespace
+
+std::unique_ptr<SmartNic> SmartNicInfo::GetSmartNicByPnic(const std::string& pnicName) {
+  Model::Store& store = Model::Store::Host();
+  store.CheckFault("GetSmartNicByPnic", pnicName);
+  return store.Read([&]() -> std::unique_ptr<SmartNic> {
+    Model::Statement row =
+        store.Prepare("SELECT dpu_id FROM pnic WHERE name = ? AND dpu_id IS NOT NULL");
+    row.Bind(1, pnicName);
+    if (!row.Step())
+      return nullptr;
+    return std::make_unique<SmartNicImpl>(row.Text(0));
+  });
+}
+
+} // namespace HostCtl::SmartNic
