@@ -1,10 +1,10 @@
 //===- StoreTest.cpp - The host store, descriptions and faults -------------===//
+#include "model/Store.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
 #include "model/CoreModel.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
-#include "model/Store.h"
 
 #include <gtest/gtest.h>
 
@@ -206,8 +206,8 @@ TEST(ProfileTest, FragmentsMergeByName) {
   EXPECT_THROW(Model::Profile("nope"), Model::ImportError);
 
   ordered_json into = ordered_json::parse(R"({"nics": [{"name": "a", "x": 1}], "k": 1})");
-  Model::MergeDescription(into, ordered_json::parse(
-                                    R"({"nics": [{"name": "a", "y": 2}, {"name": "b"}], "k": 2})"));
+  Model::MergeDescription(
+      into, ordered_json::parse(R"({"nics": [{"name": "a", "y": 2}, {"name": "b"}], "k": 2})"));
   EXPECT_EQ(into, ordered_json::parse(
                       R"({"nics": [{"name": "a", "x": 1, "y": 2}, {"name": "b"}], "k": 2})"));
 }

@@ -112,11 +112,11 @@ std::unique_ptr<CommandTree> CommandTree::Load(const std::string& directory) {
 namespace {
 
 struct GlobalOptions {
-  std::string formatter;                                     ///< --formatter, or "".
-  std::vector<std::pair<std::string, std::string>> params;   ///< --format-param, in order.
-  std::string hostPath;                                      ///< --host, or "".
-  bool help = false;                                         ///< --help or -h.
-  bool version = false;                                      ///< --version.
+  std::string formatter;                                   ///< --formatter, or "".
+  std::vector<std::pair<std::string, std::string>> params; ///< --format-param, in order.
+  std::string hostPath;                                    ///< --host, or "".
+  bool help = false;                                       ///< --help or -h.
+  bool version = false;                                    ///< --version.
 };
 
 /// Reads the global options in front of the command path; returns the index
@@ -176,10 +176,6 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
   return static_cast<int>(i);
 }
 
-bool IsMachineFormat(const std::string& name) {
-  return name == "json" || name == "xml" || name == "csv" || name == "keyvalue";
-}
-
 } // namespace
 
 int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
@@ -199,7 +195,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     out += "ostracli " OSTRA_VERSION "\n";
     for (const Plugin& plugin : tree.Plugins()) {
       std::string name = plugin.path.substr(plugin.path.find_last_of('/') + 1);
-      out += "plug-in " + name + (plugin.version.empty() ? "" : " " + plugin.version) + "\n";
+      out += (plugin.version.empty() ? name : plugin.version) + " (" + plugin.path + ")\n";
     }
     return ExitOk;
   }
@@ -232,8 +228,8 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   const bool machine = global.formatter == "json";
   if (node->GetType() == AutoCli::NamespaceKind) {
     if (!rest.empty() && !wantsHelp) {
-      err += "Error: " + rest[0] + " is not a command; \"ostracli " +
-             node->GetPathString(' ') + " --help\" lists the commands\n";
+      err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
+             " --help\" lists the commands\n";
       return ExitUsage;
     }
     out += machine ? NamespaceHelpJson(*node) : NamespaceHelpText(*node, HostStateText());
@@ -279,7 +275,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     if (!formatter)
       formatter = Format::MakeFormatter("simple");
     Format::Parameters params;
-    if (!IsMachineFormat(name))
+    if (!formatter->IsMachineFormat())
       for (const auto& [key, value] : command->GetDefaultOutputParameters())
         params.Set(key, value);
     for (const auto& [key, value] : global.params)

@@ -43,7 +43,7 @@ public:
 
 private:
   Fabrik::AutoCli::NamespaceNodePtr root_; ///< Root node; children are the plug-ins' trees.
-  std::vector<Plugin> plugins_;           ///< Loaded plug-ins, in load order.
+  std::vector<Plugin> plugins_;            ///< Loaded plug-ins, in load order.
 };
 
 /// Where ostracli looks for plug-ins: $OSTRACLI_PLUGIN_DIR, else
@@ -52,8 +52,8 @@ std::string DefaultPluginDirectory();
 
 /// Runs one command line (without the program name) on \p tree; writes the
 /// result to \p out and messages to \p err; returns the exit status.
-int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args,
-                   std::string& out, std::string& err);
+int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
+                   std::string& err);
 
 /// The whole program: loads the tree, runs argv, prints, returns the status.
 int RunHost(int argc, char** argv);
