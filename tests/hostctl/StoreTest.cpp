@@ -213,3 +213,29 @@ TEST(ProfileTest, FragmentsMergeByName) {
 }
 
 } // namespace
+
+namespace {
+
+TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
+  auto store = Make(TwoNics());
+  store->BeginBatch();
+  store->Write([&] { Model::PutSetting(*store, "a", "1"); });
+  EXPECT_THROW(store->Write([&] {
+    Model::PutSetting(*store, "b", "1");
+    throw HostCtlException("refused");
+  }),
+               HostCtlException);
+  store->Write([&] { Model::PutSetting(*store, "c", "1"); });
+  store->EndBatch(true);
+  Model::Store other(path_);
+  EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "a").has_value(); }));
+  EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "b").has_value(); }));
+  EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "c").has_value(); }));
+
+  store->BeginBatch();
+  store->Write([&] { Model::PutSetting(*store, "d", "1"); });
+  store->EndBatch(false);
+  EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "d").has_value(); }));
+}
+
+} // namespace

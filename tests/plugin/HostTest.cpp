@@ -194,3 +194,18 @@ TEST(HostTest, ExitStatusesAndEscapingExceptions) {
 }
 
 } // namespace
+
+namespace {
+
+TEST(BatchTest, SplitsLinesLikeAShell) {
+  std::vector<std::string> words;
+  ASSERT_TRUE(Ostra::SplitWords("  network ip hosts add -i 10.0.0.1 -n 'my host'  ", words));
+  EXPECT_EQ(words, (std::vector<std::string>{"network", "ip", "hosts", "add", "-i", "10.0.0.1",
+                                             "-n", "my host"}));
+  ASSERT_TRUE(Ostra::SplitWords(R"(a "b \"c\" d" e\ f '' "")", words));
+  EXPECT_EQ(words, (std::vector<std::string>{"a", "b \"c\" d", "e f", "", ""}));
+  EXPECT_FALSE(Ostra::SplitWords("a 'b", words));
+  EXPECT_FALSE(Ostra::SplitWords("a \"b", words));
+}
+
+} // namespace
