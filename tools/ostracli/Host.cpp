@@ -303,9 +303,11 @@ int RunHost(int argc, char** argv) {
     std::fprintf(stderr, "Error: %s\n", e.what());
     return ExitCommandError;
   }
+  // A first look at the global options finds the modes of the whole run;
+  // RunCommandLine reads them again (and reports their errors) for a command.
   GlobalOptions global;
-  std::string out, err;
-  int first = ParseGlobalOptions(args, global, err);
+  std::string out, err, ignored;
+  int first = ParseGlobalOptions(args, global, ignored);
   if (first >= 0 && global.complete) {
     out = Complete(*tree, std::vector<std::string>(args.begin() + first, args.end()));
     std::fwrite(out.data(), 1, out.size(), stdout);
