@@ -44,6 +44,10 @@ bool ParseInteger(const std::string& text, long& value) {
 
 namespace {
 
+/// No parameter of any command needs a longer text; refusing longer ones here
+/// keeps unbounded input away from every command and from the host state.
+constexpr std::size_t kMaxValueBytes = 4096;
+
 std::string Quote(const std::string& text) {
   // Keeps messages readable for long or binary input.
   std::string shown = text.size() > 64 ? text.substr(0, 64) + "..." : text;
@@ -97,6 +101,15 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
   }
   case String:
   case StringList:
+    if (value.size() > kMaxValueBytes) {
+      problem = "option " + name + ": the value is longer than " + std::to_string(kMaxValueBytes) +
+                " bytes";
+      return false;
+    }
+    if (!IsUtf8(value)) {
+      problem = "option " + name + ": the value is not valid UTF-8 text";
+      return false;
+    }
     if (constraint) {
       if (auto bad = constraint->CheckString(value)) {
         problem = "option " + name + ": " + *bad;
