@@ -12,11 +12,7 @@ namespace Fabrik::AutoCli {
 
 NamespaceNode::~NamespaceNode() = default;
 
-NamespaceNodePtr NamespaceNode::GetThis() {
-  return shared_from_this();
-}
-
-std::vector<std::string> NamespaceNode::GetPath() const {
+std::vector<std::string> NamespaceNode::PathOf() const {
   // Walk up to the root, which has no parent and whose own name is not part of
   // the path, then reverse.
   std::vector<std::string> path;
@@ -30,7 +26,7 @@ std::vector<std::string> NamespaceNode::GetPath() const {
   return {path.rbegin(), path.rend()};
 }
 
-std::string NamespaceNode::GetPathString(char separator) const {
+std::string NamespaceNode::PathStringOf(char separator) const {
   std::string text;
   for (const std::string& name : GetPath()) {
     if (!text.empty())
@@ -40,15 +36,7 @@ std::string NamespaceNode::GetPathString(char separator) const {
   return text;
 }
 
-bool NamespaceNode::HasNamespaceNode(const std::string& name) const {
-  return kids_.count(name) != 0;
-}
-
-std::vector<std::string> NamespaceNode::GetNamespaceNodeNames() const {
-  return order_;
-}
-
-std::vector<NamespaceNodePtr> NamespaceNode::GetNamespaceNodes() const {
+std::vector<NamespaceNodePtr> NamespaceNode::ChildrenOf() const {
   std::vector<NamespaceNodePtr> nodes;
   nodes.reserve(order_.size());
   for (const std::string& name : order_)
@@ -56,12 +44,12 @@ std::vector<NamespaceNodePtr> NamespaceNode::GetNamespaceNodes() const {
   return nodes;
 }
 
-NamespaceNodePtr NamespaceNode::GetNamespaceNode(const std::string& name) const {
+NamespaceNodePtr NamespaceNode::ChildOf(const std::string& name) const {
   auto it = kids_.find(name);
   return it == kids_.end() ? nullptr : it->second;
 }
 
-void NamespaceNode::RegisterNamespaceNode(NamespaceNodePtr node, const std::string& name) {
+void NamespaceNode::Register(NamespaceNodePtr node, const std::string& name) {
   if (!node)
     throw std::invalid_argument("cannot register an empty node as \"" + name + "\"");
   if (name.empty())
@@ -89,14 +77,14 @@ void NamespaceNode::RegisterNamespaceNode(NamespaceNodePtr node, const std::stri
   kids_[name] = std::move(node);
 }
 
-void NamespaceNode::RegisterNamespaceNode(NamespaceNodePtr node, char const* name) {
+void NamespaceNode::Register(NamespaceNodePtr node, char const* name) {
   if (!name)
     throw std::invalid_argument("cannot register a node without a name");
-  RegisterNamespaceNode(std::move(node), std::string(name));
+  Register(std::move(node), std::string(name));
 }
 
-NamespaceNodePtr NamespaceNode::ResolveNode(const std::vector<std::string>& words,
-                                            std::size_t& consumed) {
+NamespaceNodePtr NamespaceNode::Resolve(const std::vector<std::string>& words,
+                                        std::size_t& consumed) {
   NamespaceNodePtr node = GetThis();
   consumed = 0;
   while (consumed < words.size()) {
@@ -109,7 +97,7 @@ NamespaceNodePtr NamespaceNode::ResolveNode(const std::vector<std::string>& word
   return node;
 }
 
-NamespaceNodePtr NamespaceNode::SubNamespace(const std::string& name) {
+NamespaceNodePtr NamespaceNode::SubNamespaceOf(const std::string& name) {
   if (NamespaceNodePtr existing = GetNamespaceNode(name)) {
     if (existing->GetType() != NamespaceKind)
       throw std::invalid_argument("\"" + name + "\" is a command, not a namespace");
@@ -120,30 +108,11 @@ NamespaceNodePtr NamespaceNode::SubNamespace(const std::string& name) {
   return created;
 }
 
-NamespaceNodePtr NamespaceNode::GetDispatcher() {
-  return nullptr;
-}
-
-void NamespaceNode::SetParent(const NamespaceNodePtr& parent, const std::string& name) {
-  parent_ = parent;
-  name_ = name;
-}
-
-NamespaceNodePtr NamespaceNode::GetParent() const {
-  return parent_.lock();
-}
-
 NamespaceNodePtr Namespace::New() {
   return std::make_shared<Namespace>();
 }
 
-std::shared_ptr<CallSpec::InputSpec> CommandSpec::GetInputSpec() {
-  return GetInputSpecInternal();
-}
-
-std::shared_ptr<CallSpec::OutputSpec> CommandSpec::GetOutputSpec() {
-  return GetOutputSpecInternal();
-}
+CommandSpec::~CommandSpec() = default;
 
 void CommandSpec::SetDefaultOutputParameter(const std::string& key, const std::string& value) {
   for (auto& parameter : parameters_) {
@@ -157,9 +126,6 @@ void CommandSpec::SetDefaultOutputParameter(const std::string& key, const std::s
 
 Command::Command() = default;
 
-void Command::Execute(const std::shared_ptr<CallSpec::Input>& input,
-                      const std::shared_ptr<CallSpec::Output>& output) {
-  ExecuteInternal(input, output);
-}
+Command::~Command() = default;
 
 } // namespace Fabrik::AutoCli

@@ -34,27 +34,40 @@ public:
   NamespaceNode& operator=(const NamespaceNode&) = delete;
   virtual ~NamespaceNode();
 
-  virtual NamespaceNodePtr GetThis();
+  // The virtual operations are defined here, each forwarding to the library,
+  // so that a plug-in's command classes refer to them within the plug-in: the
+  // dynamic loader then has no symbol to look up for each of the hundreds of
+  // vtable entries when the plug-in is loaded.
+  virtual NamespaceNodePtr GetThis() { return shared_from_this(); }
   virtual NodeType GetType() const = 0;
   /// Names from the root (exclusive) down to this node.
-  virtual std::vector<std::string> GetPath() const;
-  virtual std::string GetPathString(char separator) const;
-  virtual bool HasNamespaceNode(const std::string& name) const;
-  virtual std::vector<std::string> GetNamespaceNodeNames() const;
-  virtual std::vector<NamespaceNodePtr> GetNamespaceNodes() const;
-  virtual NamespaceNodePtr GetNamespaceNode(const std::string& name) const;
-  virtual void RegisterNamespaceNode(NamespaceNodePtr node, const std::string& name);
-  virtual void RegisterNamespaceNode(NamespaceNodePtr node, char const* name);
+  virtual std::vector<std::string> GetPath() const { return PathOf(); }
+  virtual std::string GetPathString(char separator) const { return PathStringOf(separator); }
+  virtual bool HasNamespaceNode(const std::string& name) const { return kids_.count(name) != 0; }
+  virtual std::vector<std::string> GetNamespaceNodeNames() const { return order_; }
+  virtual std::vector<NamespaceNodePtr> GetNamespaceNodes() const { return ChildrenOf(); }
+  virtual NamespaceNodePtr GetNamespaceNode(const std::string& name) const { return ChildOf(name); }
+  virtual void RegisterNamespaceNode(NamespaceNodePtr node, const std::string& name) {
+    Register(std::move(node), name);
+  }
+  virtual void RegisterNamespaceNode(NamespaceNodePtr node, char const* name) {
+    Register(std::move(node), name);
+  }
   /// Follows \p words from this node; returns the deepest node reached and
   /// sets \p consumed to the number of words used.
   virtual NamespaceNodePtr ResolveNode(const std::vector<std::string>& words,
-                                       std::size_t& consumed);
+                                       std::size_t& consumed) {
+    return Resolve(words, consumed);
+  }
   /// The child namespace of that name, created when missing.
-  virtual NamespaceNodePtr SubNamespace(const std::string& name);
+  virtual NamespaceNodePtr SubNamespace(const std::string& name) { return SubNamespaceOf(name); }
   /// The command this node dispatches to, or null for a namespace.
-  virtual NamespaceNodePtr GetDispatcher();
-  virtual void SetParent(const NamespaceNodePtr& parent, const std::string& name);
-  virtual NamespaceNodePtr GetParent() const;
+  virtual NamespaceNodePtr GetDispatcher() { return nullptr; }
+  virtual void SetParent(const NamespaceNodePtr& parent, const std::string& name) {
+    parent_ = parent;
+    name_ = name;
+  }
+  virtual NamespaceNodePtr GetParent() const { return parent_.lock(); }
 
   void SetDescription(char const* description) { description_ = description; }
   void SetDescription(const std::string& description) { description_ = description; }
@@ -63,6 +76,15 @@ public:
   const std::string& GetName() const { return name_; }
 
 private:
+  std::vector<std::string> PathOf() const;
+  std::string PathStringOf(char separator) const;
+  std::vector<NamespaceNodePtr> ChildrenOf() const;
+  NamespaceNodePtr ChildOf(const std::string& name) const;
+  void Register(NamespaceNodePtr node, const std::string& name);
+  void Register(NamespaceNodePtr node, char const* name);
+  NamespaceNodePtr Resolve(const std::vector<std::string>& words, std::size_t& consumed);
+  NamespaceNodePtr SubNamespaceOf(const std::string& name);
+
   std::string description_;                      ///< Help text.
   std::string name_;                             ///< Name given by the parent.
   std::weak_ptr<NamespaceNode> parent_;          ///< Parent, if registered.
@@ -81,11 +103,12 @@ public:
 /// result is shown by default.
 class CommandSpec : public NamespaceNode {
 public:
+  ~CommandSpec() override;
   NodeType GetType() const override { return CommandKind; }
   NamespaceNodePtr GetDispatcher() override { return GetThis(); }
 
-  virtual std::shared_ptr<CallSpec::InputSpec> GetInputSpec();
-  virtual std::shared_ptr<CallSpec::OutputSpec> GetOutputSpec();
+  virtual std::shared_ptr<CallSpec::InputSpec> GetInputSpec() { return GetInputSpecInternal(); }
+  virtual std::shared_ptr<CallSpec::OutputSpec> GetOutputSpec() { return GetOutputSpecInternal(); }
 
   void SetDefaultOutputFormatter(const std::string& name) { formatter_ = name; }
   void SetDefaultOutputParameter(const std::string& key, const std::string& value);
@@ -109,9 +132,12 @@ private:
 class Command : public CommandSpec {
 public:
   Command();
+  ~Command() override;
   /// Runs the command: ExecuteInternal with the validated input.
   virtual void Execute(const std::shared_ptr<CallSpec::Input>& input,
-                       const std::shared_ptr<CallSpec::Output>& output);
+                       const std::shared_ptr<CallSpec::Output>& output) {
+    ExecuteInternal(input, output);
+  }
 
 protected:
   virtual void ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
