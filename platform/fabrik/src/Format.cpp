@@ -30,9 +30,12 @@ struct FormatterEntry {
 
 /// Every formatter, in the order FormatterNames lists them.
 constexpr FormatterEntry Formatters[] = {
-    {"simple", Detail::MakeSimpleFormatter}, {"table", Detail::MakeTableFormatter},
-    {"json", Detail::MakeJsonFormatter},     {"xml", Detail::MakeXmlFormatter},
-    {"csv", Detail::MakeCsvFormatter},       {"keyvalue", Detail::MakeKeyValueFormatter},
+    {"simple", Detail::MakeSimpleFormatter},     // "Field: value" lines and blocks.
+    {"table", Detail::MakeTableFormatter},       // Aligned columns.
+    {"json", Detail::MakeJsonFormatter},         // Machine format: JSON.
+    {"xml", Detail::MakeXmlFormatter},           // Machine format: typed XML.
+    {"csv", Detail::MakeCsvFormatter},           // Machine format: RFC 4180 records.
+    {"keyvalue", Detail::MakeKeyValueFormatter}, // Machine format: path=value lines.
 };
 
 std::string Trim(const std::string& text) {
@@ -303,9 +306,9 @@ std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos) {
   std::size_t length = 0;
   unsigned low = 0x80; // Accepted range of the second byte.
   unsigned high = 0xBF;
-  if (lead < 0x80) {
+  if (lead < 0x80)
     return 1;
-  } else if (within(lead, 0xC2, 0xDF)) {
+  if (within(lead, 0xC2, 0xDF)) {
     length = 2;
   } else if (within(lead, 0xE0, 0xEF)) {
     length = 3;

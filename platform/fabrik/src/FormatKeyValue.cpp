@@ -41,6 +41,7 @@ std::string Segment(const std::string& name) {
   return Escape(name, ".[]=");
 }
 
+/// Writes the lines of a result, counting them to tell empty containers.
 class KeyValueWriter {
 public:
   KeyValueWriter(std::ostream& out, const Parameters& params) : out_(out), params_(params) {}
@@ -80,6 +81,7 @@ public:
   }
 
 private:
+  /// Writes one "PATH.TYPE=VALUE" line; an empty path leaves out the ".".
   void Line(const std::string& path, const char* type, const std::string& value) {
     if (!path.empty())
       out_ << path << '.';

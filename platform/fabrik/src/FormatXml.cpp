@@ -80,11 +80,13 @@ std::string Escape(const std::string& text) {
   return escaped;
 }
 
+/// True for a boolean, integer or string, which is written on one line.
 bool IsScalar(const MetaObjectPtr& value) {
   const MetaObj::MetaType type = value->GetType();
   return type != MetaObj::Struct && type != MetaObj::List;
 }
 
+/// Writes the elements of a result, one per line, indented by level.
 class XmlWriter {
 public:
   XmlWriter(std::ostream& out, const Parameters& params) : out_(out), params_(params) {}
