@@ -80,3 +80,8 @@ TEST(JsonFormatTest, EscapesAndRepairsStrings) {
   EXPECT_EQ(parsed["Key \"1\""], "q\"b\\c\n\t\x01\x7f/");
   EXPECT_EQ(parsed["Valid"], "\xC3\xA9\xE2\x82\xAC\xF0\x9F\x98\x80");
 }
+
+TEST(JsonFormatTest, ReadsBackAsTheResult) {
+  for (const auto& [name, root] : Samples())
+    EXPECT_EQ(nlohmann::ordered_json::parse(Render("json", root)), Expected(root)) << name;
+}

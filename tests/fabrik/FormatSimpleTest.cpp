@@ -5,12 +5,14 @@ using namespace FormatTest;
 
 TEST(FormatterTableTest, KnowsItsNamesOnly) {
   EXPECT_EQ(Fabrik::Format::FormatterNames(),
-            (std::vector<std::string>{"simple", "table", "json"}));
+            (std::vector<std::string>{"simple", "table", "json", "xml", "csv", "keyvalue"}));
   for (const std::string& name : Fabrik::Format::FormatterNames())
     EXPECT_NE(Fabrik::Format::MakeFormatter(name), nullptr) << name;
   EXPECT_EQ(Fabrik::Format::MakeFormatter("Simple"), nullptr);
   EXPECT_EQ(Fabrik::Format::MakeFormatter("xml-ish"), nullptr);
-  EXPECT_TRUE(Fabrik::Format::MakeFormatter("json")->IsMachineFormat());
+  for (const char* name : {"json", "xml", "csv", "keyvalue"})
+    EXPECT_TRUE(Fabrik::Format::MakeFormatter(name)->IsMachineFormat()) << name;
+  EXPECT_FALSE(Fabrik::Format::MakeFormatter("simple")->IsMachineFormat());
   EXPECT_FALSE(Fabrik::Format::MakeFormatter("table")->IsMachineFormat());
 }
 

@@ -142,7 +142,9 @@ std::string NamespaceHelpText(const AutoCli::NamespaceNode& node, const std::str
     out = "Usage: ostracli [options] {namespace}+ {cmd} [cmd options]\n\n"
           "Options:\n";
     Columns(out, "--formatter=NAME",
-            "Output formatter: simple, table, json (the command's default when not given).", 28);
+            "Output formatter: simple, table, json, xml, csv,\n"
+            "keyvalue (the command's default when not given).",
+            28);
     Columns(out, "--format-param=KEY=VALUE",
             "Formatter parameter, repeatable, e.g. fields=Name,MTU or show-header=false.", 28);
     Columns(out, "--host=PATH", "The host state database to work on.", 28);

@@ -2,7 +2,7 @@
 //
 // The table of formatter names, the parameter container, and the rules that
 // several formatters share: which fields are shown, how a value reads as one
-// line of text, header lines and units.
+// line of text, header lines and units, UTF-8 checks and type names.
 //
 //===----------------------------------------------------------------------===//
 #include "FormatInternal.h"
@@ -30,9 +30,12 @@ struct FormatterEntry {
 
 /// Every formatter, in the order FormatterNames lists them.
 constexpr FormatterEntry Formatters[] = {
-    {"simple", Detail::MakeSimpleFormatter},
-    {"table", Detail::MakeTableFormatter},
-    {"json", Detail::MakeJsonFormatter},
+    {"simple", Detail::MakeSimpleFormatter},     // "Field: value" lines and blocks.
+    {"table", Detail::MakeTableFormatter},       // Aligned columns.
+    {"json", Detail::MakeJsonFormatter},         // Machine format: JSON.
+    {"xml", Detail::MakeXmlFormatter},           // Machine format: typed XML.
+    {"csv", Detail::MakeCsvFormatter},           // Machine format: RFC 4180 records.
+    {"keyvalue", Detail::MakeKeyValueFormatter}, // Machine format: path=value lines.
 };
 
 std::string Trim(const std::string& text) {
@@ -132,7 +135,7 @@ SelectFields(const MetaStruct& value, const Parameters& params, bool atRoot, Sty
       if (!list)
         list = params.Find(fieldsKey);
       break;
-    case Style::Json:
+    case Style::Machine:
       list = params.Find(fieldsKey);
       break;
     }
@@ -290,6 +293,88 @@ std::size_t DisplayWidth(const std::string& text) {
   return static_cast<std::size_t>(std::count_if(text.begin(), text.end(), [](char c) {
     return (static_cast<unsigned char>(c) & 0xC0) != 0x80;
   }));
+}
+
+std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos) {
+  auto byte = [&](std::size_t i) -> unsigned {
+    return pos + i < text.size() ? static_cast<unsigned char>(text[pos + i]) : 0x100;
+  };
+  auto within = [](unsigned value, unsigned low, unsigned high) {
+    return value >= low && value <= high;
+  };
+  const unsigned lead = byte(0);
+  std::size_t length = 0;
+  unsigned low = 0x80; // Accepted range of the second byte.
+  unsigned high = 0xBF;
+  if (lead < 0x80)
+    return 1;
+  if (within(lead, 0xC2, 0xDF)) {
+    length = 2;
+  } else if (within(lead, 0xE0, 0xEF)) {
+    length = 3;
+    if (lead == 0xE0)
+      low = 0xA0;
+    else if (lead == 0xED)
+      high = 0x9F;
+  } else if (within(lead, 0xF0, 0xF4)) {
+    length = 4;
+    if (lead == 0xF0)
+      low = 0x90;
+    else if (lead == 0xF4)
+      high = 0x8F;
+  } else {
+    return 0;
+  }
+  if (!within(byte(1), low, high))
+    return 0;
+  for (std::size_t i = 2; i < length; ++i) {
+    if (!within(byte(i), 0x80, 0xBF))
+      return 0;
+  }
+  return length;
+}
+
+std::string ValidUtf8(const std::string& text) {
+  std::string valid;
+  valid.reserve(text.size());
+  std::size_t pos = 0;
+  while (pos < text.size()) {
+    if (std::size_t length = Utf8SequenceLength(text, pos)) {
+      valid.append(text, pos, length);
+      pos += length;
+    } else {
+      valid += "\xEF\xBF\xBD";
+      ++pos;
+    }
+  }
+  return valid;
+}
+
+const char* TypeName(MetaObj::MetaType type) {
+  switch (type) {
+  case MetaObj::Boolean:
+    return "boolean";
+  case MetaObj::Integer:
+    return "integer";
+  case MetaObj::String:
+    return "string";
+  case MetaObj::Struct:
+    return "structure";
+  case MetaObj::List:
+    return "list";
+  }
+  return "string";
+}
+
+const std::string* ElementStructName(const MetaList& list) {
+  const MetaObjectPtr& element = list.GetElementTemplate();
+  if (element && element->GetType() == MetaObj::Struct)
+    return &static_cast<const MetaStruct&>(*element).GetName();
+  for (const MetaObjectPtr& item : list.GetItems()) {
+    if (item && item->GetType() == MetaObj::Struct)
+      return &static_cast<const MetaStruct&>(*item).GetName();
+  }
+  return nullptr;
 }
 
 } // namespace Detail

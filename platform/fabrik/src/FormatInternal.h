@@ -24,9 +24,13 @@ namespace Fabrik::Format::Detail {
 std::unique_ptr<Formatter> MakeSimpleFormatter();
 std::unique_ptr<Formatter> MakeTableFormatter();
 std::unique_ptr<Formatter> MakeJsonFormatter();
+std::unique_ptr<Formatter> MakeXmlFormatter();
+std::unique_ptr<Formatter> MakeCsvFormatter();
+std::unique_ptr<Formatter> MakeKeyValueFormatter();
 
 /// Which formatter asks; the order of the keys that select fields differs.
-enum class Style { Simple, Table, Json };
+/// Machine is every machine format: "json", "xml", "csv" and "keyvalue".
+enum class Style { Simple, Table, Machine };
 
 /// Writes \p root as the "simple" formatter does; "table" falls back to it.
 void WriteSimple(std::ostream& out, const MetaObj::MetaObjectPtr& root, const Parameters& params);
@@ -69,5 +73,28 @@ bool BoolParameter(const Parameters& params, const std::string& key, bool fallba
 /// The number of characters of UTF-8 text (bytes that do not continue a
 /// sequence).
 std::size_t DisplayWidth(const std::string& text);
+
+/// The length of the well-formed UTF-8 sequence at \p pos of \p text, or 0
+/// when the byte there does not start one (ASCII bytes are sequences of 1).
+/// Overlong forms, surrogates and code points above U+10FFFF are not
+/// well-formed.
+std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos);
+
+/// \p text with each byte that is not part of a well-formed UTF-8 sequence
+/// replaced by U+FFFD.
+std::string ValidUtf8(const std::string& text);
+
+/// The name of a type in the machine formats: "boolean", "integer",
+/// "string", "structure" or "list".
+const char* TypeName(MetaObj::MetaType type);
+
+/// The name of the structures of a list: the element template's name, else
+/// that of the first structure item; null when it has neither.
+const std::string* ElementStructName(const MetaObj::MetaList& list);
+
+/// \p value as JSON on one line, without blanks ({"A":1,"B":["x"]}), with
+/// the fields of nested structures selected as "json" selects them below the
+/// root. An unset or null value is "null".
+std::string CompactJson(const MetaObj::MetaObjectPtr& value, const Parameters& params);
 
 } // namespace Fabrik::Format::Detail

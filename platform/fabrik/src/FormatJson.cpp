@@ -1,12 +1,14 @@
 //===- FormatJson.cpp - The "json" formatter --------------------------------===//
 //
-// A small pretty-printing JSON writer over typed values. The layout is
-// described in Fabrik/Format.h.
+// A small JSON writer over typed values: pretty-printed for the "json"
+// formatter, on one line for the cells of "csv". The layout is described in
+// Fabrik/Format.h.
 //
 //===----------------------------------------------------------------------===//
 #include "FormatInternal.h"
 
 #include <ostream>
+#include <sstream>
 
 namespace Fabrik::Format::Detail {
 
@@ -21,46 +23,6 @@ namespace {
 
 /// Blanks of indent per nesting level.
 constexpr std::size_t IndentStep = 2;
-
-/// The length of the well-formed UTF-8 sequence at \p pos of \p text, or 0
-/// when the byte there does not start one. Overlong forms, surrogates and
-/// code points above U+10FFFF are not well-formed.
-std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos) {
-  auto byte = [&](std::size_t i) -> unsigned {
-    return pos + i < text.size() ? static_cast<unsigned char>(text[pos + i]) : 0x100;
-  };
-  auto within = [](unsigned value, unsigned low, unsigned high) {
-    return value >= low && value <= high;
-  };
-  const unsigned lead = byte(0);
-  std::size_t length = 0;
-  unsigned low = 0x80; // Accepted range of the second byte.
-  unsigned high = 0xBF;
-  if (within(lead, 0xC2, 0xDF)) {
-    length = 2;
-  } else if (within(lead, 0xE0, 0xEF)) {
-    length = 3;
-    if (lead == 0xE0)
-      low = 0xA0;
-    else if (lead == 0xED)
-      high = 0x9F;
-  } else if (within(lead, 0xF0, 0xF4)) {
-    length = 4;
-    if (lead == 0xF0)
-      low = 0x90;
-    else if (lead == 0xF4)
-      high = 0x8F;
-  } else {
-    return 0;
-  }
-  if (!within(byte(1), low, high))
-    return 0;
-  for (std::size_t i = 2; i < length; ++i) {
-    if (!within(byte(i), 0x80, 0xBF))
-      return 0;
-  }
-  return length;
-}
 
 void WriteString(std::ostream& out, const std::string& text) {
   static const char Hex[] = "0123456789abcdef";
@@ -88,9 +50,12 @@ void WriteString(std::ostream& out, const std::string& text) {
   out << '"';
 }
 
+/// Writes JSON values either pretty-printed (one item or member per line) or
+/// compact (one line, no blanks).
 class JsonWriter {
 public:
-  JsonWriter(std::ostream& out, const Parameters& params) : out_(out), params_(params) {}
+  JsonWriter(std::ostream& out, const Parameters& params, bool pretty)
+      : out_(out), params_(params), pretty_(pretty) {}
 
   /// Writes \p value; the caller has written the indent of its first line.
   void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
@@ -119,44 +84,56 @@ public:
   }
 
 private:
+  /// Starts the next item or member of a container at \p indent.
+  void Separate(bool first, std::size_t indent) {
+    if (!first)
+      out_ << ',';
+    if (pretty_)
+      out_ << '\n' << std::string(indent, ' ');
+  }
+
+  /// Ends a non-empty container whose opening line is at \p indent.
+  void Close(char bracket, std::size_t indent) {
+    if (pretty_)
+      out_ << '\n' << std::string(indent, ' ');
+    out_ << bracket;
+  }
+
   void Array(const MetaList& list, std::size_t indent, bool atRoot) {
-    if (list.GetItems().empty()) {
-      out_ << "[]";
-      return;
-    }
-    const std::string inner(indent + IndentStep, ' ');
-    out_ << "[\n";
+    out_ << '[';
     bool first = true;
     for (const MetaObjectPtr& item : list.GetItems()) {
-      if (!first)
-        out_ << ",\n";
+      Separate(first, indent + IndentStep);
       first = false;
-      out_ << inner;
       Value(item, indent + IndentStep, atRoot);
     }
-    out_ << '\n' << std::string(indent, ' ') << ']';
+    if (first)
+      out_ << ']';
+    else
+      Close(']', indent);
   }
 
   void Object(const MetaStruct& value, std::size_t indent, bool atRoot) {
-    const std::string inner(indent + IndentStep, ' ');
+    out_ << '{';
     bool first = true;
-    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Json)) {
+    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine)) {
       if (!IsShown(field->value))
         continue;
-      out_ << (first ? "{\n" : ",\n") << inner;
+      Separate(first, indent + IndentStep);
       first = false;
       WriteString(out_, field->name);
-      out_ << ": ";
+      out_ << (pretty_ ? ": " : ":");
       Value(field->value, indent + IndentStep, false);
     }
     if (first)
-      out_ << "{}";
+      out_ << '}';
     else
-      out_ << '\n' << std::string(indent, ' ') << '}';
+      Close('}', indent);
   }
 
   std::ostream& out_;        ///< Destination.
   const Parameters& params_; ///< Formatter parameters.
+  bool pretty_;              ///< One item or member per line, indented.
 };
 
 class JsonFormatter final : public Formatter {
@@ -165,7 +142,7 @@ public:
              const Parameters& params) const override {
     if (!root)
       return;
-    JsonWriter writer(out, params);
+    JsonWriter writer(out, params, /*pretty=*/true);
     writer.Value(root, 0, /*atRoot=*/true);
     out << '\n';
   }
@@ -173,6 +150,13 @@ public:
 };
 
 } // namespace
+
+std::string CompactJson(const MetaObjectPtr& value, const Parameters& params) {
+  std::ostringstream out;
+  JsonWriter writer(out, params, /*pretty=*/false);
+  writer.Value(value, 0, /*atRoot=*/false);
+  return out.str();
+}
 
 std::unique_ptr<Formatter> MakeJsonFormatter() {
   return std::make_unique<JsonFormatter>();

@@ -3,8 +3,8 @@
 // The formatters turn a command's result (a typed value of MetaObj.h) into
 // text. The command host picks one by name and passes it the formatter
 // parameters: the command's default output parameters with the user's
-// --format-param values applied over them (for machine formats such as "json",
-// only the user's own values).
+// --format-param values applied over them (for the machine formats "json",
+// "xml", "csv" and "keyvalue", only the user's own values).
 //
 // Parameters
 // ----------
@@ -26,7 +26,8 @@
 //   units:S.F        A unit appended, after one blank, to each non-empty value
 //                    of field F of S ("simple" and "table").
 //   wrap-last        "true": "table" wraps its last column (below).
-//   show-header      "false": "table" shows no column names and no dashes.
+//   show-header      "false": "table" shows no column names and no dashes;
+//                    "csv" writes no header record.
 //
 // Boolean values accept true/false, 1/0, yes/no and on/off in any case; other
 // texts leave the default (wrap-last false, show-header true).
@@ -36,9 +37,11 @@
 //             (root only), else all fields in their order.
 //   "table":  fields (root only), table-columns:S, table-columns (root only),
 //             fields:S, else all fields in their order.
-//   "json":   fields (root only), fields:S, else all fields in their order.
+//   "json", "xml", "csv", "keyvalue":
+//             fields (root only), fields:S, else all fields in their order.
 // A field that is unset (a template scalar never given a value) is left out
-// everywhere; in a table its cell is empty.
+// everywhere; in a table or a csv record its cell is empty. The machine
+// formats read no other parameter than these and show-header ("csv").
 //
 // "simple"
 // --------
@@ -120,6 +123,113 @@
 // as \u00XX. Valid UTF-8 passes through unchanged; each byte that is not part
 // of a well-formed UTF-8 sequence becomes \ufffd.
 //
+// "xml"
+// -----
+// An XML 1.0 document in UTF-8 in which every value names its type. After the
+// declaration, the element <output> holds the root value; an unset scalar at
+// the root gives "<output/>". The values:
+//
+//   <boolean>true</boolean>         true or false
+//   <integer>-5</integer>           decimal
+//   <string>text</string>           the text, escaped (below)
+//   <list type="T">...</list>       its items in order, each an element of
+//                                   its own; T is the element type: "string",
+//                                   "structure" (also "boolean", "integer" or
+//                                   "list" for lists of those)
+//   <structure typeName="S">        a structure named S: one <field> per
+//     <field name="F">...</field>   shown, set field, in order, holding the
+//   </structure>                    field's value
+//
+// An empty list or structure is written as one empty-element tag, e.g.
+// <list type="string"/>. An unset item of a list is left out. Each element is
+// on a line of its own, indented by two blanks per level, except that a
+// scalar is written on the line of its <field>; blanks between elements carry
+// no meaning:
+//
+//   <?xml version="1.0" encoding="UTF-8"?>
+//   <output>
+//     <list type="structure">
+//       <structure typeName="Nic">
+//         <field name="Name"><string>vmnic0</string></field>
+//         <field name="Speed"><integer>25000</integer></field>
+//         <field name="Uplinks">
+//           <list type="string">
+//             <string>vmnic0</string>
+//           </list>
+//         </field>
+//       </structure>
+//     </list>
+//   </output>
+//
+// Text and attribute values write &, <, > and " as &amp; &lt; &gt; &quot;,
+// and tab, line feed and carriage return as &#9; &#10; &#13;, so that a
+// parser returns them unchanged. Characters that XML 1.0 does not allow (the
+// other control characters below U+0020, U+FFFE and U+FFFF) and each byte that
+// is not part of a well-formed UTF-8 sequence become U+FFFD.
+//
+// "csv"
+// -----
+// Comma-separated values as RFC 4180 describes them, in UTF-8: every record
+// ends with CR LF; a field holding a comma, a double quote, a CR or a LF is
+// enclosed in double quotes, with each double quote in it doubled; line
+// breaks inside a quoted field stay as they are. A record whose only field is
+// empty is written "" so that it does not read as a blank line.
+//
+//   A structure       a header record of the shown field names, then one
+//                     record of their values.
+//   A list of         the same header, then one record per structure. The
+//   structures        columns are the shown fields of the element template
+//                     and then any other shown field of the rows, in order of
+//                     first appearance; an empty list gives the header alone.
+//   A list of         a header record "Value", then one record per item.
+//   strings           (Unset items of any list are left out.)
+//   A scalar          one record of one field: the value. An unset scalar at
+//                     the root writes nothing.
+//
+// With show-header=false the header record is left out. A cell holds a
+// boolean as true/false, an integer in decimal, a string as it stands, an
+// unset or missing field as nothing, and a nested structure or list as
+// one-line JSON without blanks, laid out as "json" lays out its values (a list
+// of strings ["vmnic0","vmnic1"], a structure {"Enabled":true,"Peak":100}),
+// which is unambiguous whatever the text holds. Bytes that are not
+// well-formed UTF-8 become U+FFFD.
+//
+//   Name,Speed,Uplinks,Description
+//   vmnic0,25000,"[""vmnic0"",""vmnic1""]","Dual port, ""25G"""
+//   vmnic1,-1,[],
+//
+// "keyvalue"
+// ----------
+// One line "PATH.TYPE=VALUE" per scalar, in the order "json" writes them;
+// lines end with LF. TYPE is "boolean", "integer" or "string". PATH names
+// the value:
+//
+//   - the root is named after its structure: a structure at the root by its
+//     own name, a list at the root by the name of its element template (or of
+//     its first structure item); a scalar or a list of strings at the root has
+//     an empty name, and the "." after an empty PATH is left out;
+//   - a field of a structure adds "." and the field's name;
+//   - an item of a list adds "[I]", I counting items from 0. Unset items are
+//     left out and keep their numbers.
+//
+//   Nic[0].Name.string=vmnic0
+//   Nic[0].Speed.integer=25000
+//   Nic[0].Link Up.boolean=true
+//   Nic[0].Uplinks[1].string=vmnic1
+//   Nic[0].Driver.Firmware.Version.string=2.1
+//   Nic[1].Uplinks.list=
+//   boolean=true                     (a boolean at the root)
+//   [0].string=a                     (a list of strings at the root)
+//
+// An empty list, or a list whose items are all unset, writes "PATH.list="; a
+// structure with no shown, set field writes "PATH.structure=", so that they
+// stay apart from unset fields. Names are written as they stand, blanks
+// included. The key ends at the first "=" without a backslash before it.
+// In names and values, a backslash is written "\\", a line feed "\n" and a
+// carriage return "\r"; in names, ".", "[", "]" and "=" also take a backslash
+// before them. Nothing else is escaped. Bytes that are not well-formed UTF-8
+// become U+FFFD.
+//
 //===----------------------------------------------------------------------===//
 #pragma once
 
@@ -154,8 +264,9 @@ public:
   /// Writes \p root (which may be null: nothing is written) to \p out.
   virtual void Write(std::ostream& out, const MetaObj::MetaObjectPtr& root,
                      const Parameters& params) const = 0;
-  /// True for formats meant for programs rather than people ("json"); the
-  /// command host passes them only the parameters the user gave.
+  /// True for formats meant for programs rather than people ("json", "xml",
+  /// "csv", "keyvalue"); the command host passes them only the parameters
+  /// the user gave.
   virtual bool IsMachineFormat() const { return false; }
 };
 

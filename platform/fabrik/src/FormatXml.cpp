@@ -1,0 +1,194 @@
+//===- FormatXml.cpp - The "xml" formatter ----------------------------------===//
+//
+// Writes a result as an XML 1.0 document in which every value keeps its type.
+// The schema is described in Fabrik/Format.h.
+//
+//===----------------------------------------------------------------------===//
+#include "FormatInternal.h"
+
+#include <ostream>
+
+namespace Fabrik::Format::Detail {
+
+using MetaObj::MetaList;
+using MetaObj::MetaObjectPtr;
+using MetaObj::MetaStruct;
+
+namespace {
+
+/// Blanks of indent per nesting level.
+constexpr std::size_t IndentStep = 2;
+
+/// U+FFFD, written in place of what XML 1.0 cannot carry.
+constexpr const char* Replacement = "\xEF\xBF\xBD";
+
+/// \p text escaped for element content and double-quoted attribute values.
+/// Markup characters become entities; tab, line feed and carriage return
+/// become character references, so that parsers keep them as they are; the
+/// other control characters, U+FFFE, U+FFFF and bytes that are not well-formed
+/// UTF-8 become U+FFFD, as XML 1.0 does not allow them.
+std::string Escape(const std::string& text) {
+  std::string escaped;
+  escaped.reserve(text.size());
+  std::size_t pos = 0;
+  while (pos < text.size()) {
+    const char c = text[pos];
+    const std::size_t length = Utf8SequenceLength(text, pos);
+    if (length == 0) {
+      escaped += Replacement;
+      ++pos;
+      continue;
+    }
+    if (length == 1) {
+      switch (c) {
+      case '&':
+        escaped += "&amp;";
+        break;
+      case '<':
+        escaped += "&lt;";
+        break;
+      case '>':
+        escaped += "&gt;";
+        break;
+      case '"':
+        escaped += "&quot;";
+        break;
+      case '\t':
+        escaped += "&#9;";
+        break;
+      case '\n':
+        escaped += "&#10;";
+        break;
+      case '\r':
+        escaped += "&#13;";
+        break;
+      default:
+        if (static_cast<unsigned char>(c) < 0x20)
+          escaped += Replacement;
+        else
+          escaped += c;
+        break;
+      }
+    } else if (text.compare(pos, length, "\xEF\xBF\xBE") == 0 ||
+               text.compare(pos, length, "\xEF\xBF\xBF") == 0) {
+      escaped += Replacement;
+    } else {
+      escaped.append(text, pos, length);
+    }
+    pos += length;
+  }
+  return escaped;
+}
+
+/// True for a boolean, integer or string, which is written on one line.
+bool IsScalar(const MetaObjectPtr& value) {
+  const MetaObj::MetaType type = value->GetType();
+  return type != MetaObj::Struct && type != MetaObj::List;
+}
+
+/// Writes the elements of a result, one per line, indented by level.
+class XmlWriter {
+public:
+  XmlWriter(std::ostream& out, const Parameters& params) : out_(out), params_(params) {}
+
+  /// Writes the element of a shown \p value on lines of its own at \p indent.
+  void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
+    const std::string pad(indent, ' ');
+    switch (value->GetType()) {
+    case MetaObj::Boolean:
+    case MetaObj::Integer:
+    case MetaObj::String:
+      out_ << pad;
+      Scalar(*value);
+      out_ << '\n';
+      return;
+    case MetaObj::List:
+      List(static_cast<const MetaList&>(*value), indent, atRoot);
+      return;
+    case MetaObj::Struct:
+      Structure(static_cast<const MetaStruct&>(*value), indent, atRoot);
+      return;
+    }
+  }
+
+private:
+  /// Writes <boolean>, <integer> or <string> with its text, on the current line.
+  void Scalar(const MetaObj::MetaObject& value) {
+    const char* name = TypeName(value.GetType());
+    out_ << '<' << name << '>' << Escape(ScalarText(value)) << "</" << name << '>';
+  }
+
+  void List(const MetaList& list, std::size_t indent, bool atRoot) {
+    const std::string pad(indent, ' ');
+    out_ << pad << "<list type=\"" << TypeName(list.GetElementType()) << '"';
+    bool first = true;
+    for (const MetaObjectPtr& item : list.GetItems()) {
+      if (!IsShown(item))
+        continue;
+      if (first)
+        out_ << ">\n";
+      first = false;
+      Value(item, indent + IndentStep, atRoot);
+    }
+    if (first)
+      out_ << "/>\n";
+    else
+      out_ << pad << "</list>\n";
+  }
+
+  void Structure(const MetaStruct& value, std::size_t indent, bool atRoot) {
+    const std::string pad(indent, ' ');
+    const std::string inner(indent + IndentStep, ' ');
+    out_ << pad << "<structure typeName=\"" << Escape(value.GetName()) << '"';
+    bool first = true;
+    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine)) {
+      if (!IsShown(field->value))
+        continue;
+      if (first)
+        out_ << ">\n";
+      first = false;
+      out_ << inner << "<field name=\"" << Escape(field->name) << "\">";
+      if (IsScalar(field->value)) {
+        Scalar(*field->value);
+      } else {
+        out_ << '\n';
+        Value(field->value, indent + 2 * IndentStep, false);
+        out_ << inner;
+      }
+      out_ << "</field>\n";
+    }
+    if (first)
+      out_ << "/>\n";
+    else
+      out_ << pad << "</structure>\n";
+  }
+
+  std::ostream& out_;        ///< Destination.
+  const Parameters& params_; ///< Formatter parameters.
+};
+
+class XmlFormatter final : public Formatter {
+public:
+  void Write(std::ostream& out, const MetaObjectPtr& root,
+             const Parameters& params) const override {
+    if (!root)
+      return;
+    out << "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
+    if (!IsShown(root)) {
+      out << "<output/>\n";
+      return;
+    }
+    out << "<output>\n";
+    XmlWriter(out, params).Value(root, IndentStep, /*atRoot=*/true);
+    out << "</output>\n";
+  }
+  bool IsMachineFormat() const override { return true; }
+};
+
+} // namespace
+
+std::unique_ptr<Formatter> MakeXmlFormatter() {
+  return std::make_unique<XmlFormatter>();
+}
+
+} // namespace Fabrik::Format::Detail
