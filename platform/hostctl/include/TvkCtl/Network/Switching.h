@@ -164,11 +164,21 @@ private:
   std::optional<PortGroupData> listed_; ///< Values read by a listing.
 };
 
+/// What a listing of distributed ports reads of each at once.
+struct DVPortData {
+  std::string name;                 ///< Port name.
+  std::string portgroupKey;         ///< Distributed port group key.
+  std::vector<std::string> clients; ///< Clients using the port.
+};
+
 /// A distributed port, by switch UUID and port key.
 class DVPortImpl : public virtual HostCtl::Network::DVPort {
 public:
   explicit DVPortImpl(HostCtl::Network::DVPortParam param);
   DVPortImpl(std::string switchId, std::string dvPortId);
+  /// A port as a listing read it; name, port group and clients are answered
+  /// from \p data.
+  DVPortImpl(HostCtl::Network::DVPortParam param, DVPortData data);
   ~DVPortImpl() override;
 
   // --- Connection point.
@@ -191,6 +201,7 @@ public:
 
 private:
   HostCtl::Network::DVPortParam param_; ///< Switch UUID, port key, connection.
+  std::optional<DVPortData> listed_;    ///< Values read by a listing.
 };
 
 /// What the host keeps of a virtual port.
