@@ -26,7 +26,7 @@ std::string WakeOnToString(uint32_t code);
 /// and duplex word, such as "1000BaseT/Full".
 std::string LinkModeToString(const HostCtl::Network::PnicLinkMode& mode);
 /// The "vf-id" text read as base-10 strtol does (blanks and a sign allowed,
-/// stops at the first non-digit, no digits give 0), low 32 bits kept.
-int32_t ParseVfId(const std::string& text);
+/// stops at the first non-digit, no digits give 0).
+long ParseVfId(const std::string& text);
 
 } // namespace CorvexCli::NetworkNamespace

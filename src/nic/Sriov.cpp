@@ -15,6 +15,7 @@
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 
 #include <cstdlib>
+#include <limits>
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -98,9 +99,8 @@ StringParameter(const std::string& name, const char* shortName, const char* desc
 
 } // namespace
 
-int32_t ParseVfId(const std::string& text) {
-  long value = std::strtol(text.c_str(), nullptr, 10);
-  return static_cast<int32_t>(static_cast<uint32_t>(static_cast<unsigned long>(value)));
+long ParseVfId(const std::string& text) {
+  return std::strtol(text.c_str(), nullptr, 10);
 }
 
 // network sriovnic list
@@ -284,8 +284,10 @@ void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
     auto list = MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure());
     const std::string& name = input->GetParameter(kNicName);
     const std::string& vfText = input->GetParameter(kVfId);
-    int32_t vfId = ParseVfId(vfText);
-    if (vfId < 0) {
+    // A number that does not fit in 32 bits is refused like a negative one,
+    // rather than cut to its low bits and taken for another VF.
+    long vfId = ParseVfId(vfText);
+    if (vfId < 0 || vfId > std::numeric_limits<int32_t>::max()) {
       output->AddErrorMessage("Invalid vf id:" + vfText + " provided. vf id starts from 0");
       return;
     }
@@ -294,7 +296,7 @@ void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
       return;
     }
     SriovNicVFStats stats{};
-    info.GetSriovNicVFStats(stats, name, vfId);
+    info.GetSriovNicVFStats(stats, name, static_cast<int>(vfId));
     auto row = GetOutputStructure();
     row->SetField(kNicNameField, name);
     row->SetField(kVfIdField, static_cast<long>(vfId));
