@@ -8,6 +8,7 @@
 
 #include "HostCtl/Network/Pnic.h"
 #include "HostCtl/Network/Sriov.h"
+#include "HostCtl/Network/Switching.h"
 
 #include <cstdint>
 #include <memory>
@@ -45,6 +46,8 @@ public:
   // --- Kernel interfaces.
 
   // --- Port groups.
+  /// Port groups of every standard switch of the selector's kind, in host order.
+  virtual std::vector<std::unique_ptr<PortGroup>> GetAllPortGroups(PortsetGetType type) = 0;
 
   // --- ENS contexts.
 };
@@ -56,6 +59,15 @@ public:
   static std::unique_ptr<NetworkInfo> GetNetworkInfo();
 
   // --- Switching lookups.
+  /// The distributed or opaque switch of that name, or null.
+  static std::unique_ptr<DVSwitch> GetDVSwitchByName(const std::string& name);
+  /// The standard switch of that name and selector kind, or null.
+  static std::unique_ptr<VirtualSwitch> GetVirtualSwitchById(const std::string& name,
+                                                             PortsetGetType type);
+  /// The port group of that name, or null.
+  static std::unique_ptr<PortGroup> GetPortGroupByName(const std::string& name);
+  /// The distributed port \p param names, or null when the host has none.
+  static std::unique_ptr<DVPort> GetDVPort(const DVPortParam& param);
 };
 
 } // namespace HostCtl::Network
