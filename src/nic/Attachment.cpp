@@ -11,6 +11,7 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/PnicImpl.h"
 
@@ -33,10 +34,6 @@ const std::string kTrunkField = "Trunk";
 const std::string kBranchField = "Branch";
 const std::string kBranchMac = "Branch MAC";
 const std::string kVlanIdField = "VLAN ID";
-
-/// The VLAN IDs a port group admits; a branch takes one strictly between.
-constexpr long kMinVlanId = 0;
-constexpr long kMaxVlanId = 4095;
 
 /// One parameter of the attachment commands.
 struct AttachmentParameter {
@@ -96,7 +93,9 @@ std::shared_ptr<CallSpec::InputSpec> NicAttachmentAdd::GetInputSpecInternal() {
   vlanId->SetDescription("The vlan ID for the branch uplink. Valid values: %ENUM%");
   vlanId->SetRequired(true);
   auto range = CallSpec::ParameterConstraint::New(CallSpec::IntRange);
-  range->SetIntRange(kMinVlanId + 1, kMaxVlanId - 1);
+  // A branch takes a VLAN ID strictly between the bounds a port group admits.
+  range->SetIntRange(HostCtl::Network::PortGroup::MIN_VLAN_ID + 1,
+                     HostCtl::Network::PortGroup::MAX_VLAN_ID - 1);
   vlanId->SetConstraint(range);
   spec->AddParameter(vlanId);
   return spec;

@@ -90,7 +90,8 @@ TEST_F(NicModelTest, ExportThenImportGivesTheSameHost) {
   EXPECT_EQ(vmnic0["info"]["port"], 5);
   EXPECT_EQ(vmnic0["vfs"].size(), 4u);
   EXPECT_EQ(vmnic0["attachments"][0]["branch"], "vmnic5");
-  EXPECT_EQ(vmnic0["vlanCounters"].size(), 2u);
+  EXPECT_EQ(vmnic0["vlanCounters"].size(), 3u);
+  EXPECT_EQ(vmnic0["vlanStats"], true);
 }
 
 TEST_F(NicModelTest, ImportNamesTheBadField) {

@@ -20,6 +20,7 @@
 //   "sriov": true for an SR-IOV enabled NIC, with
 //   "vfs": [{"id" 0-255, "active", "pciAddress", "ownerWorldId", "stats"}]
 //   "attachments": [{"branch", "vlanId"}] (on the trunk)
+//   "vlanStats": true to count packets per VLAN on the NIC's uplink
 //   "vlanCounters": [{"vlanId", "rxPackets", "txPackets"}]
 //
 //===----------------------------------------------------------------------===//
@@ -161,7 +162,36 @@ CREATE TABLE pnic_vlan_counter(
   tx_packets INTEGER NOT NULL DEFAULT 0,
   PRIMARY KEY(nic, vlan_id)
 ) WITHOUT ROWID;
+
+-- NICs whose description turns VLAN statistics on. The switching part adds
+-- uplinks after this part has imported; the trigger below turns counting on
+-- as the NIC becomes an uplink and consumes the row, so the table is empty
+-- once an import is complete (import checks that each such NIC is an uplink).
+CREATE TABLE pnic_vlan_stats_import(nic TEXT PRIMARY KEY) WITHOUT ROWID;
+CREATE TRIGGER uplink_vlan_stats_import AFTER INSERT ON uplink
+WHEN EXISTS(SELECT 1 FROM pnic_vlan_stats_import WHERE nic = NEW.nic)
+BEGIN
+  UPDATE uplink SET vlan_stats = 1 WHERE portset_id = NEW.portset_id AND nic = NEW.nic;
+  DELETE FROM pnic_vlan_stats_import WHERE nic = NEW.nic;
+END;
 )sql";
+
+/// Whether the description names \p nic as an uplink of any switch.
+bool IsDescribedUplink(const ordered_json& host, const std::string& nic) {
+  for (const char* kind : {"vswitches", "dvswitches", "opaqueSwitches"}) {
+    auto switches = host.find(kind);
+    if (switches == host.end() || !switches->is_array())
+      continue;
+    for (const ordered_json& vswitch : *switches) {
+      if (!vswitch.is_object() || !vswitch.contains("uplinks") || !vswitch["uplinks"].is_array())
+        continue;
+      for (const ordered_json& uplink : vswitch["uplinks"])
+        if (uplink.is_string() && uplink.get<std::string>() == nic)
+          return true;
+    }
+  }
+  return false;
+}
 
 ordered_json CodesToJson(const std::vector<uint32_t>& codes) {
   ordered_json array = ordered_json::array();
@@ -316,6 +346,11 @@ void ImportNic(const ordered_json& host, Store& store) {
         vf.Fail("id", "VF " + std::to_string(id) + " is listed twice");
     }
 
+    if (nic.Bool("vlanStats", false)) {
+      if (!IsDescribedUplink(host, name))
+        nic.Fail("vlanStats", "VLAN statistics need the NIC to be an uplink of a switch");
+      store.Prepare("INSERT INTO pnic_vlan_stats_import(nic) VALUES(?)").BindAll(name).Run();
+    }
     for (const JsonObject& counter : nic.Objects("vlanCounters")) {
       int64_t vlan = counter.Int("vlanId", 0, 4094);
       store
@@ -406,6 +441,12 @@ void ExportNic(ordered_json& host, Store& store) {
       attachments.push_back({{"branch", branches.Text(0)}, {"vlanId", branches.Int(1)}});
     if (!attachments.empty())
       nic["attachments"] = std::move(attachments);
+
+    Statement enabled =
+        store.Prepare("SELECT 1 FROM uplink WHERE nic = ? AND vlan_stats != 0 LIMIT 1");
+    enabled.Bind(1, name);
+    if (enabled.Step())
+      nic["vlanStats"] = true;
 
     ordered_json counters = ordered_json::array();
     Statement vlans = store.Prepare("SELECT vlan_id, rx_packets, tx_packets FROM "
@@ -537,7 +578,8 @@ const Part kNicPart = {
     "nic",
     kNicSchema,
     {{"nics",
-      {"info", "driverInfo", "pause", "stats", "sriov", "vfs", "attachments", "vlanCounters"}},
+      {"info", "driverInfo", "pause", "stats", "sriov", "vfs", "attachments", "vlanStats",
+       "vlanCounters"}},
      {"nics.vfs", {"id", "active", "pciAddress", "ownerWorldId", "stats"}},
      {"nics.attachments", {"branch", "vlanId"}},
      {"nics.vlanCounters", {"vlanId", "rxPackets", "txPackets"}}},
