@@ -8,12 +8,14 @@
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/PnicImpl.h"
+#include "TvkCtl/Network/Switching.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
 #include "model/Store.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 #include <unistd.h>
@@ -110,6 +112,12 @@ TEST_F(NicModelTest, ImportNamesTheBadField) {
   host = Model::Profile("demo");
   host["nics"][1]["attachments"] = ordered_json::array({{{"branch", "vmnic5"}, {"vlanId", 7}}});
   EXPECT_NE(ImportError(host).find("already attached to vmnic0"), std::string::npos);
+
+  host = Model::Profile("demo");
+  host["nics"][2]["vlanStats"] = true; // vmnic2 is no uplink of a standard switch
+  host.erase("dvswitches");
+  EXPECT_EQ(ImportError(host),
+            "nics[2].vlanStats: VLAN statistics need the NIC to be an uplink of a switch");
 
   host = Model::Profile("demo");
   host["nics"][0]["stats"]["rxPackets"] = -1;
@@ -288,6 +296,43 @@ TEST_F(NicModelTest, CountersAndDeclaredFaults) {
   PnicInfo info;
   EXPECT_EQ(Refusal([&] { PnicImpl("vmnic1").GetPnicInfo(info, 0, 0); }), "PHY not responding");
   PnicImpl("vmnic0").GetPnicInfo(info, 0, 0);
+}
+
+/// The switch whose uplinks include \p nic.
+std::unique_ptr<Portset> SwitchOf(const std::string& nic) {
+  TvkCtl::Network::VirtualSwitchInfoImpl switches;
+  for (auto& portset : switches.GetAllSwitches()) {
+    std::vector<std::string> uplinks = portset->GetUplinks();
+    if (std::find(uplinks.begin(), uplinks.end(), nic) != uplinks.end())
+      return std::move(portset);
+  }
+  return nullptr;
+}
+
+TEST_F(NicModelTest, VlanCountersFollowTheUplinkSetting) {
+  std::unique_ptr<Portset> core = SwitchOf("vmnic0");
+  ASSERT_NE(core, nullptr);
+  std::vector<VlanStats> stats = core->GetVlanStats("vmnic0");
+  ASSERT_EQ(stats.size(), 3u);
+  EXPECT_EQ(stats[0].vlanId, 120);
+  EXPECT_EQ(stats[0].received, 402113u);
+  EXPECT_EQ(core->GetVlanStats("vmnic1").size(), 0u);
+  EXPECT_EQ(Refusal([&] { core->GetVlanStats("vmnic4"); }),
+            "vmnic4 is not an uplink of virtual switch " + core->GetName());
+
+  // Turning counting off drops the counters; on again, the port groups'
+  // VLANs count from zero.
+  core->SetVlanStatsEnabled("vmnic0", false);
+  EXPECT_TRUE(core->GetVlanStats("vmnic0").empty());
+  core->SetVlanStatsEnabled("vmnic0", true);
+  stats = SwitchOf("vmnic0")->GetVlanStats("vmnic0");
+  ASSERT_EQ(stats.size(), 2u);
+  EXPECT_EQ(stats[1].vlanId, 130);
+  EXPECT_EQ(stats[1].sent, 0u);
+
+  ordered_json exported = Model::ExportHost(Model::Store::Host());
+  EXPECT_EQ(exported["nics"][0]["vlanStats"], true);
+  EXPECT_FALSE(exported["nics"][0].contains("vlanCounters"));
 }
 
 } // namespace
