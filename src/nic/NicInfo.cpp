@@ -17,6 +17,7 @@
 
 #include <cstring>
 #include <iterator>
+#include <limits>
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace {
@@ -439,6 +440,10 @@ bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, Pni
   }
   if (input->HasParameter(kPhyAddress)) {
     long phy = input->GetParameterInt(kPhyAddress);
+    // An address that does not fit the record's 32 bits is refused rather
+    // than cut to its low bits and taken for another address.
+    if (phy > static_cast<long>(std::numeric_limits<uint32_t>::max()))
+      throw HostCtlException("Invalid PHY address value.");
     if (phy >= 1) {
       if (static_cast<uint32_t>(phy) != info.phyAddress) {
         info.phyAddress = static_cast<uint32_t>(phy);
@@ -481,7 +486,12 @@ bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, Pni
   if (input->HasParameter(kMessageLevel)) {
     if (!info.messageLevelSupported)
       throw HostCtlException("Not Support msglvl.");
-    uint32_t level = static_cast<uint32_t>(input->GetParameterInt(kMessageLevel));
+    long value = input->GetParameterInt(kMessageLevel);
+    if (value < std::numeric_limits<int32_t>::min() ||
+        value > static_cast<long>(std::numeric_limits<uint32_t>::max()))
+      throw HostCtlException("Invalid message level value.");
+    // A negative level stands for its 32-bit pattern (-1 sets every bit).
+    auto level = static_cast<uint32_t>(value);
     if (level != info.messageLevel) {
       info.messageLevel = level;
       info.messageLevelChanged = true;

@@ -117,6 +117,17 @@ TEST_F(GetInfoFromParamTest, PhyAddressBounds) {
   EXPECT_EQ(Refusal(), "Invalid PHY address value.");
   input_->SetInt("phy-address", -2);
   EXPECT_EQ(Refusal(), "Invalid PHY address value.");
+  // 2^32 + 1 must not be taken for address 1.
+  input_->SetInt("phy-address", 4294967297L);
+  EXPECT_EQ(Refusal(), "Invalid PHY address value.");
+}
+
+TEST_F(GetInfoFromParamTest, MessageLevelKeepsItsBitPattern) {
+  input_->SetInt("message-level", -1);
+  EXPECT_TRUE(Merge());
+  EXPECT_EQ(record_.messageLevel, 0xffffffffu);
+  input_->SetInt("message-level", 4294967296L);
+  EXPECT_EQ(Refusal(), "Invalid message level value.");
 }
 
 TEST_F(GetInfoFromParamTest, WakeOnLettersBecomeCodesInOrder) {
