@@ -110,6 +110,10 @@ TEST_F(NicModelTest, ImportNamesTheBadField) {
   EXPECT_NE(ImportError(host).find("nics[2].vfs"), std::string::npos);
 
   host = Model::Profile("demo");
+  host["nics"][1]["vfs"][0]["ownerWorldId"] = "2107453";
+  EXPECT_EQ(ImportError(host), "nics[1].vfs[0].ownerWorldId: an inactive VF has no owner world");
+
+  host = Model::Profile("demo");
   host["nics"][1]["attachments"] = ordered_json::array({{{"branch", "vmnic5"}, {"vlanId", 7}}});
   EXPECT_NE(ImportError(host).find("already attached to vmnic0"), std::string::npos);
 

@@ -333,6 +333,8 @@ void ImportNic(const ordered_json& host, Store& store) {
       store.Prepare("INSERT INTO sriov_nic(nic) VALUES(?)").BindAll(name).Run();
     for (const JsonObject& vf : vfs) {
       int64_t id = vf.Int("id", 0, 255);
+      if (!vf.Bool("active", false) && !vf.String("ownerWorldId", "").empty())
+        vf.Fail("ownerWorldId", "an inactive VF has no owner world");
       SriovNicVFStats counters;
       ReadCounters(vf.Object("stats"), kVfStatsKeys, counters);
       Statement insert = store.Prepare(
