@@ -135,8 +135,8 @@ TEST_F(NicModelTest, SetPnicInfoAppliesOnlyChangedSettings) {
   EXPECT_EQ(info.linkStatus, "Up");
   info.port = 3;
   info.portChanged = true;
-  info.phyAddress = 9; // not flagged: stays 3
-  info.messageLevel = 12;
+  info.phyAddress = 9;             // not flagged: stays 3
+  info.messageLevel = 0xffffffffu; // every bit, as "-l -1" sets it
   info.messageLevelChanged = true;
   nic.SetPnicInfo(info);
 
@@ -144,8 +144,13 @@ TEST_F(NicModelTest, SetPnicInfoAppliesOnlyChangedSettings) {
   PnicImpl("vmnic4").GetPnicInfo(after, 0, 0);
   EXPECT_EQ(after.port, 3u);
   EXPECT_EQ(after.phyAddress, 3u);
-  EXPECT_EQ(after.messageLevel, 12u);
+  EXPECT_EQ(after.messageLevel, 0xffffffffu);
   EXPECT_FALSE(after.portChanged);
+
+  // What a change leaves can be exported and imported again.
+  ordered_json exported = Model::ExportHost(Model::Store::Host());
+  Load(exported);
+  EXPECT_EQ(Model::ExportHost(Model::Store::Host()).dump(), exported.dump());
 }
 
 TEST_F(NicModelTest, SetPnicInfoRefusesWhatTheNicCannotDo) {

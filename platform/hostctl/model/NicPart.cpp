@@ -283,15 +283,13 @@ NicSettings ReadSettings(const JsonObject& nic, Store& store, const std::string&
     record.phyAddress = static_cast<uint32_t>(info->Int("phyAddress", 0, 31, 0));
     record.transceiver = static_cast<uint32_t>(info->Int("transceiver", 0, 1, 0));
     record.autoNegotiation = info->Bool("autoNegotiation", false);
-    if (record.autoNegotiation && !record.supportsAutoNegotiation)
-      info->Fail("autoNegotiation", "requires supportsAutoNegotiation");
     record.supportsWakeOn = info->Bool("supportsWakeOn", false);
     for (int64_t code : info->Ints("wakeOn", 0, 8))
       record.wakeOn.push_back(static_cast<uint32_t>(code));
     if (!record.wakeOn.empty() && !record.supportsWakeOn)
       info->Fail("wakeOn", "requires supportsWakeOn");
     record.messageLevelSupported = info->Bool("messageLevelSupported", false);
-    record.messageLevel = static_cast<uint32_t>(info->Int("messageLevel", 0, 0x7fffffff, 0));
+    record.messageLevel = static_cast<uint32_t>(info->Int("messageLevel", 0, 0xffffffffLL, 0));
     record.virtualAddress = info->String("virtualAddress", "");
   }
   if (std::optional<JsonObject> driver = nic.Object("driverInfo")) {
