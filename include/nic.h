@@ -9,6 +9,10 @@
 
 #include "common/CommandBase.h"
 
+namespace HostCtl::Network {
+struct PnicInfo;
+} // namespace HostCtl::Network
+
 namespace CorvexCli::NetworkNamespace {
 
 // NIC list (NicList.cpp).
@@ -25,11 +29,18 @@ class NicList : public virtual Fabrik::AutoCli::Command {
 class NicGet : public virtual Fabrik::AutoCli::Command {
   CORVEX_COMMAND(NicGet)
   CORVEX_OUTPUT_STRUCTURE
+  /// The template of the "Driver Info" structure ("NICDriverInfo").
+  std::shared_ptr<Fabrik::MetaObj::MetaStruct> GetDriverInfoStructure();
 };
 
 /// network nic set
 class NicSet : public virtual Fabrik::AutoCli::Command {
   CORVEX_COMMAND(NicSet)
+  /// Merges the optional parameters of \p input into \p info (read from the
+  /// host), sets the changed flags, and tells whether anything is to be
+  /// applied. A bad value throws HostCtl::Lib::HostCtlException.
+  bool GetInfoFromParam(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                        HostCtl::Network::PnicInfo& info);
 };
 
 /// network nic up
