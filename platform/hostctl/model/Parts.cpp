@@ -13,6 +13,7 @@ extern const Part kCorePart;
 // Physical NICs: information, counters, SR-IOV, attachments.
 
 // NIC hardware settings.
+extern const Part kNicHwPart;
 
 // Switching: standard and distributed switches, port groups, policies, LACP.
 
@@ -31,6 +32,7 @@ const std::vector<const Part*>& AllParts() {
       // Physical NICs.
 
       // NIC hardware settings.
+      &kNicHwPart,
 
       // Switching.
 
