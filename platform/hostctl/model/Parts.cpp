@@ -11,6 +11,7 @@ namespace Model {
 extern const Part kCorePart;
 
 // Physical NICs: information, counters, SR-IOV, attachments.
+extern const Part kNicPart;
 
 // NIC hardware settings.
 extern const Part kNicHwPart;
@@ -30,6 +31,7 @@ const std::vector<const Part*>& AllParts() {
       &kCorePart,
 
       // Physical NICs.
+      &kNicPart,
 
       // NIC hardware settings.
       &kNicHwPart,

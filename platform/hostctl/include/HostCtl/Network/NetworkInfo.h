@@ -7,6 +7,7 @@
 #pragma once
 
 #include "HostCtl/Network/Pnic.h"
+#include "HostCtl/Network/Sriov.h"
 
 #include <cstdint>
 #include <memory>
@@ -26,6 +27,18 @@ public:
   virtual std::unique_ptr<Pnic> GetPnicByName(const std::string& name) = 0;
 
   // --- SR-IOV.
+  /// The physical NICs with SR-IOV enabled (physical functions), in the
+  /// host's order.
+  virtual std::vector<std::unique_ptr<Pnic>> GetSriovNics() = 0;
+  /// The SR-IOV enabled NIC of that name, or null (also for a NIC of the host
+  /// that does not have SR-IOV enabled).
+  virtual std::unique_ptr<Pnic> GetSriovNicByName(const std::string& name) = 0;
+  /// The virtual functions of SR-IOV NIC \p name, by VF ID; throws
+  /// HostCtlException when \p name is no SR-IOV NIC.
+  virtual std::vector<SriovNicVFInfo> GetSriovNicVFInfo(const std::string& name) = 0;
+  /// Fills \p stats with the counters of VF \p vfId of SR-IOV NIC \p name;
+  /// throws HostCtlException for an unknown NIC or VF ID.
+  virtual void GetSriovNicVFStats(SriovNicVFStats& stats, const std::string& name, int vfId) = 0;
 
   // --- Netstacks and the kernel IPv6 switch.
 

@@ -16,6 +16,11 @@ public:
   std::unique_ptr<HostCtl::Network::Pnic> GetPnicByName(const std::string& name) override;
 
   // --- SR-IOV.
+  std::vector<std::unique_ptr<HostCtl::Network::Pnic>> GetSriovNics() override;
+  std::unique_ptr<HostCtl::Network::Pnic> GetSriovNicByName(const std::string& name) override;
+  std::vector<HostCtl::Network::SriovNicVFInfo> GetSriovNicVFInfo(const std::string& name) override;
+  void GetSriovNicVFStats(HostCtl::Network::SriovNicVFStats& stats, const std::string& name,
+                          int vfId) override;
 
   // --- Netstacks and the kernel IPv6 switch.
 

@@ -1,0 +1,548 @@
+//===- model/NicPart.cpp - Information, counters, SR-IOV and attachments --===//
+//
+// The NIC part keeps, in side tables keyed by pnic.name, what the host knows
+// of each physical NIC beyond its basic state: the generic information record
+// (ports, link modes, PHY, transceiver, wake-on, message level), pause
+// settings and driver versions, packet counters, SR-IOV virtual functions with
+// their counters, the branches attached to a trunk uplink, and the per-VLAN
+// counters of an uplink.
+//
+// Host description keys, inside each object of "nics":
+//   "info": {"supportedPorts": [port codes 0-6], "supportsAutoNegotiation",
+//            "advertisedModes": [{"speed", "duplex" 0-2, "media" 0-38}],
+//            "advertisedAutoNegotiation", "port", "phyAddress" 0-31,
+//            "transceiver" 0-1, "autoNegotiation", "supportsWakeOn",
+//            "wakeOn": [codes 0-8], "messageLevelSupported", "messageLevel",
+//            "virtualAddress"}
+//   "driverInfo": {"version", "firmwareVersion"}
+//   "pause": {"supported", "autoNegotiation", "rx", "tx"}
+//   "stats": {counter name: count}
+//   "sriov": true for an SR-IOV enabled NIC, with
+//   "vfs": [{"id" 0-255, "active", "pciAddress", "ownerWorldId", "stats"}]
+//   "attachments": [{"branch", "vlanId"}] (on the trunk)
+//   "vlanCounters": [{"vlanId", "rxPackets", "txPackets"}]
+//
+//===----------------------------------------------------------------------===//
+#include "model/NicModel.h"
+
+#include "HostCtl/Lib.h"
+#include "model/JsonRead.h"
+#include "model/Part.h"
+
+#include <algorithm>
+#include <initializer_list>
+#include <optional>
+
+namespace Model {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::Network::PnicStats;
+using HostCtl::Network::SriovNicVFStats;
+using nlohmann::ordered_json;
+
+const std::array<CounterKey<PnicStats>, 24> kPnicStatsKeys = {{
+    {"txPackets", &PnicStats::txPackets},
+    {"rxPackets", &PnicStats::rxPackets},
+    {"txBytes", &PnicStats::txBytes},
+    {"rxBytes", &PnicStats::rxBytes},
+    {"txErrors", &PnicStats::txErrors},
+    {"rxErrors", &PnicStats::rxErrors},
+    {"txDropped", &PnicStats::txDropped},
+    {"rxDropped", &PnicStats::rxDropped},
+    {"rxMulticast", &PnicStats::rxMulticast},
+    {"rxBroadcast", &PnicStats::rxBroadcast},
+    {"txMulticast", &PnicStats::txMulticast},
+    {"txBroadcast", &PnicStats::txBroadcast},
+    {"rxLengthErrors", &PnicStats::rxLengthErrors},
+    {"rxOverErrors", &PnicStats::rxOverErrors},
+    {"rxCrcErrors", &PnicStats::rxCrcErrors},
+    {"rxFrameErrors", &PnicStats::rxFrameErrors},
+    {"rxFifoErrors", &PnicStats::rxFifoErrors},
+    {"rxMissedErrors", &PnicStats::rxMissedErrors},
+    {"txAbortedErrors", &PnicStats::txAbortedErrors},
+    {"txFifoErrors", &PnicStats::txFifoErrors},
+    {"txCarrierErrors", &PnicStats::txCarrierErrors},
+    {"txHeartbeatErrors", &PnicStats::txHeartbeatErrors},
+    {"txWindowErrors", &PnicStats::txWindowErrors},
+    {"collisions", &PnicStats::collisions},
+}};
+
+const std::array<CounterKey<SriovNicVFStats>, 20> kVfStatsKeys = {{
+    {"rxUnicastPkts", &SriovNicVFStats::rxUnicastPkts},
+    {"rxUnicastBytes", &SriovNicVFStats::rxUnicastBytes},
+    {"rxMulticastPkts", &SriovNicVFStats::rxMulticastPkts},
+    {"rxMulticastBytes", &SriovNicVFStats::rxMulticastBytes},
+    {"rxBroadcastPkts", &SriovNicVFStats::rxBroadcastPkts},
+    {"rxBroadcastBytes", &SriovNicVFStats::rxBroadcastBytes},
+    {"rxOutOfBufferDrops", &SriovNicVFStats::rxOutOfBufferDrops},
+    {"rxErrorDrops", &SriovNicVFStats::rxErrorDrops},
+    {"rxLroPkts", &SriovNicVFStats::rxLroPkts},
+    {"rxLroBytes", &SriovNicVFStats::rxLroBytes},
+    {"txUnicastPkts", &SriovNicVFStats::txUnicastPkts},
+    {"txUnicastBytes", &SriovNicVFStats::txUnicastBytes},
+    {"txMulticastPkts", &SriovNicVFStats::txMulticastPkts},
+    {"txMulticastBytes", &SriovNicVFStats::txMulticastBytes},
+    {"txBroadcastPkts", &SriovNicVFStats::txBroadcastPkts},
+    {"txBroadcastBytes", &SriovNicVFStats::txBroadcastBytes},
+    {"txErrors", &SriovNicVFStats::txErrors},
+    {"txDiscards", &SriovNicVFStats::txDiscards},
+    {"txTsoPkts", &SriovNicVFStats::txTsoPkts},
+    {"txTsoBytes", &SriovNicVFStats::txTsoBytes},
+}};
+
+namespace {
+
+const char* const kNicSchema = R"sql(
+-- Generic information, pause settings and driver versions of a physical NIC.
+-- Lists are JSON arrays: ports and wake-on modes of codes, advertised modes
+-- of [speed, duplex, media] triples.
+CREATE TABLE pnic_info(
+  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE,
+  supported_ports TEXT NOT NULL DEFAULT '[]',
+  supports_autoneg INTEGER NOT NULL DEFAULT 0,
+  advertised_modes TEXT NOT NULL DEFAULT '[]',
+  advertised_autoneg INTEGER NOT NULL DEFAULT 0,
+  port INTEGER NOT NULL DEFAULT 0,
+  phy_address INTEGER NOT NULL DEFAULT 0,
+  transceiver INTEGER NOT NULL DEFAULT 0,
+  autoneg INTEGER NOT NULL DEFAULT 0,
+  supports_wakeon INTEGER NOT NULL DEFAULT 0,
+  wakeon TEXT NOT NULL DEFAULT '[]',
+  msglvl_supported INTEGER NOT NULL DEFAULT 0,
+  msglvl INTEGER NOT NULL DEFAULT 0,
+  virtual_address TEXT NOT NULL DEFAULT '',
+  driver_version TEXT NOT NULL DEFAULT '',
+  firmware_version TEXT NOT NULL DEFAULT '',
+  pause_supported INTEGER NOT NULL DEFAULT 0,
+  pause_autoneg INTEGER NOT NULL DEFAULT 0,
+  pause_rx INTEGER NOT NULL DEFAULT 0,
+  pause_tx INTEGER NOT NULL DEFAULT 0
+) WITHOUT ROWID;
+
+-- Packet counters of a NIC: a JSON object of counter name to count.
+CREATE TABLE pnic_stats(
+  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE,
+  counters TEXT NOT NULL DEFAULT '{}'
+) WITHOUT ROWID;
+
+-- NICs with SR-IOV enabled (physical functions).
+CREATE TABLE sriov_nic(
+  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE
+) WITHOUT ROWID;
+
+-- Virtual functions of SR-IOV NICs, with their counters as a JSON object.
+CREATE TABLE sriov_vf(
+  nic TEXT NOT NULL REFERENCES sriov_nic(nic) ON DELETE CASCADE,
+  vf_id INTEGER NOT NULL,
+  active INTEGER NOT NULL DEFAULT 0,
+  pci_address TEXT NOT NULL DEFAULT '',
+  owner_world TEXT NOT NULL DEFAULT '',
+  counters TEXT NOT NULL DEFAULT '{}',
+  PRIMARY KEY(nic, vf_id)
+) WITHOUT ROWID;
+
+-- Branch uplinks attached to trunk uplinks: a branch has one trunk, and a
+-- trunk has one branch per VLAN.
+CREATE TABLE pnic_attachment(
+  branch TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE,
+  trunk TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
+  vlan_id INTEGER NOT NULL,
+  ord INTEGER NOT NULL,
+  UNIQUE(trunk, vlan_id)
+) WITHOUT ROWID;
+CREATE INDEX pnic_attachment_by_trunk ON pnic_attachment(trunk, ord);
+
+-- Per-VLAN packet counters of an uplink NIC; they are shown while VLAN
+-- statistics are enabled on the uplink (uplink.vlan_stats).
+CREATE TABLE pnic_vlan_counter(
+  nic TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
+  vlan_id INTEGER NOT NULL,
+  rx_packets INTEGER NOT NULL DEFAULT 0,
+  tx_packets INTEGER NOT NULL DEFAULT 0,
+  PRIMARY KEY(nic, vlan_id)
+) WITHOUT ROWID;
+)sql";
+
+ordered_json CodesToJson(const std::vector<uint32_t>& codes) {
+  ordered_json array = ordered_json::array();
+  for (uint32_t code : codes)
+    array.push_back(code);
+  return array;
+}
+
+std::vector<uint32_t> CodesFromJson(const std::string& text) {
+  std::vector<uint32_t> codes;
+  for (const auto& code : ordered_json::parse(text))
+    codes.push_back(code.get<uint32_t>());
+  return codes;
+}
+
+/// Refuses keys of a nested object that are not in \p allowed.
+void CheckObjectKeys(const JsonObject& object, std::initializer_list<const char*> allowed) {
+  for (const auto& [key, value] : object.Json().items()) {
+    bool known =
+        std::any_of(allowed.begin(), allowed.end(), [&](const char* name) { return key == name; });
+    if (!known)
+      throw ImportError(object.Path() + "." + key + ": unknown field");
+  }
+}
+
+/// Reads a JSON object of counters (\p object may be absent) into \p record.
+template <typename Record, std::size_t N>
+void ReadCounters(const std::optional<JsonObject>& object,
+                  const std::array<CounterKey<Record>, N>& keys, Record& record) {
+  if (!object)
+    return;
+  for (const auto& [key, value] : object->Json().items()) {
+    bool known = std::any_of(keys.begin(), keys.end(),
+                             [&](const CounterKey<Record>& k) { return key == k.key; });
+    if (!known)
+      throw ImportError(object->Path() + "." + key + ": unknown counter");
+  }
+  for (const CounterKey<Record>& key : keys)
+    record.*key.member = object->Counter(key.key, 0);
+}
+
+template <typename Record, std::size_t N>
+std::string CountersToText(const std::array<CounterKey<Record>, N>& keys, const Record& record) {
+  ordered_json object = ordered_json::object();
+  for (const CounterKey<Record>& key : keys)
+    object[key.key] = record.*key.member;
+  return object.dump();
+}
+
+/// The settings a NIC has when its description gives none: its current link
+/// mode advertised, and nothing else supported.
+NicSettings DefaultSettings(Store& store, const std::string& nic) {
+  NicSettings settings;
+  Statement row = store.Prepare("SELECT speed, duplex FROM pnic WHERE name = ?");
+  row.Bind(1, nic);
+  if (row.Step() && row.Int(0) > 0)
+    settings.info.advertisedModes.push_back(
+        {static_cast<uint32_t>(row.Int(0)), static_cast<uint32_t>(row.Int(1)), 1});
+  return settings;
+}
+
+NicSettings ReadSettings(const JsonObject& nic, Store& store, const std::string& name) {
+  NicSettings settings = DefaultSettings(store, name);
+  if (std::optional<JsonObject> info = nic.Object("info")) {
+    CheckObjectKeys(*info, {"supportedPorts", "supportsAutoNegotiation", "advertisedModes",
+                            "advertisedAutoNegotiation", "port", "phyAddress", "transceiver",
+                            "autoNegotiation", "supportsWakeOn", "wakeOn", "messageLevelSupported",
+                            "messageLevel", "virtualAddress"});
+    HostCtl::Network::PnicInfo& record = settings.info;
+    record.supportedPorts.clear();
+    for (int64_t code : info->Ints("supportedPorts", 0, 6))
+      record.supportedPorts.push_back(static_cast<uint32_t>(code));
+    record.supportsAutoNegotiation = info->Bool("supportsAutoNegotiation", false);
+    if (info->Has("advertisedModes")) {
+      record.advertisedModes.clear();
+      for (const JsonObject& mode : info->Objects("advertisedModes")) {
+        CheckObjectKeys(mode, {"speed", "duplex", "media"});
+        record.advertisedModes.push_back({static_cast<uint32_t>(mode.Int("speed", 0, 400000)),
+                                          static_cast<uint32_t>(mode.Int("duplex", 0, 2)),
+                                          static_cast<uint32_t>(mode.Int("media", 0, 38))});
+      }
+    }
+    record.advertisedAutoNegotiation = info->Bool("advertisedAutoNegotiation", false);
+    record.port = static_cast<uint32_t>(info->Int("port", 0, 6, 0));
+    if (!record.supportedPorts.empty() &&
+        std::find(record.supportedPorts.begin(), record.supportedPorts.end(), record.port) ==
+            record.supportedPorts.end())
+      info->Fail("port", "must be one of supportedPorts");
+    record.phyAddress = static_cast<uint32_t>(info->Int("phyAddress", 0, 31, 0));
+    record.transceiver = static_cast<uint32_t>(info->Int("transceiver", 0, 1, 0));
+    record.autoNegotiation = info->Bool("autoNegotiation", false);
+    if (record.autoNegotiation && !record.supportsAutoNegotiation)
+      info->Fail("autoNegotiation", "requires supportsAutoNegotiation");
+    record.supportsWakeOn = info->Bool("supportsWakeOn", false);
+    for (int64_t code : info->Ints("wakeOn", 0, 8))
+      record.wakeOn.push_back(static_cast<uint32_t>(code));
+    if (!record.wakeOn.empty() && !record.supportsWakeOn)
+      info->Fail("wakeOn", "requires supportsWakeOn");
+    record.messageLevelSupported = info->Bool("messageLevelSupported", false);
+    record.messageLevel = static_cast<uint32_t>(info->Int("messageLevel", 0, 0x7fffffff, 0));
+    record.virtualAddress = info->String("virtualAddress", "");
+  }
+  if (std::optional<JsonObject> driver = nic.Object("driverInfo")) {
+    CheckObjectKeys(*driver, {"version", "firmwareVersion"});
+    settings.driverVersion = driver->String("version", "");
+    settings.firmwareVersion = driver->String("firmwareVersion", "");
+  }
+  if (std::optional<JsonObject> pause = nic.Object("pause")) {
+    CheckObjectKeys(*pause, {"supported", "autoNegotiation", "rx", "tx"});
+    settings.pause.supported = pause->Bool("supported", true);
+    settings.pause.autoNegotiation = pause->Bool("autoNegotiation", false);
+    settings.pause.rx = pause->Bool("rx", false);
+    settings.pause.tx = pause->Bool("tx", false);
+    if (!settings.pause.supported &&
+        (settings.pause.autoNegotiation || settings.pause.rx || settings.pause.tx))
+      pause->Fail("supported", "must be true when any pause setting is on");
+  }
+  return settings;
+}
+
+void ImportNic(const ordered_json& host, Store& store) {
+  JsonObject root(host, "");
+  std::vector<JsonObject> nics = root.Objects("nics");
+  for (const JsonObject& nic : nics) {
+    std::string name = nic.String("name");
+    SaveNicSettings(store, name, ReadSettings(nic, store, name));
+
+    PnicStats stats;
+    ReadCounters(nic.Object("stats"), kPnicStatsKeys, stats);
+    store.Prepare("INSERT INTO pnic_stats(nic, counters) VALUES(?, ?)")
+        .BindAll(name, CountersToText(kPnicStatsKeys, stats))
+        .Run();
+
+    bool sriov = nic.Bool("sriov", false);
+    std::vector<JsonObject> vfs = nic.Objects("vfs");
+    if (!sriov && !vfs.empty())
+      nic.Fail("vfs", "requires \"sriov\": true");
+    if (sriov)
+      store.Prepare("INSERT INTO sriov_nic(nic) VALUES(?)").BindAll(name).Run();
+    for (const JsonObject& vf : vfs) {
+      int64_t id = vf.Int("id", 0, 255);
+      SriovNicVFStats counters;
+      ReadCounters(vf.Object("stats"), kVfStatsKeys, counters);
+      Statement insert = store.Prepare(
+          "INSERT INTO sriov_vf(nic, vf_id, active, pci_address, owner_world, counters) "
+          "VALUES(?, ?, ?, ?, ?, ?) ON CONFLICT DO NOTHING");
+      insert
+          .BindAll(name, id, vf.Bool("active", false), vf.String("pciAddress", ""),
+                   vf.String("ownerWorldId", ""), CountersToText(kVfStatsKeys, counters))
+          .Run();
+      if (store.Changes() == 0)
+        vf.Fail("id", "VF " + std::to_string(id) + " is listed twice");
+    }
+
+    for (const JsonObject& counter : nic.Objects("vlanCounters")) {
+      int64_t vlan = counter.Int("vlanId", 0, 4094);
+      store
+          .Prepare("INSERT INTO pnic_vlan_counter(nic, vlan_id, rx_packets, tx_packets) "
+                   "VALUES(?, ?, ?, ?) ON CONFLICT DO NOTHING")
+          .BindAll(name, vlan, static_cast<int64_t>(counter.Counter("rxPackets")),
+                   static_cast<int64_t>(counter.Counter("txPackets")))
+          .Run();
+      if (store.Changes() == 0)
+        counter.Fail("vlanId", "VLAN " + std::to_string(vlan) + " is listed twice");
+    }
+  }
+  // Attachments refer to other NICs, so they are read once every NIC is in.
+  for (const JsonObject& nic : nics) {
+    std::string trunk = nic.String("name");
+    for (const JsonObject& attachment : nic.Objects("attachments")) {
+      std::string branch = attachment.String("branch");
+      int64_t vlan = attachment.Int("vlanId", 1, 4094);
+      try {
+        AddAttachment(store, trunk, branch, vlan);
+      } catch (const HostCtlException& refusal) {
+        attachment.Fail("branch", refusal.what());
+      }
+    }
+  }
+}
+
+void ExportNic(ordered_json& host, Store& store) {
+  if (!host.contains("nics"))
+    return;
+  for (ordered_json& nic : host["nics"]) {
+    std::string name = nic["name"].get<std::string>();
+    NicSettings settings = LoadNicSettings(store, name);
+    const HostCtl::Network::PnicInfo& record = settings.info;
+    ordered_json info = ordered_json::object();
+    info["supportedPorts"] = CodesToJson(record.supportedPorts);
+    info["supportsAutoNegotiation"] = record.supportsAutoNegotiation;
+    ordered_json modes = ordered_json::array();
+    for (const HostCtl::Network::PnicLinkMode& mode : record.advertisedModes)
+      modes.push_back({{"speed", mode.speed}, {"duplex", mode.duplex}, {"media", mode.media}});
+    info["advertisedModes"] = std::move(modes);
+    info["advertisedAutoNegotiation"] = record.advertisedAutoNegotiation;
+    info["port"] = record.port;
+    info["phyAddress"] = record.phyAddress;
+    info["transceiver"] = record.transceiver;
+    info["autoNegotiation"] = record.autoNegotiation;
+    info["supportsWakeOn"] = record.supportsWakeOn;
+    info["wakeOn"] = CodesToJson(record.wakeOn);
+    info["messageLevelSupported"] = record.messageLevelSupported;
+    info["messageLevel"] = record.messageLevel;
+    info["virtualAddress"] = record.virtualAddress;
+    nic["info"] = std::move(info);
+    nic["driverInfo"] = {{"version", settings.driverVersion},
+                         {"firmwareVersion", settings.firmwareVersion}};
+    nic["pause"] = {{"supported", settings.pause.supported},
+                    {"autoNegotiation", settings.pause.autoNegotiation},
+                    {"rx", settings.pause.rx},
+                    {"tx", settings.pause.tx}};
+
+    Statement stats = store.Prepare("SELECT counters FROM pnic_stats WHERE nic = ?");
+    stats.Bind(1, name);
+    if (stats.Step())
+      nic["stats"] = ordered_json::parse(stats.Text(0));
+
+    Statement sriov = store.Prepare("SELECT 1 FROM sriov_nic WHERE nic = ?");
+    sriov.Bind(1, name);
+    if (sriov.Step()) {
+      nic["sriov"] = true;
+      ordered_json vfs = ordered_json::array();
+      Statement rows = store.Prepare("SELECT vf_id, active, pci_address, owner_world, counters "
+                                     "FROM sriov_vf WHERE nic = ? ORDER BY vf_id");
+      rows.Bind(1, name);
+      while (rows.Step())
+        vfs.push_back({{"id", rows.Int(0)},
+                       {"active", rows.Bool(1)},
+                       {"pciAddress", rows.Text(2)},
+                       {"ownerWorldId", rows.Text(3)},
+                       {"stats", ordered_json::parse(rows.Text(4))}});
+      if (!vfs.empty())
+        nic["vfs"] = std::move(vfs);
+    }
+
+    ordered_json attachments = ordered_json::array();
+    Statement branches =
+        store.Prepare("SELECT branch, vlan_id FROM pnic_attachment WHERE trunk = ? ORDER BY ord");
+    branches.Bind(1, name);
+    while (branches.Step())
+      attachments.push_back({{"branch", branches.Text(0)}, {"vlanId", branches.Int(1)}});
+    if (!attachments.empty())
+      nic["attachments"] = std::move(attachments);
+
+    ordered_json counters = ordered_json::array();
+    Statement vlans = store.Prepare("SELECT vlan_id, rx_packets, tx_packets FROM "
+                                    "pnic_vlan_counter WHERE nic = ? ORDER BY vlan_id");
+    vlans.Bind(1, name);
+    while (vlans.Step())
+      counters.push_back(
+          {{"vlanId", vlans.Int(0)}, {"rxPackets", vlans.Int(1)}, {"txPackets", vlans.Int(2)}});
+    if (!counters.empty())
+      nic["vlanCounters"] = std::move(counters);
+  }
+}
+
+} // namespace
+
+NicSettings LoadNicSettings(Store& store, const std::string& nic) {
+  Statement row = store.Prepare(
+      "SELECT supported_ports, supports_autoneg, advertised_modes, advertised_autoneg, port, "
+      "phy_address, transceiver, autoneg, supports_wakeon, wakeon, msglvl_supported, msglvl, "
+      "virtual_address, driver_version, firmware_version, pause_supported, pause_autoneg, "
+      "pause_rx, pause_tx FROM pnic_info WHERE nic = ?");
+  row.Bind(1, nic);
+  if (!row.Step())
+    return DefaultSettings(store, nic);
+  NicSettings settings;
+  HostCtl::Network::PnicInfo& info = settings.info;
+  info.supportedPorts = CodesFromJson(row.Text(0));
+  info.supportsAutoNegotiation = row.Bool(1);
+  for (const auto& mode : ordered_json::parse(row.Text(2)))
+    info.advertisedModes.push_back(
+        {mode.at(0).get<uint32_t>(), mode.at(1).get<uint32_t>(), mode.at(2).get<uint32_t>()});
+  info.advertisedAutoNegotiation = row.Bool(3);
+  info.port = static_cast<uint32_t>(row.Int(4));
+  info.phyAddress = static_cast<uint32_t>(row.Int(5));
+  info.transceiver = static_cast<uint32_t>(row.Int(6));
+  info.autoNegotiation = row.Bool(7);
+  info.supportsWakeOn = row.Bool(8);
+  info.wakeOn = CodesFromJson(row.Text(9));
+  info.messageLevelSupported = row.Bool(10);
+  info.messageLevel = static_cast<uint32_t>(row.Int(11));
+  info.virtualAddress = row.Text(12);
+  settings.driverVersion = row.Text(13);
+  settings.firmwareVersion = row.Text(14);
+  settings.pause.supported = row.Bool(15);
+  settings.pause.autoNegotiation = row.Bool(16);
+  settings.pause.rx = row.Bool(17);
+  settings.pause.tx = row.Bool(18);
+  return settings;
+}
+
+void SaveNicSettings(Store& store, const std::string& nic, const NicSettings& settings) {
+  const HostCtl::Network::PnicInfo& info = settings.info;
+  ordered_json modes = ordered_json::array();
+  for (const HostCtl::Network::PnicLinkMode& mode : info.advertisedModes)
+    modes.push_back({mode.speed, mode.duplex, mode.media});
+  Statement save = store.Prepare(
+      "INSERT OR REPLACE INTO pnic_info(nic, supported_ports, supports_autoneg, "
+      "advertised_modes, advertised_autoneg, port, phy_address, transceiver, autoneg, "
+      "supports_wakeon, wakeon, msglvl_supported, msglvl, virtual_address, driver_version, "
+      "firmware_version, pause_supported, pause_autoneg, pause_rx, pause_tx) "
+      "VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
+  save.BindAll(nic, CodesToJson(info.supportedPorts).dump(), info.supportsAutoNegotiation,
+               modes.dump(), info.advertisedAutoNegotiation, info.port, info.phyAddress,
+               info.transceiver, info.autoNegotiation, info.supportsWakeOn,
+               CodesToJson(info.wakeOn).dump(), info.messageLevelSupported, info.messageLevel,
+               info.virtualAddress, settings.driverVersion, settings.firmwareVersion,
+               settings.pause.supported, settings.pause.autoNegotiation, settings.pause.rx,
+               settings.pause.tx)
+      .Run();
+}
+
+bool PnicExists(Store& store, const std::string& nic) {
+  Statement row = store.Prepare("SELECT 1 FROM pnic WHERE name = ?");
+  row.Bind(1, nic);
+  return row.Step();
+}
+
+void AddAttachment(Store& store, const std::string& trunk, const std::string& branch,
+                   int64_t vlanId) {
+  if (!PnicExists(store, trunk))
+    throw HostCtlException("There is no physical NIC named " + trunk + " on this host");
+  if (!PnicExists(store, branch))
+    throw HostCtlException("There is no physical NIC named " + branch + " on this host");
+  if (trunk == branch)
+    throw HostCtlException("An uplink cannot be attached to itself");
+  if (vlanId < 1 || vlanId > 4094)
+    throw HostCtlException("VLAN ID " + std::to_string(vlanId) +
+                           " is out of range; a branch needs a VLAN ID from 1 to 4094");
+  // The cached statement is reset when each look-up's Statement goes away.
+  auto trunkOf = [&](const std::string& nic) -> std::optional<std::string> {
+    Statement row = store.Prepare("SELECT trunk FROM pnic_attachment WHERE branch = ?");
+    row.Bind(1, nic);
+    return row.Step() ? std::optional<std::string>(row.Text(0)) : std::nullopt;
+  };
+  if (std::optional<std::string> current = trunkOf(branch))
+    throw HostCtlException("Uplink " + branch + " is already attached to " + *current);
+  if (std::optional<std::string> current = trunkOf(trunk))
+    throw HostCtlException("Uplink " + trunk + " is a branch of " + *current +
+                           " and cannot be a trunk");
+  {
+    Statement branchAsTrunk = store.Prepare("SELECT 1 FROM pnic_attachment WHERE trunk = ?");
+    branchAsTrunk.Bind(1, branch);
+    if (branchAsTrunk.Step())
+      throw HostCtlException("Uplink " + branch + " is a trunk and cannot be attached as a branch");
+  }
+  {
+    Statement sameVlan =
+        store.Prepare("SELECT branch FROM pnic_attachment WHERE trunk = ? AND vlan_id = ?");
+    sameVlan.BindAll(trunk, vlanId);
+    if (sameVlan.Step())
+      throw HostCtlException("VLAN " + std::to_string(vlanId) + " of trunk " + trunk +
+                             " is already used by branch " + sameVlan.Text(0));
+  }
+  int64_t ord = 0;
+  {
+    Statement next =
+        store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM pnic_attachment WHERE trunk = ?");
+    next.Bind(1, trunk);
+    next.Step();
+    ord = next.Int(0);
+  }
+  store.Prepare("INSERT INTO pnic_attachment(branch, trunk, vlan_id, ord) VALUES(?, ?, ?, ?)")
+      .BindAll(branch, trunk, vlanId, ord)
+      .Run();
+}
+
+extern const Part kNicPart;
+const Part kNicPart = {
+    "nic",
+    kNicSchema,
+    {{"nics",
+      {"info", "driverInfo", "pause", "stats", "sriov", "vfs", "attachments", "vlanCounters"}},
+     {"nics.vfs", {"id", "active", "pciAddress", "ownerWorldId", "stats"}},
+     {"nics.attachments", {"branch", "vlanId"}},
+     {"nics.vlanCounters", {"vlanId", "rxPackets", "txPackets"}}},
+    ImportNic,
+    ExportNic,
+};
+
+} // namespace Model

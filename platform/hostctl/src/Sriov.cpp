@@ -1,0 +1,107 @@
+//===- Sriov.cpp - SR-IOV NICs and their virtual functions ----------------===//
+//
+// The SR-IOV operations of the network root: the NICs with SR-IOV enabled,
+// their virtual functions and the counters of one virtual function, over the
+// sriov_nic and sriov_vf tables of model/NicPart.cpp.
+//
+//===----------------------------------------------------------------------===//
+#include "TvkCtl/Network/NetworkInfoImpl.h"
+
+#include "HostCtl/Lib.h"
+#include "TvkCtl/Network/PnicImpl.h"
+#include "model/NicModel.h"
+#include "model/Store.h"
+
+#include <nlohmann/json.hpp>
+
+namespace TvkCtl::Network {
+
+bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
+
+using HostCtl::Lib::HostCtlException;
+using Model::Statement;
+using Model::Store;
+using namespace HostCtl::Network;
+
+namespace {
+
+bool IsSriovNic(Store& store, const std::string& name) {
+  Statement row = store.Prepare("SELECT 1 FROM sriov_nic WHERE nic = ?");
+  row.Bind(1, name);
+  return row.Step();
+}
+
+/// Refuses a name that is no SR-IOV NIC of the host.
+void RequireSriovNic(Store& store, const std::string& name) {
+  if (!IsSriovNic(store, name)) {
+    if (Model::PnicExists(store, name))
+      throw HostCtlException("NIC " + name + " does not have SR-IOV enabled");
+    throw HostCtlException("There is no physical NIC named " + name + " on this host");
+  }
+}
+
+} // namespace
+
+std::vector<std::unique_ptr<Pnic>> NetworkInfoImpl::GetSriovNics() {
+  Store& store = Store::Host();
+  store.CheckFault("GetSriovNics", "*");
+  return store.Read([&] {
+    std::vector<std::string> names;
+    Statement rows = store.Prepare(
+        "SELECT pnic.name FROM pnic JOIN sriov_nic ON sriov_nic.nic = pnic.name ORDER BY ord");
+    while (rows.Step())
+      names.push_back(rows.Text(0));
+    std::vector<std::unique_ptr<Pnic>> nics;
+    for (const std::string& name : names) {
+      PnicData data;
+      if (LoadPnicData(store, name, data))
+        nics.push_back(std::make_unique<PnicImpl>(std::move(data)));
+    }
+    return nics;
+  });
+}
+
+std::unique_ptr<Pnic> NetworkInfoImpl::GetSriovNicByName(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("GetSriovNicByName", name);
+  return store.Read([&]() -> std::unique_ptr<Pnic> {
+    PnicData data;
+    if (!IsSriovNic(store, name) || !LoadPnicData(store, name, data))
+      return nullptr;
+    return std::make_unique<PnicImpl>(std::move(data));
+  });
+}
+
+std::vector<SriovNicVFInfo> NetworkInfoImpl::GetSriovNicVFInfo(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("GetSriovNicVFInfo", name);
+  return store.Read([&] {
+    RequireSriovNic(store, name);
+    std::vector<SriovNicVFInfo> vfs;
+    Statement rows = store.Prepare("SELECT vf_id, active, pci_address, owner_world FROM sriov_vf "
+                                   "WHERE nic = ? ORDER BY vf_id");
+    rows.Bind(1, name);
+    while (rows.Step())
+      vfs.push_back({static_cast<uint8_t>(rows.Int(0)), rows.Bool(1), rows.Text(2), rows.Text(3)});
+    return vfs;
+  });
+}
+
+void NetworkInfoImpl::GetSriovNicVFStats(SriovNicVFStats& stats, const std::string& name,
+                                         int vfId) {
+  Store& store = Store::Host();
+  store.CheckFault("GetSriovNicVFStats", name);
+  std::string text = store.Read([&] {
+    RequireSriovNic(store, name);
+    Statement row = store.Prepare("SELECT counters FROM sriov_vf WHERE nic = ? AND vf_id = ?");
+    row.BindAll(name, vfId);
+    if (!row.Step())
+      throw HostCtlException("NIC " + name + " has no VF with ID " + std::to_string(vfId));
+    return row.Text(0);
+  });
+  nlohmann::json counters = nlohmann::json::parse(text);
+  for (const auto& key : Model::kVfStatsKeys)
+    stats.*key.member = counters.value(key.key, uint64_t{0});
+}
+
+} // namespace TvkCtl::Network
