@@ -124,6 +124,19 @@ TEST_F(NicHwTest, ExportThenImportGivesTheSameHost) {
   EXPECT_EQ(store.Read([&] { return Model::ExportHost(store); }), first);
 }
 
+TEST_F(NicHwTest, DemoNicsDifferFromEachOther) {
+  Load(Model::Profile("demo"));
+  PnicHwCapabilities caps0{}, caps2{};
+  PnicImpl("vmnic0").GetHwCapabilities(caps0);
+  PnicImpl("vmnic2").GetHwCapabilities(caps2);
+  EXPECT_NE(caps0.supported, caps2.supported);
+  PnicNetqueueInfo info{};
+  ExpectRefusal([&] { PnicImpl("vmnic4").GetNetqueueInfo(info); },
+                "vmnic4 does not support NetQueue");
+  EXPECT_EQ(DcbInfoImpl("vmnic0").GetMode(), 3u);
+  EXPECT_EQ(DcbInfoImpl("vmnic2").GetMode(), 2u);
+}
+
 TEST_F(NicHwTest, ImportNamesTheBadField) {
   struct Case {
     const char* key;      ///< Key of vmnic0 to replace.

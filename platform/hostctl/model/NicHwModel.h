@@ -111,7 +111,7 @@ nlohmann::ordered_json Encode(const DcbState& in);
 nlohmann::ordered_json Encode(const HostCtl::Network::PnicHwCapabilities& in);
 
 /// Whether the host has a physical NIC named \p nic.
-bool PnicExists(Store& store, const std::string& nic);
+bool NicHwPnicExists(Store& store, const std::string& nic);
 
 /// The record of kind \p kind (a host-description key such as "coalesce") of
 /// NIC \p nic as JSON text; false when the NIC has none. The NIC must exist.

@@ -489,7 +489,7 @@ ordered_json Encode(const PnicHwCapabilities& in) {
 
 // --- Store access.
 
-bool PnicExists(Store& store, const std::string& nic) {
+bool NicHwPnicExists(Store& store, const std::string& nic) {
   Statement row = store.Prepare("SELECT 1 FROM pnic WHERE name = ?");
   row.Bind(1, nic);
   return row.Step();

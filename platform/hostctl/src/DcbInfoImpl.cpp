@@ -22,7 +22,7 @@ Model::DcbState ReadDcb(const char* operation, const std::string& nic) {
   Store& store = Store::Host();
   store.CheckFault(operation, nic);
   return store.Read([&] {
-    if (!Model::PnicExists(store, nic))
+    if (!Model::NicHwPnicExists(store, nic))
       throw HostCtlException("There is no physical NIC named " + nic + " on this host");
     std::string text;
     if (!Model::LoadNicHwRecord(store, nic, "dcb", text))

@@ -48,7 +48,7 @@ constexpr MissingText kMissingTexts[] = {
 /// The record of kind \p kind of NIC \p nic; call inside a transaction.
 template <typename Record>
 Record LoadRecord(Store& store, const std::string& nic, const char* kind) {
-  if (!Model::PnicExists(store, nic))
+  if (!Model::NicHwPnicExists(store, nic))
     throw HostCtlException("There is no physical NIC named " + nic + " on this host");
   std::string text;
   if (!Model::LoadNicHwRecord(store, nic, kind, text)) {
