@@ -224,7 +224,8 @@ TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {
                 "The RX ring of vmnic0 takes at most 4096 entries, not 4097");
   ring.rx = 512;
   ring.tx = 0;
-  ExpectRefusal([&] { nic.SetRingParams(ring); }, "vmnic0 needs a TX ring; its size cannot be 0");
+  ExpectRefusal([&] { nic.SetRingParams(ring); },
+                "The TX ring of vmnic0 is required; its size cannot be 0");
   ring.tx = 2048;
   ring.rxMini = 1;
   ExpectRefusal([&] { nic.SetRingParams(ring); },

@@ -46,12 +46,18 @@ TEST(NicHwFormat, EepromDumpRows) {
   const Case cases[] = {
       {"nothing at 0", {}, 0, {{"0000", ""}}},
       {"nothing inside a block", {}, 0x25, {{"0020", Blanks(15)}}},
-      {"unaligned start", {0xaa, 0xbb, 0xcc, 0xdd, 0xee}, 0x13,
+      {"unaligned start",
+       {0xaa, 0xbb, 0xcc, 0xdd, 0xee},
+       0x13,
        {{"0010", Blanks(9) + "aa bb cc dd ee "}}},
       {"two aligned rows", Sequence(0, 32), 0, {{"0000", Bytes(0, 16)}, {"0010", Bytes(16, 16)}}},
-      {"crossing a block", Sequence(1, 4), 0x0e,
+      {"crossing a block",
+       Sequence(1, 4),
+       0x0e,
        {{"0000", Blanks(42) + "01 02 "}, {"0010", "03 04 "}}},
-      {"short last row", Sequence(0x0a, 18), 0x100,
+      {"short last row",
+       Sequence(0x0a, 18),
+       0x100,
        {{"0100", Bytes(0x0a, 16)}, {"0110", "1a 1b "}}},
       {"wide offsets", {0x0a}, 0x12345, {{"12340", Blanks(15) + "0a "}}},
   };
@@ -84,15 +90,18 @@ TEST(NicHwFormat, RegisterDumpRows) {
 }
 
 TEST(NicHwFormat, DcbTexts) {
-  const std::pair<uint32_t, const char*> modes[] = {
-      {0, "0 - Unknown"}, {1, "1 - CEN Mode"}, {2, "2 - CEE Mode"}, {3, "3 - IEEE Mode"},
-      {7, "7 - Unknown"}};
+  const std::pair<uint32_t, const char*> modes[] = {{0, "0 - Unknown"},
+                                                    {1, "1 - CEN Mode"},
+                                                    {2, "2 - CEE Mode"},
+                                                    {3, "3 - IEEE Mode"},
+                                                    {7, "7 - Unknown"}};
   for (const auto& [mode, text] : modes)
     EXPECT_EQ(DcbModeToString(mode), text);
 
-  const std::pair<uint8_t, const char*> masks[] = {
-      {0x00, "0 0 0 0 0 0 0 0"}, {0x09, "1 0 0 1 0 0 0 0"}, {0x80, "0 0 0 0 0 0 0 1"},
-      {0xff, "1 1 1 1 1 1 1 1"}};
+  const std::pair<uint8_t, const char*> masks[] = {{0x00, "0 0 0 0 0 0 0 0"},
+                                                   {0x09, "1 0 0 1 0 0 0 0"},
+                                                   {0x80, "0 0 0 0 0 0 0 1"},
+                                                   {0xff, "1 1 1 1 1 1 1 1"}};
   for (const auto& [mask, text] : masks)
     EXPECT_EQ(DcbIntMaskToString(mask), text);
 
@@ -108,8 +117,8 @@ TEST(NicHwFormat, LoadBalancerCells) {
     const char* cell;
   };
   const Case cases[] = {
-      {0, true, false, "SD"},  {0, true, true, "SA"},  {0, false, true, "UA"},
-      {0, false, false, "UD"}, {1, true, true, "NA"},  {1, false, true, "NA"},
+      {0, true, false, "SD"},  {0, true, true, "SA"},   {0, false, true, "UA"},
+      {0, false, false, "UD"}, {1, true, true, "NA"},   {1, false, true, "NA"},
       {4, true, false, "ND"},  {6, false, false, "ND"}, {7, true, true, "SA"},
       {10, false, true, "UA"},
   };

@@ -227,8 +227,8 @@ void PnicImpl::SetRingParams(const PnicRingParams& params) {
         throw HostCtlException(StrPrintf("The %s ring of %s takes at most %u entries, not %u",
                                          slot.name, nic.c_str(), max, size));
       if (slot.required && max != 0 && size == 0)
-        throw HostCtlException(
-            StrPrintf("%s needs a %s ring; its size cannot be 0", nic.c_str(), slot.name));
+        throw HostCtlException(StrPrintf("The %s ring of %s is required; its size cannot be 0",
+                                         slot.name, nic.c_str()));
     }
     PnicRingParams current = params;
     current.flags = 0;
