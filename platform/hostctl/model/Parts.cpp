@@ -14,6 +14,7 @@ extern const Part kCorePart;
 extern const Part kNicPart;
 
 // NIC hardware settings.
+extern const Part kNicHwPart;
 
 // Switching: standard and distributed switches, port groups, policies, LACP.
 extern const Part kSwitchingPart;
@@ -34,6 +35,7 @@ const std::vector<const Part*>& AllParts() {
       &kNicPart,
 
       // NIC hardware settings.
+      &kNicHwPart,
 
       // Switching.
       &kSwitchingPart,

@@ -1,0 +1,117 @@
+//===- HwCommon.h - Shared pieces of the NIC hardware command families ----===//
+//
+// The hardware families (offloads, coalescing, rings, NetQueue, software
+// simulation, diagnostics, capabilities) declare their parameters and result
+// fields from tables. This header holds the table row types and the loops
+// that turn them into specifications, plus the NIC selection the list
+// commands share.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "Fabrik/CallSpec.h"
+#include "Fabrik/MetaObj.h"
+#include "HostCtl/Network/NetworkInfo.h"
+
+#include <functional>
+#include <memory>
+#include <span>
+#include <string>
+#include <vector>
+
+namespace CorvexCli::NetworkNamespace::NicHw {
+
+/// One parameter of a command.
+struct Param {
+  const std::string& name;              ///< Long name (a file-level constant).
+  const char* shortName;                ///< One letter, or "" for none.
+  Fabrik::CallSpec::ParameterType type; ///< Value type.
+  bool required;                        ///< Must be given.
+  const char* description;              ///< Help text.
+  bool ranged = false;                  ///< Has an integer range constraint.
+  long min = 0;                         ///< Range minimum, when ranged.
+  long max = 0;                         ///< Range maximum, when ranged.
+};
+
+/// Appends one ParameterSpec per row of \p params to \p spec, in order.
+void AddParams(Fabrik::CallSpec::InputSpec& spec, std::span<const Param> params);
+
+/// A new input specification holding \p params.
+std::shared_ptr<Fabrik::CallSpec::InputSpec> InputSpecOf(std::span<const Param> params);
+
+/// An output specification whose root is \p root.
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> OutputSpecOf(Fabrik::MetaObj::MetaObjectPtr root);
+
+/// An output specification whose root is a list of \p element structures.
+std::shared_ptr<Fabrik::CallSpec::OutputSpec>
+ListSpecOf(std::shared_ptr<Fabrik::MetaObj::MetaStruct> element);
+
+/// An output specification whose root is a boolean.
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolSpec();
+
+/// A structure template named \p name with one empty string field per name.
+std::shared_ptr<Fabrik::MetaObj::MetaStruct>
+StringStructure(const std::string& name, std::span<const std::string* const> fields);
+
+/// Joins \p names with commas.
+std::string JoinFields(std::span<const std::string* const> names);
+
+/// "Pnic with name " + name + " not found".
+std::string PnicNotFound(const std::string& name);
+
+/// Makes the error text for a NIC name that finds no NIC.
+using NotFoundText = std::string (*)(const std::string& name);
+
+/// The NICs a list command works on: every NIC (GetPnics with selector 1)
+/// when \p input lacks the string parameter \p param, else the one NIC it
+/// names. A name that finds no NIC adds notFound(name) to \p output and gives
+/// false.
+bool SelectNics(HostCtl::Network::NetworkInfo& info, const Fabrik::CallSpec::Input& input,
+                const std::string& param, NotFoundText notFound, Fabrik::CallSpec::Output& output,
+                std::vector<std::unique_ptr<HostCtl::Network::Pnic>>& nics);
+
+/// Like SelectNics for a string-list parameter: every NIC when it is absent,
+/// else the NICs it names, in the order given; the first name that finds no
+/// NIC adds notFound(name) and gives false.
+bool SelectNicList(HostCtl::Network::NetworkInfo& info, const Fabrik::CallSpec::Input& input,
+                   const std::string& param, NotFoundText notFound,
+                   Fabrik::CallSpec::Output& output,
+                   std::vector<std::unique_ptr<HostCtl::Network::Pnic>>& nics);
+
+/// The NIC named by the string parameter \p param, or null after adding
+/// notFound(name) to \p output.
+std::unique_ptr<HostCtl::Network::Pnic> FindNic(HostCtl::Network::NetworkInfo& info,
+                                                const Fabrik::CallSpec::Input& input,
+                                                const std::string& param, NotFoundText notFound,
+                                                Fabrik::CallSpec::Output& output);
+
+/// Hexadecimal text of \p value with lowercase digits, no prefix, padded with
+/// zeros to at least \p width digits.
+std::string Hex(uint64_t value, int width);
+
+} // namespace CorvexCli::NetworkNamespace::NicHw
+
+namespace CorvexCli::NetworkNamespace {
+
+/// The cell of load-balancer setting \p index in `network nic queue
+/// loadbalancer list`: "S" or "U" by \p supported ("N" for the settings whose
+/// support is not shown), then "A" or "D" by \p allowed.
+std::string NetqueueLbSettingCell(std::size_t index, bool supported, bool allowed);
+
+/// One row of a hexadecimal dump.
+struct HexDumpRow {
+  std::string offset; ///< The "Offset" cell.
+  std::string value;  ///< The "Value" cell.
+};
+
+/// Rows of `network nic eeprom dump` for \p data read from byte \p offset.
+std::vector<HexDumpRow> EepromDumpRows(const std::vector<uint8_t>& data, uint32_t offset);
+
+/// Rows of `network nic register dump` for \p words.
+std::vector<HexDumpRow> RegisterDumpRows(const std::vector<uint32_t>& words);
+
+/// The capability text of `network nic hwCap ... list`: the name of each set
+/// bit from 0 to 30, each followed by three blanks; \p name gives a bit's name.
+std::string HwCapText(uint64_t mask, std::string (*name)(int bit));
+
+} // namespace CorvexCli::NetworkNamespace
