@@ -23,6 +23,7 @@ extern const Part kCorePart;
 // Datapath: VMs and their ports, port statistics, ENS.
 
 // Firewall.
+extern const Part kFirewallPart;
 
 const std::vector<const Part*>& AllParts() {
   static const std::vector<const Part*> parts = {
@@ -41,6 +42,7 @@ const std::vector<const Part*>& AllParts() {
       // Datapath.
 
       // Firewall.
+      &kFirewallPart,
 
   };
   return parts;
