@@ -21,6 +21,7 @@ extern const Part kCorePart;
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
 
 // Datapath: VMs and their ports, port statistics, ENS.
+extern const Part kDatapathPart;
 
 // Firewall.
 extern const Part kFirewallPart;
@@ -40,6 +41,7 @@ const std::vector<const Part*>& AllParts() {
       // IP services.
 
       // Datapath.
+      &kDatapathPart,
 
       // Firewall.
       &kFirewallPart,
