@@ -15,6 +15,7 @@ extern const Part kCorePart;
 // NIC hardware settings.
 
 // Switching: standard and distributed switches, port groups, policies, LACP.
+extern const Part kSwitchingPart;
 
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
 
@@ -35,6 +36,7 @@ const std::vector<const Part*>& AllParts() {
       // NIC hardware settings.
 
       // Switching.
+      &kSwitchingPart,
 
       // IP.
 

@@ -7,6 +7,7 @@
 #pragma once
 
 #include "HostCtl/Network/Pnic.h"
+#include "HostCtl/Network/Switching.h"
 
 #include <cstdint>
 #include <memory>
@@ -32,6 +33,8 @@ public:
   // --- Kernel interfaces.
 
   // --- Port groups.
+  /// Port groups of every standard switch of the selector's kind, in host order.
+  virtual std::vector<std::unique_ptr<PortGroup>> GetAllPortGroups(PortsetGetType type) = 0;
 
   // --- ENS contexts.
   // The host's fast-path (ENS) contexts, their maximum number, their switch
@@ -66,6 +69,15 @@ public:
   static std::unique_ptr<NetworkInfo> GetNetworkInfo();
 
   // --- Switching lookups.
+  /// The distributed or opaque switch of that name, or null.
+  static std::unique_ptr<DVSwitch> GetDVSwitchByName(const std::string& name);
+  /// The standard switch of that name and selector kind, or null.
+  static std::unique_ptr<VirtualSwitch> GetVirtualSwitchById(const std::string& name,
+                                                             PortsetGetType type);
+  /// The port group of that name, or null.
+  static std::unique_ptr<PortGroup> GetPortGroupByName(const std::string& name);
+  /// The distributed port \p param names, or null when the host has none.
+  static std::unique_ptr<DVPort> GetDVPort(const DVPortParam& param);
 };
 
 } // namespace HostCtl::Network

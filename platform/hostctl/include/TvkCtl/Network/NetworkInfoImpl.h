@@ -22,6 +22,8 @@ public:
   // --- Kernel interfaces.
 
   // --- Port groups.
+  std::vector<std::unique_ptr<HostCtl::Network::PortGroup>>
+  GetAllPortGroups(HostCtl::Network::PortsetGetType type) override;
 
   // --- ENS contexts.
   int64_t GetEnsMaxLcores() override;
