@@ -163,6 +163,15 @@ const char* const kFilterCounterKeys[] = {"packetsIn",       "packetsOut",     "
                                           "packetsFiltered", "packetsFaulted", "packetsQueued",
                                           "packetsInjected", "packetErrors"};
 
+/// A counter of the description; counters are shown as signed 64-bit
+/// integers, so larger values are refused.
+int64_t ReadCounter(const JsonObject& object, const char* key) {
+  uint64_t value = object.Counter(key);
+  if (value > static_cast<uint64_t>(INT64_MAX))
+    object.Fail(key, "expected an unsigned integer up to 9223372036854775807");
+  return static_cast<int64_t>(value);
+}
+
 /// Refuses keys of \p object that are not in \p known.
 template <std::size_t N>
 void CheckPlainKeys(const JsonObject& object, const char* const (&known)[N]) {
@@ -270,7 +279,17 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
     counters.Bind(1, id);
     int column = 2;
     for (const char* key : kCounterKeys)
-      counters.Bind(column++, static_cast<int64_t>(stats->Counter(key)));
+      counters.Bind(column++, ReadCounter(*stats, key));
+    // Multicast and broadcast packets are part of all packets, so that the
+    // unicast count (the rest) is never negative.
+    for (const char* direction : {"rx", "tx"}) {
+      std::string total = std::string(direction) + "Packets";
+      std::string multicast = std::string(direction) + "Multicast";
+      std::string broadcast = std::string(direction) + "Broadcast";
+      if (ReadCounter(*stats, multicast.c_str()) + ReadCounter(*stats, broadcast.c_str()) >
+          ReadCounter(*stats, total.c_str()))
+        stats->Fail(total.c_str(), "less than " + multicast + " and " + broadcast + " together");
+    }
     counters.Run();
   }
   int filterOrd = 0;
@@ -284,7 +303,7 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
                          filter.Bool("extended", false));
     int column = 8;
     for (const char* key : kFilterCounterKeys)
-      insertFilter.Bind(column++, static_cast<int64_t>(filter.Counter(key)));
+      insertFilter.Bind(column++, ReadCounter(filter, key));
     insertFilter.Run();
   }
 }
