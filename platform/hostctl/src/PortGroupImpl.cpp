@@ -2,7 +2,10 @@
 //
 // A port group keeps only the policy fields it overrides; the policy in
 // force is computed on every read as the override merged over the switch's
-// policy in force, so it follows later changes of the switch.
+// policy in force, so it follows later changes of the switch. The configured
+// policy handed out carries the override's set mask, and in the fields it
+// does not set the values in force, so that an edit starts from what the
+// port group has now.
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
@@ -68,6 +71,14 @@ PortSecurityPolicy ConfiguredSecurity(Store& store, int64_t id) {
 ShapingPolicy ConfiguredShaping(Store& store, int64_t id) {
   return Model::ParseShaping(
       PolicyText(store, id, "SELECT shaping FROM portgroup_policy WHERE portgroup_id = ?"));
+}
+
+/// \p configured with the fields it does not set holding \p parent's values;
+/// the set mask stays the port group's own.
+template <typename Policy> Policy WithParentValues(const Policy& configured, const Policy& parent) {
+  Policy filled = configured.MergedOver(parent);
+  filled.SetSetMask(configured.GetSetMask());
+  return filled;
 }
 
 void StorePolicy(Store& store, int64_t id, const char* column, const std::string& text) {
@@ -185,7 +196,11 @@ NicTeamingPolicy PortGroupImpl::GetNicTeamingPolicy() const {
 NicTeamingPolicy PortGroupImpl::GetConfiguredNicTeamingPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredNicTeamingPolicy", name_);
-  return store.Read([&] { return ConfiguredTeaming(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredTeaming(store, group.id),
+                            SwitchTeaming(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetNicTeamingPolicy(const NicTeamingPolicy& policy) {
@@ -228,7 +243,11 @@ PortSecurityPolicy PortGroupImpl::GetPortSecurityPolicy() const {
 PortSecurityPolicy PortGroupImpl::GetConfiguredPortSecurityPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredPortSecurityPolicy", name_);
-  return store.Read([&] { return ConfiguredSecurity(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredSecurity(store, group.id),
+                            SwitchSecurity(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetPortSecurityPolicy(const PortSecurityPolicy& policy) {
@@ -252,7 +271,11 @@ ShapingPolicy PortGroupImpl::GetTrafficShapingPolicy() const {
 ShapingPolicy PortGroupImpl::GetConfiguredTrafficShapingPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredTrafficShapingPolicy", name_);
-  return store.Read([&] { return ConfiguredShaping(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredShaping(store, group.id),
+                            SwitchShaping(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetTrafficShapingPolicy(const ShapingPolicy& policy) {
