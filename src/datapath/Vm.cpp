@@ -204,7 +204,8 @@ void VMPortList::ExecuteInternal(const std::shared_ptr<Input>& input,
         continue;
       SwitchKind kind = Classify(switches, portset->GetName());
       for (const auto& port : portset->GetPorts()) {
-        if (port->GetWorldLeader() != world)
+        // World 0 stands for "no world": uplink and kernel ports are no VM's.
+        if (world == 0 || port->GetWorldLeader() != world)
           continue;
         auto row = GetOutputStructure();
         row->SetField(kPortIdField, static_cast<long>(port->GetId()));
