@@ -302,10 +302,14 @@ TEST_F(SwitchingTest, DistributedPortsAndLacp) {
   ASSERT_EQ(lags[0].nics.size(), 2u);
   const LacpNicInfo& first = *lags[0].nics[0];
   EXPECT_STREQ(first.nicName, "vmnic2");
-  EXPECT_EQ(first.actorState, 0x3D);
+  // The record is packed: read its wider fields by value.
+  uint8_t actorState = first.actorState;
+  uint32_t partnerAge = first.partnerAge;
+  uint64_t txErrors = first.txErrors;
+  EXPECT_EQ(actorState, 0x3D);
   EXPECT_STREQ(first.actorFlags, "SA");
-  EXPECT_EQ(first.partnerAge, 3725u);
-  EXPECT_EQ(first.txErrors, 1u);
+  EXPECT_EQ(partnerAge, 3725u);
+  EXPECT_EQ(txErrors, 1u);
 
   // The timeout persists and shows in the actor's state and flags.
   dvs->SetLacpTimeout(1, true, "vmnic2");

@@ -104,6 +104,7 @@ void StorePolicy(Store& store, int64_t id, const char* column, const std::string
 } // namespace
 
 PortGroupImpl::PortGroupImpl(std::string name) : name_(std::move(name)) {}
+PortGroupImpl::PortGroupImpl(PortGroupData data) : name_(data.name), listed_(std::move(data)) {}
 PortGroupImpl::~PortGroupImpl() = default;
 
 // --- Connection point.
@@ -111,6 +112,8 @@ PortGroupImpl::~PortGroupImpl() = default;
 std::string PortGroupImpl::GetPortsetName() const {
   Store& store = Store::Host();
   store.CheckFault("GetPortsetName", name_);
+  if (listed_)
+    return listed_->portsetName;
   auto group = store.Read([&] { return FindGroup(store, name_); });
   return group ? group->portsetName : std::string();
 }
@@ -145,6 +148,8 @@ std::string PortGroupImpl::GetName() const {
 uint32_t PortGroupImpl::GetActiveClients() const {
   Store& store = Store::Host();
   store.CheckFault("GetActiveClients", name_);
+  if (listed_)
+    return listed_->activeClients;
   return store.Read([&] {
     GroupRow group = RequireGroup(store, name_);
     Statement row = store.Prepare("SELECT count(*) FROM port WHERE portgroup_id = ? AND "
@@ -158,6 +163,8 @@ uint32_t PortGroupImpl::GetActiveClients() const {
 uint16_t PortGroupImpl::GetVlanId() const {
   Store& store = Store::Host();
   store.CheckFault("GetVlanId", name_);
+  if (listed_)
+    return listed_->vlanId;
   return store.Read([&] { return RequireGroup(store, name_).vlanId; });
 }
 
@@ -174,6 +181,8 @@ void PortGroupImpl::SetVlanId(uint16_t vlanId) {
         .BindAll(static_cast<int>(vlanId), group.id)
         .Run();
   });
+  if (listed_)
+    listed_->vlanId = vlanId;
 }
 
 std::unique_ptr<VirtualSwitch> PortGroupImpl::GetVirtualSwitch() const {
