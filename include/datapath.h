@@ -10,7 +10,28 @@
 
 #include "common/CommandBase.h"
 
+#include <cstdint>
+#include <string>
+
+namespace HostCtl::Network {
+struct FilterStats;
+} // namespace HostCtl::Network
+
 namespace CorvexCli::NetworkNamespace {
+
+/// The VM name shown for world name \p worldName: the name without its first
+/// five characters (the host's world prefix); empty for a shorter name.
+std::string VmNameFromWorldName(const std::string& worldName);
+
+/// Less-than of port filters: filters with the direction flag clear come
+/// first, in ascending byte order of their sort keys, then those with the
+/// flag set, in descending byte order of their sort keys.
+bool sortFilterStats(const HostCtl::Network::FilterStats& a,
+                     const HostCtl::Network::FilterStats& b);
+
+/// Unicast packets: \p total less multicast and broadcast packets, in
+/// unsigned 64-bit arithmetic.
+uint64_t UnicastPackets(uint64_t total, uint64_t multicast, uint64_t broadcast);
 
 // VMs and their ports (Vm.cpp).
 

@@ -24,8 +24,10 @@ extern const Part kSwitchingPart;
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
 
 // Datapath: VMs and their ports, port statistics, ENS.
+extern const Part kDatapathPart;
 
 // Firewall.
+extern const Part kFirewallPart;
 
 const std::vector<const Part*>& AllParts() {
   static const std::vector<const Part*> parts = {
@@ -45,8 +47,10 @@ const std::vector<const Part*>& AllParts() {
       // IP services.
 
       // Datapath.
+      &kDatapathPart,
 
       // Firewall.
+      &kFirewallPart,
 
   };
   return parts;

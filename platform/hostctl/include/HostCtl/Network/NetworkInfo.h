@@ -50,6 +50,29 @@ public:
   virtual std::vector<std::unique_ptr<PortGroup>> GetAllPortGroups(PortsetGetType type) = 0;
 
   // --- ENS contexts.
+  // The host's fast-path (ENS) contexts, their maximum number, their switch
+  // and their NUMA node. An argument that can never be valid on this host (an
+  // id out of range, a context, switch or NUMA node the host does not have)
+  // throws HostCtlException; a valid request that the host declines in its
+  // current state answers false (docs/ens.md).
+  /// The maximum number of ENS contexts.
+  virtual int64_t GetEnsMaxLcores() = 0;
+  /// Sets the maximum; false when more contexts exist than \p count.
+  virtual bool SetEnsMaxLcores(int64_t count) = 0;
+  /// The ids of the existing contexts, in ascending order.
+  virtual std::vector<int64_t> GetEnsLcores() = 0;
+  /// Creates a context; false when it exists or the maximum is reached.
+  virtual bool AddEnsLcore(int64_t id) = 0;
+  /// Destroys a context; false while it is associated with a switch.
+  virtual bool RemoveEnsLcore(int64_t id) = 0;
+  /// The switch of a context, or "" when it has none.
+  virtual std::string GetEnsLcoreSwitch(int64_t id) = 0;
+  /// The NUMA node of a context.
+  virtual int32_t GetEnsLcoreAffinity(int64_t id) = 0;
+  /// Associates a context with switch \p name; "null" clears the association.
+  virtual bool SetEnsLcoreSwitch(const std::string& name, int64_t id) = 0;
+  /// Sets the NUMA node of a context.
+  virtual bool SetEnsLcoreAffinity(int64_t affinity, int64_t id) = 0;
 };
 
 /// Opens network roots and looks up switching objects by name.

@@ -13,6 +13,7 @@
 #include "HostCtl/Network/Address.h"
 #include "HostCtl/Network/Lacp.h"
 #include "HostCtl/Network/Policy.h"
+#include "HostCtl/Network/PortStats.h"
 
 #include <cstdint>
 #include <map>
@@ -90,6 +91,19 @@ public:
   virtual int GetType() const = 0;
 
   // --- Datapath.
+  /// MAC addresses of the port's client, in order (none when it has none).
+  virtual std::vector<MacAddress> GetMacAddresses() const = 0;
+  /// IPv4 address of the port's client; 0.0.0.0 when the host knows none.
+  virtual Ipv4Address GetPortClientIpv4Address() const = 0;
+  /// The uplink the team scheduler sends the port's traffic through; empty
+  /// when there is none.
+  virtual std::string GetSchedTeamUplink() const = 0;
+  /// The packet filters attached to the port, in the host's order.
+  virtual std::vector<std::unique_ptr<FilterStats>> GetFilterStats() const = 0;
+  /// Byte counters.
+  virtual void GetPortStats(PortStats& stats) const = 0;
+  /// Packet counters.
+  virtual void GetPacketStats(PacketStats& stats) const = 0;
 };
 
 /// A switch of any kind.

@@ -31,6 +31,15 @@ public:
   GetAllPortGroups(HostCtl::Network::PortsetGetType type) override;
 
   // --- ENS contexts.
+  int64_t GetEnsMaxLcores() override;
+  bool SetEnsMaxLcores(int64_t count) override;
+  std::vector<int64_t> GetEnsLcores() override;
+  bool AddEnsLcore(int64_t id) override;
+  bool RemoveEnsLcore(int64_t id) override;
+  std::string GetEnsLcoreSwitch(int64_t id) override;
+  int32_t GetEnsLcoreAffinity(int64_t id) override;
+  bool SetEnsLcoreSwitch(const std::string& name, int64_t id) override;
+  bool SetEnsLcoreAffinity(int64_t affinity, int64_t id) override;
 };
 
 } // namespace TvkCtl::Network

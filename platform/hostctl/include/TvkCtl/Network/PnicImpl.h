@@ -8,6 +8,7 @@
 #pragma once
 
 #include "HostCtl/Network/Pnic.h"
+#include "HostCtl/Network/Switching.h"
 
 #include <cstdint>
 #include <memory>
@@ -95,6 +96,8 @@ public:
   void RunSelfTest(HostCtl::Network::PnicSelfTestResult& result, bool online) override;
 
   // --- Datapath.
+  /// The NIC's uplink port, or null when the NIC is no uplink of a switch.
+  std::unique_ptr<HostCtl::Network::Port> GetPort() const;
 
 protected:
   /// The basic state, read from the host when stale; throws HostCtlException

@@ -230,6 +230,12 @@ public:
   const PortData& GetData() const { return data_; }
 
   // --- Datapath.
+  std::vector<HostCtl::Network::MacAddress> GetMacAddresses() const override;
+  HostCtl::Network::Ipv4Address GetPortClientIpv4Address() const override;
+  std::string GetSchedTeamUplink() const override;
+  std::vector<std::unique_ptr<HostCtl::Network::FilterStats>> GetFilterStats() const override;
+  void GetPortStats(HostCtl::Network::PortStats& stats) const override;
+  void GetPacketStats(HostCtl::Network::PacketStats& stats) const override;
 
 private:
   PortData data_; ///< The port as read from the host.

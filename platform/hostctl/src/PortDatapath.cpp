@@ -1,0 +1,196 @@
+//===- PortDatapath.cpp - Clients, filters and counters of ports ----------===//
+//
+// What the datapath knows of a port: its client's MAC and IPv4 addresses
+// (a VM adapter's from the datapath tables, a kernel interface's or an
+// uplink NIC's from theirs), the uplink the team scheduler chose, the packet
+// filters and the counters. Also the uplink port of a physical NIC and the
+// names of worlds.
+//
+//===----------------------------------------------------------------------===//
+#include "HostCtl/Lib.h"
+#include "TvkCtl/Network/PnicImpl.h"
+#include "TvkCtl/Network/Switching.h"
+#include "TvkCtl/Resource/WorldImpl.h"
+#include "model/Store.h"
+
+namespace TvkCtl::Network {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::Network::FilterStats;
+using HostCtl::Network::Ipv4Address;
+using HostCtl::Network::MacAddress;
+using Model::Statement;
+using Model::Store;
+
+namespace {
+
+/// A counter stored as a signed 64-bit column.
+uint64_t Counter(const Statement& row, int column) {
+  return static_cast<uint64_t>(row.Int(column));
+}
+
+std::string PortObject(int64_t id) {
+  return std::to_string(id);
+}
+
+} // namespace
+
+std::vector<MacAddress> PortImpl::GetMacAddresses() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetMacAddresses", PortObject(data_.id));
+  return store.Read([&] {
+    std::vector<MacAddress> macs;
+    const char* sql = nullptr;
+    if (data_.clientKind == "vm")
+      sql = "SELECT mac FROM vm_port_mac WHERE port_id = ?1 ORDER BY ord";
+    else if (data_.clientKind == "tvknic")
+      sql = "SELECT mac FROM tvknic WHERE port_id = ?1";
+    else
+      sql = "SELECT mac FROM pnic WHERE name = (SELECT client FROM port WHERE id = ?1)";
+    Statement rows = store.Prepare(sql);
+    rows.Bind(1, data_.id);
+    while (rows.Step())
+      macs.emplace_back(rows.Text(0));
+    return macs;
+  });
+}
+
+Ipv4Address PortImpl::GetPortClientIpv4Address() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetPortClientIpv4Address", PortObject(data_.id));
+  return store.Read([&] {
+    const char* sql = nullptr;
+    if (data_.clientKind == "vm")
+      sql = "SELECT ipv4 FROM vm_port WHERE port_id = ?";
+    else if (data_.clientKind == "tvknic")
+      sql = "SELECT ipv4_address FROM tvknic WHERE port_id = ?";
+    else
+      return Ipv4Address();
+    Statement row = store.Prepare(sql);
+    row.Bind(1, data_.id);
+    if (!row.Step() || !Ipv4Address::IsValidAddress(row.Text(0)))
+      return Ipv4Address();
+    return Ipv4Address(row.Text(0));
+  });
+}
+
+std::string PortImpl::GetSchedTeamUplink() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetSchedTeamUplink", PortObject(data_.id));
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT team_uplink FROM vm_port WHERE port_id = ?");
+    row.Bind(1, data_.id);
+    return row.Step() ? row.Text(0) : std::string();
+  });
+}
+
+std::vector<std::unique_ptr<FilterStats>> PortImpl::GetFilterStats() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetFilterStats", PortObject(data_.id));
+  return store.Read([&] {
+    std::vector<std::unique_ptr<FilterStats>> filters;
+    Statement rows = store.Prepare(
+        "SELECT name, sort_key, active, direction, extended, packets_in, packets_out, "
+        "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
+        "packet_errors FROM port_filter WHERE port_id = ? ORDER BY ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step()) {
+      auto filter = std::make_unique<FilterStats>();
+      filter->name = rows.Text(0);
+      filter->sortKey = rows.Text(1);
+      filter->active = rows.Bool(2);
+      filter->direction = rows.Bool(3);
+      filter->extended = rows.Bool(4);
+      filter->packetsIn = Counter(rows, 5);
+      filter->packetsOut = Counter(rows, 6);
+      filter->packetsDropped = Counter(rows, 7);
+      filter->packetsFiltered = Counter(rows, 8);
+      filter->packetsFaulted = Counter(rows, 9);
+      filter->packetsQueued = Counter(rows, 10);
+      filter->packetsInjected = Counter(rows, 11);
+      filter->packetErrors = Counter(rows, 12);
+      filters.push_back(std::move(filter));
+    }
+    return filters;
+  });
+}
+
+void PortImpl::GetPortStats(HostCtl::Network::PortStats& stats) const {
+  Store& store = Store::Host();
+  store.CheckFault("GetPortStats", PortObject(data_.id));
+  store.Read([&] {
+    Statement row = store.Prepare("SELECT rx_bytes, tx_bytes FROM port_counter WHERE port_id = ?");
+    row.Bind(1, data_.id);
+    stats = {};
+    if (row.Step()) {
+      stats.bytesReceived = Counter(row, 0);
+      stats.bytesSent = Counter(row, 1);
+    }
+  });
+}
+
+void PortImpl::GetPacketStats(HostCtl::Network::PacketStats& stats) const {
+  Store& store = Store::Host();
+  store.CheckFault("GetPacketStats", PortObject(data_.id));
+  store.Read([&] {
+    Statement row = store.Prepare(
+        "SELECT tx_packets, tx_multicast, tx_broadcast, rx_packets, rx_multicast, rx_broadcast, "
+        "tx_dropped, rx_dropped FROM port_counter WHERE port_id = ?");
+    row.Bind(1, data_.id);
+    stats = {};
+    if (row.Step()) {
+      stats.packetsSent = Counter(row, 0);
+      stats.multicastPacketsSent = Counter(row, 1);
+      stats.broadcastPacketsSent = Counter(row, 2);
+      stats.packetsReceived = Counter(row, 3);
+      stats.multicastPacketsReceived = Counter(row, 4);
+      stats.broadcastPacketsReceived = Counter(row, 5);
+      stats.transmitDropped = Counter(row, 6);
+      stats.receiveDropped = Counter(row, 7);
+    }
+  });
+}
+
+std::unique_ptr<HostCtl::Network::Port> PnicImpl::GetPort() const {
+  std::string name = GetName();
+  Store& store = Store::Host();
+  store.CheckFault("GetPort", name);
+  return store.Read([&]() -> std::unique_ptr<HostCtl::Network::Port> {
+    Statement row = store.Prepare(
+        "SELECT id, portset_id, coalesce(dvport_key, ''), world_id, port_type FROM port "
+        "WHERE client_kind = 'uplink' AND client = ? ORDER BY id LIMIT 1");
+    row.Bind(1, name);
+    if (!row.Step())
+      return nullptr;
+    PortData data;
+    data.id = row.Int(0);
+    data.portsetId = row.Int(1);
+    data.dvPortId = row.Text(2);
+    data.clientKind = "uplink";
+    data.client = name;
+    data.worldId = row.Int(3);
+    data.type = static_cast<int>(row.Int(4));
+    return std::make_unique<PortImpl>(std::move(data));
+  });
+}
+
+} // namespace TvkCtl::Network
+
+namespace TvkCtl::Resource {
+
+WorldImpl::WorldImpl(int64_t worldId) : worldId_(worldId) {}
+WorldImpl::~WorldImpl() = default;
+
+std::string WorldImpl::GetWorldName() const {
+  Model::Store& store = Model::Store::Host();
+  store.CheckFault("GetWorldName", std::to_string(worldId_));
+  return store.Read([&] {
+    Model::Statement row = store.Prepare("SELECT name FROM world WHERE id = ?");
+    row.Bind(1, worldId_);
+    if (!row.Step())
+      throw HostCtl::Lib::HostCtlException("There is no world with id " + std::to_string(worldId_));
+    return row.Text(0);
+  });
+}
+
+} // namespace TvkCtl::Resource

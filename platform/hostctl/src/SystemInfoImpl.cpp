@@ -1,0 +1,123 @@
+//===- SystemInfoImpl.cpp - Firewall state and the host object -------------===//
+#include "TvkCtl/System/SystemInfoImpl.h"
+
+#include "HostCtl/Lib.h"
+#include "HostCtl/System/Host.h"
+#include "TvkCtl/System/FirewallRulesetImpl.h"
+#include "model/FirewallModel.h"
+
+namespace TvkCtl::System {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::System::FirewallModuleName;
+using HostCtl::System::FirewallRuleset;
+using Model::Statement;
+using Model::Store;
+
+namespace {
+
+/// Refuses a firewall operation while the firewall module is not loaded.
+void RequireModule(Store& store) {
+  if (!Model::IsFirewallModuleLoaded(store))
+    throw HostCtlException(std::string("The firewall module ") + FirewallModuleName +
+                           " is not loaded");
+}
+
+/// One column of the firewall's state row.
+bool ReadState(const char* operation, const char* sql) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, FirewallModuleName);
+  return store.Read([&] {
+    Statement row = store.Prepare(sql);
+    if (!row.Step())
+      throw HostCtlException("The host has no firewall state");
+    return row.Bool(0);
+  });
+}
+
+/// Changes one column of the firewall's state row, with the module loaded.
+void WriteState(const char* operation, const char* sql, bool value) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, FirewallModuleName);
+  store.Write([&] {
+    RequireModule(store);
+    store.Prepare(sql).Bind(1, value).Run();
+  });
+}
+
+} // namespace
+
+SystemInfoImpl::SystemInfoImpl() = default;
+SystemInfoImpl::~SystemInfoImpl() = default;
+
+bool SystemInfoImpl::IsFirewallEnabled() {
+  return ReadState("IsFirewallEnabled", "SELECT enabled FROM fw_state WHERE id = 1");
+}
+
+bool SystemInfoImpl::GetFirewallDefaultAction() {
+  return ReadState("GetFirewallDefaultAction", "SELECT default_pass FROM fw_state WHERE id = 1");
+}
+
+bool SystemInfoImpl::AreFirewallFiltersActive() {
+  return ReadState("AreFirewallFiltersActive", "SELECT filters_active FROM fw_state WHERE id = 1");
+}
+
+void SystemInfoImpl::SetFirewallEnabled(bool enabled) {
+  WriteState("SetFirewallEnabled", "UPDATE fw_state SET enabled = ? WHERE id = 1", enabled);
+}
+
+void SystemInfoImpl::SetFirewallDefaultAction(bool pass) {
+  WriteState("SetFirewallDefaultAction", "UPDATE fw_state SET default_pass = ? WHERE id = 1", pass);
+}
+
+void SystemInfoImpl::LoadFirewallRulesets() {
+  // The simulated firewall applies ruleset changes at once; loading the
+  // configuration puts the filters (back) in place.
+  WriteState("LoadFirewallRulesets", "UPDATE fw_state SET filters_active = ? WHERE id = 1", true);
+}
+
+void SystemInfoImpl::DestroyFirewallFilters() {
+  WriteState("DestroyFirewallFilters", "UPDATE fw_state SET filters_active = ? WHERE id = 1",
+             false);
+}
+
+std::vector<std::unique_ptr<FirewallRuleset>> SystemInfoImpl::GetFirewallRulesets() {
+  Store& store = Store::Host();
+  store.CheckFault("GetFirewallRulesets", "*");
+  std::vector<std::unique_ptr<FirewallRuleset>> sets;
+  store.Read([&] {
+    Statement rows = store.Prepare("SELECT id FROM fw_ruleset ORDER BY ord");
+    while (rows.Step())
+      sets.push_back(std::make_unique<FirewallRulesetImpl>(rows.Text(0)));
+  });
+  return sets;
+}
+
+std::unique_ptr<FirewallRuleset> SystemInfoImpl::GetFirewallRulesetById(const std::string& id) {
+  Store::Host().CheckFault("GetFirewallRulesetById", id);
+  return std::make_unique<FirewallRulesetImpl>(id);
+}
+
+} // namespace TvkCtl::System
+
+namespace HostCtl {
+
+namespace {
+
+class HostImpl : public Host {
+public:
+  std::unique_ptr<Network::NetworkInfo> GetNetworkInfo() override {
+    return Network::NetworkFactory::GetNetworkInfo();
+  }
+  std::unique_ptr<System::SystemInfo> GetSystemInfo() override {
+    return std::make_unique<TvkCtl::System::SystemInfoImpl>();
+  }
+};
+
+} // namespace
+
+std::unique_ptr<Host> HostFactory::GetHost() {
+  return std::make_unique<HostImpl>();
+}
+
+} // namespace HostCtl
