@@ -18,8 +18,18 @@ public:
   // --- SR-IOV.
 
   // --- Netstacks and the kernel IPv6 switch.
+  std::vector<std::unique_ptr<HostCtl::Network::NetstackInstance>> ListNetstackInstances() override;
+  std::unique_ptr<HostCtl::Network::NetstackInstance>
+  LookupNetstackInstanceByKey(const std::string& key) override;
+  void AddNetstackInstance(HostCtl::Network::NetstackInstance& instance, bool disabled) override;
+  void RemoveNetstackInstance(const std::string& key, bool force) override;
+  uint32_t GetNetstackInstanceState(const std::string& key) override;
+  std::vector<std::string> GetPredefinedNetstackInstances() override;
+  bool IsTvkIpv6Enabled() override;
+  void SetTvkIpv6Enabled(bool enabled) override;
 
   // --- Kernel interfaces.
+  std::unique_ptr<HostCtl::Network::TvKernelNicInfo> GetTvKernelNicInfo() override;
 
   // --- Port groups.
 
