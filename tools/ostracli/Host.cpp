@@ -1,8 +1,313 @@
 //===- Host.cpp - The command host -----------------------------------------===//
+//
+// ostracli [GLOBAL OPTIONS] WORD... [COMMAND OPTIONS]
+//
+// The host resolves the words to a node of the command tree, checks the
+// command options against the command's input specification (types,
+// required parameters, enumerations, ranges, patterns) and only then runs the
+// command. Anything the command lets escape is reported, never a crash.
+//
+//===----------------------------------------------------------------------===//
 #include "Host.h"
+
+#include "Fabrik/Format.h"
+#include "Help.h"
+#include "HostCtl/Lib.h"
+#include "Options.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <climits>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <dirent.h>
+#include <dlfcn.h>
+#include <sstream>
+#include <stdexcept>
+#include <unistd.h>
+
+#ifndef OSTRA_VERSION
+#define OSTRA_VERSION "0.0.0"
+#endif
+
+extern "C" {
+typedef void (*RegisterFn)(Fabrik::AutoCli::NamespaceNodePtr&);
+typedef const char* (*VersionFn)();
+}
 
 namespace Ostra {
 
-int RunHost(int argc, char** argv) { return 2; }
+using namespace Fabrik;
+
+namespace {
+
+std::string ExecutableDirectory() {
+  char buffer[PATH_MAX];
+  ssize_t length = ::readlink("/proc/self/exe", buffer, sizeof buffer - 1);
+  if (length <= 0)
+    return ".";
+  buffer[length] = '\0';
+  std::string path(buffer);
+  std::size_t slash = path.find_last_of('/');
+  return slash == std::string::npos ? "." : path.substr(0, slash);
+}
+
+/// Where the host state lives, for help texts.
+std::string HostStateText() {
+  if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
+    return std::string(env) + " (from OSTRACLI_HOST)";
+  std::string base;
+  if (const char* xdg = std::getenv("XDG_STATE_HOME"); xdg && *xdg)
+    base = xdg;
+  else if (const char* home = std::getenv("HOME"); home && *home)
+    base = std::string(home) + "/.local/state";
+  else
+    base = "/tmp";
+  return base + "/ostracli/host.db (created from the demo profile on first use)";
+}
+
+} // namespace
+
+std::string DefaultPluginDirectory() {
+  if (const char* env = std::getenv("OSTRACLI_PLUGIN_DIR"); env && *env)
+    return env;
+  return ExecutableDirectory() + "/../lib/ostracli/plugins";
+}
+
+std::unique_ptr<CommandTree> CommandTree::Load(const std::string& directory) {
+  auto tree = std::make_unique<CommandTree>(AutoCli::Namespace::New());
+  DIR* dir = ::opendir(directory.c_str());
+  if (!dir)
+    throw std::runtime_error("cannot read the plug-in directory " + directory + ": " +
+                             std::strerror(errno));
+  std::vector<std::string> files;
+  while (dirent* entry = ::readdir(dir)) {
+    std::string name = entry->d_name;
+    if (name.size() > 3 && name.compare(name.size() - 3, 3, ".so") == 0)
+      files.push_back(directory + "/" + name);
+  }
+  ::closedir(dir);
+  std::sort(files.begin(), files.end());
+  for (const std::string& file : files) {
+    void* handle = ::dlopen(file.c_str(), RTLD_LAZY | RTLD_LOCAL);
+    if (!handle)
+      throw std::runtime_error(std::string("cannot load the plug-in ") + ::dlerror());
+    auto registerFn = reinterpret_cast<RegisterFn>(::dlsym(handle, "AutoCli_RegisterNamespaces"));
+    if (!registerFn)
+      throw std::runtime_error("the plug-in " + file +
+                               " has no AutoCli_RegisterNamespaces entry point");
+    Plugin plugin{file, ""};
+    if (auto versionFn = reinterpret_cast<VersionFn>(::dlsym(handle, "AutoCli_PluginVersion")))
+      plugin.version = versionFn();
+    AutoCli::NamespaceNodePtr root = tree->root_;
+    registerFn(root);
+    tree->plugins_.push_back(std::move(plugin));
+    // The plug-in stays loaded for the life of the process: its nodes live
+    // in the tree.
+  }
+  return tree;
+}
+
+namespace {
+
+struct GlobalOptions {
+  std::string formatter;                                     ///< --formatter, or "".
+  std::vector<std::pair<std::string, std::string>> params;   ///< --format-param, in order.
+  std::string hostPath;                                      ///< --host, or "".
+  bool help = false;                                         ///< --help or -h.
+  bool version = false;                                      ///< --version.
+};
+
+/// Reads the global options in front of the command path; returns the index
+/// of the first path word, or -1 after reporting a refusal in \p err.
+int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& options,
+                       std::string& err) {
+  std::size_t i = 0;
+  auto value = [&](const std::string& name, std::string& into) -> bool {
+    std::string arg = args[i];
+    std::size_t eq = arg.find('=');
+    if (eq != std::string::npos) {
+      into = arg.substr(eq + 1);
+      return true;
+    }
+    if (i + 1 >= args.size()) {
+      err += "Error: option " + name + " requires a value\n";
+      return false;
+    }
+    into = args[++i];
+    return true;
+  };
+  for (; i < args.size(); ++i) {
+    const std::string& arg = args[i];
+    if (arg.empty() || arg[0] != '-')
+      break;
+    std::string name = arg.substr(0, arg.find('='));
+    if (name == "--help" || name == "-h") {
+      options.help = true;
+    } else if (name == "--version") {
+      options.version = true;
+    } else if (name == "--formatter") {
+      if (!value(name, options.formatter))
+        return -1;
+    } else if (name == "--host") {
+      if (!value(name, options.hostPath))
+        return -1;
+      if (options.hostPath.empty()) {
+        err += "Error: option --host requires a path\n";
+        return -1;
+      }
+    } else if (name == "--format-param") {
+      std::string pair;
+      if (!value(name, pair))
+        return -1;
+      std::size_t eq = pair.find('=');
+      if (eq == std::string::npos || eq == 0) {
+        err += "Error: option --format-param expects KEY=VALUE, got \"" + pair + "\"\n";
+        return -1;
+      }
+      options.params.emplace_back(pair.substr(0, eq), pair.substr(eq + 1));
+    } else {
+      err += "Error: unknown global option " + name +
+             " (global options come before the command; see ostracli --help)\n";
+      return -1;
+    }
+  }
+  return static_cast<int>(i);
+}
+
+bool IsMachineFormat(const std::string& name) {
+  return name == "json" || name == "xml" || name == "csv" || name == "keyvalue";
+}
+
+} // namespace
+
+int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
+                   std::string& err) {
+  GlobalOptions global;
+  int first = ParseGlobalOptions(args, global, err);
+  if (first < 0)
+    return ExitUsage;
+  if (!global.formatter.empty() && !Format::MakeFormatter(global.formatter)) {
+    std::string names;
+    for (const std::string& name : Format::FormatterNames())
+      names += (names.empty() ? "" : ", ") + name;
+    err += "Error: unknown formatter \"" + global.formatter + "\" (one of: " + names + ")\n";
+    return ExitUsage;
+  }
+  if (global.version) {
+    out += "ostracli " OSTRA_VERSION "\n";
+    for (const Plugin& plugin : tree.Plugins()) {
+      std::string name = plugin.path.substr(plugin.path.find_last_of('/') + 1);
+      out += "plug-in " + name + (plugin.version.empty() ? "" : " " + plugin.version) + "\n";
+    }
+    return ExitOk;
+  }
+  if (!global.hostPath.empty())
+    ::setenv("OSTRACLI_HOST", global.hostPath.c_str(), 1);
+
+  // Resolve the command path: words up to the first option.
+  std::vector<std::string> words;
+  std::size_t i = static_cast<std::size_t>(first);
+  for (; i < args.size() && !(args[i].size() > 1 && args[i][0] == '-'); ++i)
+    words.push_back(args[i]);
+  std::vector<std::string> rest(args.begin() + static_cast<long>(i), args.end());
+  bool wantsHelp = global.help;
+  if (!rest.empty() && (rest[0] == "--help" || rest[0] == "-h")) {
+    wantsHelp = true;
+    rest.erase(rest.begin());
+  }
+
+  AutoCli::NamespaceNodePtr node = tree.Root();
+  for (std::size_t w = 0; w < words.size(); ++w) {
+    AutoCli::NamespaceNodePtr next =
+        node->GetType() == AutoCli::NamespaceKind ? node->GetNamespaceNode(words[w]) : nullptr;
+    if (!next) {
+      err += UnknownWordMessage(*node, words[w]);
+      return ExitUsage;
+    }
+    node = next;
+  }
+
+  const bool machine = global.formatter == "json";
+  if (node->GetType() == AutoCli::NamespaceKind) {
+    if (!rest.empty() && !wantsHelp) {
+      err += "Error: " + rest[0] + " is not a command; \"ostracli " +
+             node->GetPathString(' ') + " --help\" lists the commands\n";
+      return ExitUsage;
+    }
+    out += machine ? NamespaceHelpJson(*node) : NamespaceHelpText(*node, HostStateText());
+    return ExitOk;
+  }
+
+  auto command = std::dynamic_pointer_cast<AutoCli::Command>(node);
+  if (!command) {
+    err += "Error: " + node->GetPathString(' ') + " cannot be run\n";
+    return ExitUsage;
+  }
+  std::shared_ptr<CallSpec::InputSpec> inputSpec = command->GetInputSpec();
+  if (wantsHelp) {
+    out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
+    return ExitOk;
+  }
+
+  auto input = CallSpec::Input::New();
+  std::string problem;
+  if (!ParseCommandOptions(*inputSpec, rest, *input, problem)) {
+    err += "Error: " + problem + "\n";
+    return ExitUsage;
+  }
+
+  auto output = CallSpec::Output::New();
+  try {
+    command->Execute(input, output);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  } catch (const std::exception& e) {
+    output->AddErrorMessage(std::string("Internal error: ") + e.what());
+  } catch (...) {
+    output->AddErrorMessage("Internal error: unknown exception");
+  }
+
+  if (const MetaObj::MetaObjectPtr& root = output->GetRootObject()) {
+    std::string name = global.formatter;
+    if (name.empty())
+      name = command->GetDefaultOutputFormatter();
+    if (name.empty())
+      name = "simple";
+    std::unique_ptr<Format::Formatter> formatter = Format::MakeFormatter(name);
+    if (!formatter)
+      formatter = Format::MakeFormatter("simple");
+    Format::Parameters params;
+    if (!IsMachineFormat(name))
+      for (const auto& [key, value] : command->GetDefaultOutputParameters())
+        params.Set(key, value);
+    for (const auto& [key, value] : global.params)
+      params.Set(key, value);
+    std::ostringstream text;
+    formatter->Write(text, root, params);
+    out += text.str();
+  }
+  for (const std::string& message : output->GetErrorMessages())
+    err += message + "\n";
+  return output->HasError() ? ExitCommandError : ExitOk;
+}
+
+int RunHost(int argc, char** argv) {
+  std::vector<std::string> args(argv + 1, argv + argc);
+  std::unique_ptr<CommandTree> tree;
+  try {
+    tree = CommandTree::Load(DefaultPluginDirectory());
+  } catch (const std::exception& e) {
+    std::fprintf(stderr, "Error: %s\n", e.what());
+    return ExitCommandError;
+  }
+  std::string out, err;
+  int status = RunCommandLine(*tree, args, out, err);
+  std::fwrite(out.data(), 1, out.size(), stdout);
+  std::fflush(stdout);
+  std::fwrite(err.data(), 1, err.size(), stderr);
+  return status;
+}
 
 } // namespace Ostra

@@ -70,7 +70,8 @@ public:
   /// one "value: description" entry per value.
   std::string EnumText() const;
   std::string FullEnumText() const;
-  /// One line describing the constraint, such as "INT in [1 - 4096]".
+  /// One line describing the constraint: "one of: a, b", "integer in
+  /// [1 - 4096]" or "matches: <pattern>".
   std::string Describe() const;
 
 private:
@@ -147,10 +148,14 @@ class Input {
 public:
   static std::shared_ptr<Input> New() { return std::make_shared<Input>(); }
 
-  /// Value setters used by the command host after validation.
+  /// Value setters used by the command host after validation. Each replaces
+  /// an earlier value of the same parameter; the overloads with \p typed keep
+  /// the text as the user typed it for GetParameter.
   void SetString(const std::string& name, std::string value);
   void SetInt(const std::string& name, long value);
+  void SetInt(const std::string& name, long value, std::string typed);
   void SetBool(const std::string& name, bool value);
+  void SetBool(const std::string& name, bool value, std::string typed);
   void SetFlag(const std::string& name);
   void AddListValue(const std::string& name, std::string value);
 
@@ -159,6 +164,7 @@ public:
   const std::string& GetParameter(const std::string& name) const;
   long GetParameterInt(const std::string& name) const;
   bool GetParameterBool(const std::string& name) const;
+  /// Replaces the contents of \p values with the values given, in order.
   void GetParameterList(const std::string& name, std::vector<std::string>& values) const;
   bool IsFlagSet(const std::string& name) const;
   bool HasParameter(const std::string& name) const;

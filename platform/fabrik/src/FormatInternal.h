@@ -1,0 +1,73 @@
+//===- FormatInternal.h - Pieces shared by the formatters -------------------===//
+//
+// Private to libfabrik. Each formatter lives in a file of its own
+// (FormatSimple.cpp, FormatTable.cpp, FormatJson.cpp, ...) and exposes one
+// factory function declared here; Format.cpp lists the factories in its table
+// of names. Adding a formatter means adding its file, declaring its factory
+// below and adding one line to that table.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "Fabrik/Format.h"
+
+#include <cstddef>
+#include <iosfwd>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace Fabrik::Format::Detail {
+
+/// Factories of the formatters, one per source file.
+std::unique_ptr<Formatter> MakeSimpleFormatter();
+std::unique_ptr<Formatter> MakeTableFormatter();
+std::unique_ptr<Formatter> MakeJsonFormatter();
+
+/// Which formatter asks; the order of the keys that select fields differs.
+enum class Style { Simple, Table, Json };
+
+/// Writes \p root as the "simple" formatter does; "table" falls back to it.
+void WriteSimple(std::ostream& out, const MetaObj::MetaObjectPtr& root, const Parameters& params);
+
+/// Splits a comma-separated list of names, trimming blanks around each name
+/// and dropping empty names.
+std::vector<std::string> SplitNames(const std::string& value);
+
+/// The fields of \p value to show, in order. \p atRoot is true for the root
+/// structure and the elements of a list at the root, where "fields" applies.
+std::vector<const MetaObj::MetaStruct::Field*>
+SelectFields(const MetaObj::MetaStruct& value, const Parameters& params, bool atRoot, Style style);
+
+/// True when \p value exists and, for a scalar, has been given a value.
+bool IsShown(const MetaObj::MetaObjectPtr& value);
+
+/// True for a list whose items are all scalars (a list of strings).
+bool IsPlainList(const MetaObj::MetaList& list);
+
+/// The text of a boolean, integer or string; empty for anything else.
+std::string ScalarText(const MetaObj::MetaObject& value);
+
+/// One-line text of any value, as a table cell shows it: a list of strings
+/// joined by ", ", a structure as "{A: x, B: y}", a list of structures as
+/// "[{...}, {...}]"; empty for a null or unset value.
+std::string CompactText(const MetaObj::MetaObjectPtr& value, const Parameters& params);
+
+/// The header line of \p value's blocks with its %Field% references
+/// replaced, or null when header:S is absent, empty or "<NONE>".
+std::optional<std::string> HeaderLine(const MetaObj::MetaStruct& value, const Parameters& params);
+
+/// \p text followed by a blank and the unit of field \p field of \p value,
+/// when units:S.F is given and \p text is not empty.
+std::string WithUnit(std::string text, const MetaObj::MetaStruct& value, const std::string& field,
+                     const Parameters& params);
+
+/// The boolean value of \p key, or \p fallback when absent or not a boolean.
+bool BoolParameter(const Parameters& params, const std::string& key, bool fallback);
+
+/// The number of characters of UTF-8 text (bytes that do not continue a
+/// sequence).
+std::size_t DisplayWidth(const std::string& text);
+
+} // namespace Fabrik::Format::Detail

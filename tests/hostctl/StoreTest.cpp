@@ -1,0 +1,215 @@
+//===- StoreTest.cpp - The host store, descriptions and faults -------------===//
+#include "HostCtl/Lib.h"
+#include "HostCtl/Network/NetworkInfo.h"
+#include "model/CoreModel.h"
+#include "model/HostDescription.h"
+#include "model/JsonRead.h"
+#include "model/Store.h"
+
+#include <gtest/gtest.h>
+
+#include <fstream>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace {
+
+using HostCtl::Lib::HostCtlException;
+using nlohmann::ordered_json;
+
+class StoreTest : public ::testing::Test {
+protected:
+  void SetUp() override {
+    char pattern[] = "/tmp/ostra-store-XXXXXX";
+    dir_ = ::mkdtemp(pattern);
+    path_ = dir_ + "/host.db";
+  }
+  void TearDown() override {
+    Model::Store::CloseHost();
+    std::system(("rm -rf " + dir_).c_str());
+  }
+
+  std::unique_ptr<Model::Store> Make(const ordered_json& host) {
+    auto store = Model::Store::Create(path_);
+    Model::ImportHost(*store, host);
+    return store;
+  }
+
+  static ordered_json TwoNics() {
+    return ordered_json::parse(R"({
+      "nics": [
+        {"name": "vmnic0", "pciAddress": "0000:01:00.0", "vendor": "V", "device": "D",
+         "driver": "drv", "speed": 1000, "mac": "00:11:22:33:44:55"},
+        {"name": "vmnic1", "pseudoDevice": "USB-NIC:A:B", "driver": "usb",
+         "adminUp": false, "mac": "00:11:22:33:44:56", "dpuId": "dpu-1"}
+      ],
+      "faults": [{"operation": "GetPnicByName", "object": "vmnic1", "message": "broken"}]
+    })");
+  }
+
+  std::string dir_;  ///< Scratch directory.
+  std::string path_; ///< Store file inside it.
+};
+
+TEST_F(StoreTest, ExportThenImportGivesTheSameHost) {
+  auto store = Make(TwoNics());
+  ordered_json first = Model::ExportHost(*store);
+  EXPECT_EQ(first["nics"].size(), 2u);
+  EXPECT_EQ(first["nics"][1]["dpuId"], "dpu-1");
+  Model::ImportHost(*store, first);
+  EXPECT_EQ(Model::ExportHost(*store), first);
+}
+
+TEST_F(StoreTest, ImportRefusesBadFieldsAndKeepsTheOldHost) {
+  auto store = Make(TwoNics());
+  ordered_json before = Model::ExportHost(*store);
+  struct Case {
+    const char* json;
+    const char* message;
+  } cases[] = {
+      {R"({"nics": [{"name": "x", "mac": "00:11:22:33:44:55", "speed": "fast"}]})",
+       "nics[0].speed: expected an integer in [0 - 400000]"},
+      {R"({"nics": [{"name": "x", "mac": "01:11:22:33:44:55"}]})",
+       "nics[0].mac: expected a unicast MAC address such as 00:50:56:01:02:03"},
+      {R"({"nics": [{"name": "x", "mac": "00:11:22:33:44:55", "colour": 1}]})",
+       "nics[0].colour: unknown field"},
+      {R"({"nicks": []})", "nicks: unknown field"},
+      {R"({"nics": [{"mac": "00:11:22:33:44:55"}]})", "nics[0].name: missing"},
+      {R"({"nics": [{"name": "a", "mac": "00:11:22:33:44:55"},
+                    {"name": "a", "mac": "00:11:22:33:44:56"}]})",
+       "nics[1].name: \"a\" is used by another NIC"},
+  };
+  for (const Case& c : cases) {
+    try {
+      Model::ImportHost(*store, ordered_json::parse(c.json));
+      ADD_FAILURE() << "accepted " << c.json;
+    } catch (const Model::ImportError& e) {
+      EXPECT_EQ(std::string(e.what()), c.message);
+    }
+    EXPECT_EQ(Model::ExportHost(*store), before);
+  }
+}
+
+TEST_F(StoreTest, DeclaredFaultsAreThrownByTheOperation) {
+  Make(TwoNics());
+  Model::Store::SetPath(path_);
+  auto info = HostCtl::Network::NetworkFactory::GetNetworkInfo();
+  EXPECT_NE(info->GetPnicByName("vmnic0"), nullptr);
+  EXPECT_EQ(info->GetPnicByName("nope"), nullptr);
+  try {
+    info->GetPnicByName("vmnic1");
+    ADD_FAILURE() << "no fault";
+  } catch (const HostCtlException& e) {
+    EXPECT_STREQ(e.what(), "broken");
+  }
+}
+
+TEST_F(StoreTest, StoreFailuresAreClearErrors) {
+  // A missing file.
+  try {
+    Model::Store store(dir_ + "/missing.db");
+    ADD_FAILURE();
+  } catch (const HostCtlException& e) {
+    EXPECT_NE(std::string(e.what()).find("There is no host state at"), std::string::npos);
+  }
+  // A file that is not a database.
+  std::ofstream(dir_ + "/text.db") << "just some text that is long enough to be read as a header";
+  try {
+    Model::Store store(dir_ + "/text.db");
+    ADD_FAILURE();
+  } catch (const HostCtlException& e) {
+    EXPECT_EQ(std::string(e.what()), "The file " + dir_ + "/text.db is not a host state database");
+  }
+  // A SQLite database of something else.
+  ::system(("sqlite3 " + dir_ + "/other.db 'CREATE TABLE t(x)' 2>/dev/null").c_str());
+  struct stat st {};
+  if (::stat((dir_ + "/other.db").c_str(), &st) == 0) {
+    try {
+      Model::Store store(dir_ + "/other.db");
+      ADD_FAILURE();
+    } catch (const HostCtlException& e) {
+      EXPECT_EQ(std::string(e.what()),
+                "The file " + dir_ + "/other.db is not a host state database");
+    }
+  }
+}
+
+TEST_F(StoreTest, ReadOnlyStoreRefusesChangesButReads) {
+  if (::geteuid() == 0)
+    GTEST_SKIP() << "root ignores file permissions";
+  Make(TwoNics())->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+  ::chmod(path_.c_str(), 0444);
+  Model::Store store(path_);
+  EXPECT_FALSE(store.Read([&] { return Model::GetSetting(store, "x").has_value(); }));
+  try {
+    store.Write([&] { Model::PutSetting(store, "x", "1"); });
+    ADD_FAILURE();
+  } catch (const HostCtlException& e) {
+    EXPECT_NE(std::string(e.what()).find("read-only"), std::string::npos) << e.what();
+  }
+}
+
+TEST_F(StoreTest, FailedWriteRollsBack) {
+  auto store = Make(TwoNics());
+  EXPECT_THROW(store->Write([&] {
+    Model::PutSetting(*store, "k", "1");
+    throw HostCtlException("refused");
+  }),
+               HostCtlException);
+  EXPECT_FALSE(store->Read([&] { return Model::GetSetting(*store, "k").has_value(); }));
+}
+
+TEST_F(StoreTest, ConcurrentProcessesLoseNoUpdate) {
+  Make(TwoNics());
+  constexpr int kProcesses = 4;
+  constexpr int kIncrements = 50;
+  std::vector<pid_t> children;
+  for (int p = 0; p < kProcesses; ++p) {
+    pid_t pid = ::fork();
+    if (pid == 0) {
+      int status = 0;
+      try {
+        Model::Store store(path_);
+        for (int i = 0; i < kIncrements; ++i) {
+          store.Write([&] {
+            long value = std::stol(Model::GetSetting(store, "counter").value_or("0"));
+            Model::PutSetting(store, "counter", std::to_string(value + 1));
+          });
+        }
+      } catch (...) {
+        status = 1;
+      }
+      ::_exit(status);
+    }
+    children.push_back(pid);
+  }
+  for (pid_t pid : children) {
+    int status = 0;
+    ::waitpid(pid, &status, 0);
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+  }
+  Model::Store store(path_);
+  EXPECT_EQ(store.Read([&] { return Model::GetSetting(store, "counter"); }),
+            std::to_string(kProcesses * kIncrements));
+}
+
+TEST_F(StoreTest, DemoProfileImports) {
+  auto store = Make(Model::Profile("demo"));
+  EXPECT_EQ(Model::ExportHost(*store)["nics"].size(), Model::Profile("demo")["nics"].size());
+}
+
+TEST(ProfileTest, FragmentsMergeByName) {
+  ordered_json demo = Model::Profile("demo");
+  ASSERT_TRUE(demo.contains("nics"));
+  EXPECT_GE(demo["nics"].size(), 4u);
+  EXPECT_THROW(Model::Profile("nope"), Model::ImportError);
+
+  ordered_json into = ordered_json::parse(R"({"nics": [{"name": "a", "x": 1}], "k": 1})");
+  Model::MergeDescription(into, ordered_json::parse(
+                                    R"({"nics": [{"name": "a", "y": 2}, {"name": "b"}], "k": 2})"));
+  EXPECT_EQ(into, ordered_json::parse(
+                      R"({"nics": [{"name": "a", "x": 1, "y": 2}, {"name": "b"}], "k": 2})"));
+}
+
+} // namespace

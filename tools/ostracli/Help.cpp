@@ -1,0 +1,274 @@
+//===- Help.cpp - Help texts generated from the command tree ---------------===//
+#include "Help.h"
+
+
+#include <algorithm>
+#include <cstdio>
+#include <vector>
+
+namespace Ostra {
+
+using namespace Fabrik;
+
+namespace {
+
+std::string Lower(std::string text) {
+  for (char& c : text)
+    if (c >= 'A' && c <= 'Z')
+      c = static_cast<char>(c - 'A' + 'a');
+  return text;
+}
+
+std::size_t EditDistance(const std::string& a, const std::string& b) {
+  std::vector<std::size_t> row(b.size() + 1);
+  for (std::size_t j = 0; j <= b.size(); ++j)
+    row[j] = j;
+  for (std::size_t i = 1; i <= a.size(); ++i) {
+    std::size_t diagonal = row[0];
+    row[0] = i;
+    for (std::size_t j = 1; j <= b.size(); ++j) {
+      std::size_t above = row[j];
+      row[j] = std::min({row[j] + 1, row[j - 1] + 1, diagonal + (a[i - 1] == b[j - 1] ? 0 : 1)});
+      diagonal = above;
+    }
+  }
+  return row[b.size()];
+}
+
+std::string PathText(const AutoCli::NamespaceNode& node) {
+  std::string path = node.GetPathString(' ');
+  return path.empty() ? "ostracli" : "ostracli " + path;
+}
+
+const char* TypeName(CallSpec::ParameterType type) {
+  switch (type) {
+  case CallSpec::String:
+    return "string";
+  case CallSpec::Integer:
+    return "long";
+  case CallSpec::Boolean:
+    return "bool";
+  case CallSpec::Flag:
+    return "flag";
+  case CallSpec::StringList:
+    return "string list";
+  }
+  return "value";
+}
+
+/// Appends \p text as a JSON string.
+void JsonString(std::string& out, const std::string& text) {
+  out += '"';
+  for (unsigned char c : text) {
+    switch (c) {
+    case '"':
+      out += "\\\"";
+      break;
+    case '\\':
+      out += "\\\\";
+      break;
+    case '\n':
+      out += "\\n";
+      break;
+    case '\t':
+      out += "\\t";
+      break;
+    default:
+      if (c < 0x20) {
+        char buffer[8];
+        std::snprintf(buffer, sizeof buffer, "\\u%04x", c);
+        out += buffer;
+      } else {
+        out += static_cast<char>(c);
+      }
+    }
+  }
+  out += '"';
+}
+
+/// Two columns: a name padded to \p width, then the text with its line breaks
+/// indented under the second column.
+void Columns(std::string& out, const std::string& name, const std::string& text,
+             std::size_t width) {
+  std::string line = "  " + name;
+  if (line.size() + 2 > width)
+    line += "\n" + std::string(width, ' ');
+  else
+    line += std::string(width - line.size(), ' ');
+  for (char c : text) {
+    line += c;
+    if (c == '\n')
+      line += std::string(width, ' ');
+  }
+  out += line + "\n";
+}
+
+} // namespace
+
+std::string UnknownWordMessage(const AutoCli::NamespaceNode& node, const std::string& word) {
+  std::string where = node.GetPathString(' ');
+  std::string message = "Error: unknown " +
+                        std::string(node.GetType() == AutoCli::CommandKind ? "argument" : "command") +
+                        " \"" + word + "\"" + (where.empty() ? "" : " under \"" + where + "\"");
+  std::vector<std::string> close;
+  if (node.GetType() == AutoCli::NamespaceKind) {
+    for (const std::string& name : node.GetNamespaceNodeNames()) {
+      if (Lower(name) == Lower(word) || EditDistance(Lower(name), Lower(word)) <= 2)
+        close.push_back(name);
+    }
+  }
+  if (!close.empty()) {
+    message += "; did you mean";
+    for (std::size_t i = 0; i < close.size(); ++i)
+      message += (i ? ", \"" : " \"") + close[i] + "\"";
+    message += "?";
+  }
+  return message + "\n";
+}
+
+std::string NamespaceHelpText(const AutoCli::NamespaceNode& node, const std::string& hostState) {
+  std::string out = "Usage: " + PathText(node) + " {cmd} [cmd options]\n";
+  const bool root = node.GetPathString(' ').empty();
+  if (root) {
+    out = "Usage: ostracli [options] {namespace}+ {cmd} [cmd options]\n\n"
+          "Options:\n";
+    Columns(out, "--formatter=NAME",
+            "Output formatter: simple, table, json (the command's default when not given).", 28);
+    Columns(out, "--format-param=KEY=VALUE",
+            "Formatter parameter, repeatable, e.g. fields=Name,MTU or show-header=false.", 28);
+    Columns(out, "--host=PATH", "The host state database to work on.", 28);
+    Columns(out, "-h, --help", "Help of the namespace or command named before it.", 28);
+    Columns(out, "--version", "Versions of ostracli and its plug-ins.", 28);
+    out += "\nExit status: 0 success; 1 the command reported an error; 2 the command line was "
+           "refused\n(unknown command or option, missing or invalid value) and nothing ran.\n";
+    out += "\nHost state: " + hostState + ".\nOverride it with --host or OSTRACLI_HOST.\n";
+  } else if (!node.GetDescription().empty()) {
+    out += "\nDescription:\n  " + node.GetDescription() + "\n";
+  }
+  std::string namespaces, commands;
+  for (const AutoCli::NamespaceNodePtr& child : node.GetNamespaceNodes()) {
+    std::string& into = child->GetType() == AutoCli::NamespaceKind ? namespaces : commands;
+    Columns(into, child->GetName(), child->GetDescription(), 24);
+  }
+  if (!namespaces.empty())
+    out += "\nAvailable Namespaces:\n" + namespaces;
+  if (!commands.empty())
+    out += "\nAvailable Commands:\n" + commands;
+  out += "\nFor more information: " + PathText(node) + (root ? " {namespace} --help\n" : " {cmd} --help\n");
+  return out;
+}
+
+std::string CommandHelpText(const AutoCli::CommandSpec& command,
+                            const CallSpec::InputSpec& spec) {
+  std::string out = "Usage: " + PathText(command) + " [cmd options]\n\nDescription:\n";
+  Columns(out, command.GetName(), command.GetDescription(), 24);
+  if (spec.GetParameters().empty())
+    return out + "\nThis command takes no options.\n";
+  out += "\nCmd options:\n";
+  for (const auto& parameter : spec.GetParameters()) {
+    std::string name = parameter->GetShortName().empty() ? "" : "-" + parameter->GetShortName() + "|";
+    name += "--" + parameter->GetName();
+    if (parameter->GetType() != CallSpec::Flag)
+      name += std::string("=<") + TypeName(parameter->GetType()) + ">";
+    std::string text = parameter->GetExpandedDescription();
+    if (const auto& constraint = parameter->GetConstraint()) {
+      if (constraint->GetType() == CallSpec::IntRange || constraint->GetType() == CallSpec::StringRegex)
+        text += " (" + constraint->Describe() + ")";
+    }
+    if (parameter->GetType() == CallSpec::StringList)
+      text += " (repeat the option for several values)";
+    if (parameter->IsRequired())
+      text += " (required)";
+    Columns(out, name, text, 30);
+  }
+  return out;
+}
+
+std::string NamespaceHelpJson(const AutoCli::NamespaceNode& node) {
+  std::string out = "{\n  \"path\": ";
+  JsonString(out, node.GetPathString(' '));
+  out += ",\n  \"kind\": \"namespace\",\n  \"description\": ";
+  JsonString(out, node.GetDescription());
+  out += ",\n  \"children\": [";
+  bool first = true;
+  for (const AutoCli::NamespaceNodePtr& child : node.GetNamespaceNodes()) {
+    out += first ? "\n    {\"name\": " : ",\n    {\"name\": ";
+    first = false;
+    JsonString(out, child->GetName());
+    out += child->GetType() == AutoCli::NamespaceKind ? ", \"kind\": \"namespace\"" : ", \"kind\": \"command\"";
+    out += ", \"description\": ";
+    JsonString(out, child->GetDescription());
+    out += "}";
+  }
+  out += first ? "]\n}\n" : "\n  ]\n}\n";
+  return out;
+}
+
+std::string CommandHelpJson(const AutoCli::CommandSpec& command,
+                            const CallSpec::InputSpec& spec) {
+  std::string out = "{\n  \"path\": ";
+  JsonString(out, command.GetPathString(' '));
+  out += ",\n  \"kind\": \"command\",\n  \"description\": ";
+  JsonString(out, command.GetDescription());
+  out += ",\n  \"parameters\": [";
+  bool first = true;
+  for (const auto& parameter : spec.GetParameters()) {
+    out += first ? "\n    {" : ",\n    {";
+    first = false;
+    out += "\"name\": ";
+    JsonString(out, parameter->GetName());
+    out += ", \"shortName\": ";
+    JsonString(out, parameter->GetShortName());
+    out += ", \"type\": ";
+    JsonString(out, TypeName(parameter->GetType()));
+    out += ", \"typeCode\": " + std::to_string(static_cast<int>(parameter->GetType()));
+    out += std::string(", \"required\": ") + (parameter->IsRequired() ? "true" : "false");
+    out += ", \"description\": ";
+    JsonString(out, parameter->GetExpandedDescription());
+    if (const auto& constraint = parameter->GetConstraint()) {
+      out += ", \"constraint\": {\"type\": " + std::to_string(static_cast<int>(constraint->GetType()));
+      switch (constraint->GetType()) {
+      case CallSpec::IntRange:
+        out += ", \"min\": " + std::to_string(constraint->GetMin()) +
+               ", \"max\": " + std::to_string(constraint->GetMax());
+        break;
+      case CallSpec::StringRegex:
+        out += ", \"pattern\": ";
+        JsonString(out, constraint->GetPattern());
+        break;
+      default: {
+        out += ", \"values\": [";
+        bool firstValue = true;
+        for (const auto& value : constraint->GetEnumValues()) {
+          out += firstValue ? "{\"value\": " : ", {\"value\": ";
+          firstValue = false;
+          JsonString(out, value.value);
+          out += ", \"description\": ";
+          JsonString(out, value.description);
+          out += "}";
+        }
+        out += "]";
+      }
+      }
+      out += "}";
+    }
+    out += "}";
+  }
+  out += first ? "],\n" : "\n  ],\n";
+  out += "  \"output\": {\"formatter\": ";
+  JsonString(out, command.GetDefaultOutputFormatter());
+  out += ", \"parameters\": [";
+  first = true;
+  for (const auto& [key, value] : command.GetDefaultOutputParameters()) {
+    out += first ? "[" : ", [";
+    first = false;
+    JsonString(out, key);
+    out += ", ";
+    JsonString(out, value);
+    out += "]";
+  }
+  out += "]}\n}\n";
+  return out;
+}
+
+} // namespace Ostra

@@ -1,0 +1,181 @@
+//===- Options.cpp - Command options against an input specification ------===//
+#include "Options.h"
+
+#include <cerrno>
+#include <cstdlib>
+#include <set>
+
+namespace Ostra {
+
+using namespace Fabrik::CallSpec;
+
+bool ParseBoolWord(const std::string& text, bool& value) {
+  std::string word;
+  for (char c : text)
+    word += static_cast<char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+  if (word == "true" || word == "1" || word == "yes" || word == "on") {
+    value = true;
+    return true;
+  }
+  if (word == "false" || word == "0" || word == "no" || word == "off") {
+    value = false;
+    return true;
+  }
+  return false;
+}
+
+bool ParseInteger(const std::string& text, long& value) {
+  std::size_t start = 0;
+  if (!text.empty() && (text[0] == '-' || text[0] == '+'))
+    start = 1;
+  if (start >= text.size() || text.size() - start > 20)
+    return false;
+  for (std::size_t i = start; i < text.size(); ++i)
+    if (text[i] < '0' || text[i] > '9')
+      return false;
+  errno = 0;
+  char* end = nullptr;
+  long long parsed = std::strtoll(text.c_str(), &end, 10);
+  if (errno == ERANGE || *end != '\0')
+    return false;
+  value = static_cast<long>(parsed);
+  return true;
+}
+
+namespace {
+
+std::string Quote(const std::string& text) {
+  // Keeps messages readable for long or binary input.
+  std::string shown = text.size() > 64 ? text.substr(0, 64) + "..." : text;
+  std::string out = "\"";
+  for (unsigned char c : shown) {
+    if (c < 0x20 || c == 0x7f) {
+      static const char hex[] = "0123456789abcdef";
+      out += "\\x";
+      out += hex[c >> 4];
+      out += hex[c & 15];
+    } else {
+      out += static_cast<char>(c);
+    }
+  }
+  return out + "\"";
+}
+
+std::string OptionName(const ParameterSpec& spec) { return "--" + spec.GetName(); }
+
+bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
+           std::string& problem) {
+  const std::string name = OptionName(spec);
+  const auto& constraint = spec.GetConstraint();
+  switch (spec.GetType()) {
+  case Integer: {
+    long number = 0;
+    if (!ParseInteger(value, number)) {
+      problem = "option " + name + ": " + Quote(value) + " is not an integer";
+      return false;
+    }
+    if (constraint) {
+      if (auto bad = constraint->CheckInt(number)) {
+        problem = "option " + name + ": " + *bad;
+        return false;
+      }
+    }
+    input.SetInt(spec.GetName(), number);
+    input.SetString(spec.GetName(), value);
+    input.SetInt(spec.GetName(), number);
+    return true;
+  }
+  case Boolean: {
+    bool flag = false;
+    if (!ParseBoolWord(value, flag)) {
+      problem = "option " + name + ": " + Quote(value) +
+                " is not a boolean (true/false, yes/no, on/off, 1/0)";
+      return false;
+    }
+    input.SetBool(spec.GetName(), flag);
+    return true;
+  }
+  case String:
+  case StringList:
+    if (constraint) {
+      if (auto bad = constraint->CheckString(value)) {
+        problem = "option " + name + ": " + *bad;
+        return false;
+      }
+    }
+    if (spec.GetType() == String)
+      input.SetString(spec.GetName(), value);
+    else
+      input.AddListValue(spec.GetName(), value);
+    return true;
+  case Flag:
+    input.SetFlag(spec.GetName());
+    return true;
+  }
+  problem = "option " + name + " has an unknown type";
+  return false;
+}
+
+} // namespace
+
+bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& args,
+                         Input& input, std::string& problem) {
+  std::set<std::string> seen;
+  for (std::size_t i = 0; i < args.size(); ++i) {
+    const std::string& arg = args[i];
+    std::shared_ptr<ParameterSpec> parameter;
+    std::string value;
+    bool hasValue = false;
+    if (arg.size() > 2 && arg.compare(0, 2, "--") == 0) {
+      std::size_t eq = arg.find('=');
+      std::string name = arg.substr(2, eq == std::string::npos ? std::string::npos : eq - 2);
+      parameter = spec.FindParameter(name);
+      if (!parameter) {
+        problem = "unknown option --" + name;
+        return false;
+      }
+      if (eq != std::string::npos) {
+        value = arg.substr(eq + 1);
+        hasValue = true;
+      }
+    } else if (arg.size() == 2 && arg[0] == '-' && arg[1] != '-') {
+      parameter = spec.FindShortParameter(arg.substr(1));
+      if (!parameter) {
+        problem = "unknown option " + arg;
+        return false;
+      }
+    } else {
+      problem = "unexpected argument " + Quote(arg) + " (options are written --name VALUE)";
+      return false;
+    }
+    const std::string name = OptionName(*parameter);
+    if (parameter->GetType() == Flag) {
+      if (hasValue) {
+        problem = "option " + name + " takes no value";
+        return false;
+      }
+    } else if (!hasValue) {
+      if (i + 1 >= args.size()) {
+        problem = "option " + name + " requires a value";
+        return false;
+      }
+      value = args[++i];
+    }
+    if (parameter->GetType() != StringList && !seen.insert(parameter->GetName()).second) {
+      problem = "option " + name + " is given more than once";
+      return false;
+    }
+    if (!Store(*parameter, value, input, problem))
+      return false;
+  }
+  for (const auto& parameter : spec.GetParameters()) {
+    if (parameter->IsRequired() && !input.HasParameter(parameter->GetName())) {
+      problem = "missing required option " + OptionName(*parameter) +
+                (parameter->GetShortName().empty() ? "" : " (-" + parameter->GetShortName() + ")");
+      return false;
+    }
+  }
+  return true;
+}
+
+} // namespace Ostra

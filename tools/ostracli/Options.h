@@ -1,0 +1,26 @@
+//===- Options.h - Command options against an input specification --------===//
+#pragma once
+
+#include "Fabrik/CallSpec.h"
+
+#include <string>
+#include <vector>
+
+namespace Ostra {
+
+/// Parses \p args (the words after the command path) into \p input: long
+/// options "--name VALUE" and "--name=VALUE", short options "-s VALUE"; flags
+/// take no value; a string list repeats its option. Checks types, required
+/// parameters and constraints. On a refusal returns false with a message
+/// naming the option in \p problem.
+bool ParseCommandOptions(const Fabrik::CallSpec::InputSpec& spec,
+                         const std::vector<std::string>& args, Fabrik::CallSpec::Input& input,
+                         std::string& problem);
+
+/// Boolean words: true/false, 1/0, yes/no, on/off, in any case.
+bool ParseBoolWord(const std::string& text, bool& value);
+
+/// A decimal 64-bit integer with an optional sign and nothing else.
+bool ParseInteger(const std::string& text, long& value);
+
+} // namespace Ostra
