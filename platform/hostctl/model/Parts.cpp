@@ -19,6 +19,7 @@ extern const Part kCorePart;
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
 
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
+extern const Part kIpServicesPart;
 
 // Datapath: VMs and their ports, port statistics, ENS.
 
@@ -37,6 +38,7 @@ const std::vector<const Part*>& AllParts() {
       // IP.
 
       // IP services.
+      &kIpServicesPart,
 
       // Datapath.
 
