@@ -1,10 +1,10 @@
 //===- StoreTest.cpp - The host store, descriptions and faults -------------===//
+#include "model/Store.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
 #include "model/CoreModel.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
-#include "model/Store.h"
 
 #include <gtest/gtest.h>
 
@@ -206,10 +206,36 @@ TEST(ProfileTest, FragmentsMergeByName) {
   EXPECT_THROW(Model::Profile("nope"), Model::ImportError);
 
   ordered_json into = ordered_json::parse(R"({"nics": [{"name": "a", "x": 1}], "k": 1})");
-  Model::MergeDescription(into, ordered_json::parse(
-                                    R"({"nics": [{"name": "a", "y": 2}, {"name": "b"}], "k": 2})"));
+  Model::MergeDescription(
+      into, ordered_json::parse(R"({"nics": [{"name": "a", "y": 2}, {"name": "b"}], "k": 2})"));
   EXPECT_EQ(into, ordered_json::parse(
                       R"({"nics": [{"name": "a", "x": 1, "y": 2}, {"name": "b"}], "k": 2})"));
+}
+
+} // namespace
+
+namespace {
+
+TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
+  auto store = Make(TwoNics());
+  store->BeginBatch();
+  store->Write([&] { Model::PutSetting(*store, "a", "1"); });
+  EXPECT_THROW(store->Write([&] {
+    Model::PutSetting(*store, "b", "1");
+    throw HostCtlException("refused");
+  }),
+               HostCtlException);
+  store->Write([&] { Model::PutSetting(*store, "c", "1"); });
+  store->EndBatch(true);
+  Model::Store other(path_);
+  EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "a").has_value(); }));
+  EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "b").has_value(); }));
+  EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "c").has_value(); }));
+
+  store->BeginBatch();
+  store->Write([&] { Model::PutSetting(*store, "d", "1"); });
+  store->EndBatch(false);
+  EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "d").has_value(); }));
 }
 
 } // namespace

@@ -61,7 +61,9 @@ std::string Quote(const std::string& text) {
   return out + "\"";
 }
 
-std::string OptionName(const ParameterSpec& spec) { return "--" + spec.GetName(); }
+std::string OptionName(const ParameterSpec& spec) {
+  return "--" + spec.GetName();
+}
 
 bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
            std::string& problem) {
@@ -80,9 +82,7 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
         return false;
       }
     }
-    input.SetInt(spec.GetName(), number);
-    input.SetString(spec.GetName(), value);
-    input.SetInt(spec.GetName(), number);
+    input.SetInt(spec.GetName(), number, value);
     return true;
   }
   case Boolean: {
@@ -92,7 +92,7 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
                 " is not a boolean (true/false, yes/no, on/off, 1/0)";
       return false;
     }
-    input.SetBool(spec.GetName(), flag);
+    input.SetBool(spec.GetName(), flag, value);
     return true;
   }
   case String:
@@ -118,8 +118,8 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
 
 } // namespace
 
-bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& args,
-                         Input& input, std::string& problem) {
+bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& args, Input& input,
+                         std::string& problem) {
   std::set<std::string> seen;
   for (std::size_t i = 0; i < args.size(); ++i) {
     const std::string& arg = args[i];
