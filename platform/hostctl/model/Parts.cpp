@@ -17,6 +17,7 @@ extern const Part kCorePart;
 // Switching: standard and distributed switches, port groups, policies, LACP.
 
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
+extern const Part kIpPart;
 
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
 
@@ -35,6 +36,7 @@ const std::vector<const Part*>& AllParts() {
       // Switching.
 
       // IP.
+      &kIpPart,
 
       // IP services.
 
