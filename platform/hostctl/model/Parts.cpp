@@ -15,6 +15,7 @@ extern const Part kCorePart;
 // NIC hardware settings.
 
 // Switching: standard and distributed switches, port groups, policies, LACP.
+extern const Part kSwitchingPart;
 
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
 extern const Part kIpPart;
@@ -34,6 +35,7 @@ const std::vector<const Part*>& AllParts() {
       // NIC hardware settings.
 
       // Switching.
+      &kSwitchingPart,
 
       // IP.
       &kIpPart,
