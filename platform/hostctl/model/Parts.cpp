@@ -21,6 +21,7 @@ extern const Part kSwitchingPart;
 extern const Part kIpPart;
 
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
+extern const Part kIpServicesPart;
 
 // Datapath: VMs and their ports, port statistics, ENS.
 
@@ -41,6 +42,7 @@ const std::vector<const Part*>& AllParts() {
       &kIpPart,
 
       // IP services.
+      &kIpServicesPart,
 
       // Datapath.
 

@@ -1,6 +1,7 @@
 //===- TvkCtl/Network/NetworkInfoImpl.h - Network root of the host --------===//
 #pragma once
 
+#include "HostCtl/Network/Connection.h"
 #include "HostCtl/Network/NetworkInfo.h"
 
 namespace TvkCtl::Network {
@@ -36,6 +37,16 @@ public:
   GetAllPortGroups(HostCtl::Network::PortsetGetType type) override;
 
   // --- ENS contexts.
+
+  // --- Connections of a netstack (IP services).
+  /// Append the netstack's TCP, UDP or raw IP sockets to \p list, in the
+  /// host's order; a netstack that does not exist is refused.
+  void GetCurrentTcpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                      const std::string& netstack);
+  void GetCurrentUdpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                      const std::string& netstack);
+  void GetCurrentIpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                     const std::string& netstack);
 };
 
 } // namespace TvkCtl::Network
