@@ -15,8 +15,10 @@ extern const Part kCorePart;
 // NIC hardware settings.
 
 // Switching: standard and distributed switches, port groups, policies, LACP.
+extern const Part kSwitchingPart;
 
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
+extern const Part kIpPart;
 
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
 extern const Part kIpServicesPart;
@@ -34,8 +36,10 @@ const std::vector<const Part*>& AllParts() {
       // NIC hardware settings.
 
       // Switching.
+      &kSwitchingPart,
 
       // IP.
+      &kIpPart,
 
       // IP services.
       &kIpServicesPart,

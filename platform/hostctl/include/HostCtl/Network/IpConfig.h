@@ -86,17 +86,17 @@ public:
   void SetIpv6Networks(std::vector<Ipv6Network> networks) { ipv6Networks_ = std::move(networks); }
 
 private:
-  Ipv4Mode mode_ = Ipv4Mode::None;          ///< IPv4 mode.
-  Ipv4Address address_;                     ///< IPv4 address.
-  Ipv4Address netmask_;                     ///< IPv4 netmask.
-  Ipv4Address gateway_;                     ///< IPv4 gateway; 0.0.0.0 for none.
-  bool dhcpDns_ = false;                    ///< Use DHCPv4 DNS servers.
-  bool useIpv6_ = true;                     ///< IPv6 enabled.
-  bool useIpv6Dhcp_ = false;                ///< DHCPv6 enabled.
-  bool useIpv6RouterAdv_ = false;           ///< Router advertisement enabled.
-  bool ipv6DhcpDns_ = false;                ///< Use DHCPv6/RA DNS servers.
-  Ipv6Address ipv6Gateway_;                 ///< IPv6 gateway; "::" for none.
-  std::vector<Ipv6Network> ipv6Networks_;   ///< IPv6 addresses.
+  Ipv4Mode mode_ = Ipv4Mode::None;        ///< IPv4 mode.
+  Ipv4Address address_;                   ///< IPv4 address.
+  Ipv4Address netmask_;                   ///< IPv4 netmask.
+  Ipv4Address gateway_;                   ///< IPv4 gateway; 0.0.0.0 for none.
+  bool dhcpDns_ = false;                  ///< Use DHCPv4 DNS servers.
+  bool useIpv6_ = true;                   ///< IPv6 enabled.
+  bool useIpv6Dhcp_ = false;              ///< DHCPv6 enabled.
+  bool useIpv6RouterAdv_ = false;         ///< Router advertisement enabled.
+  bool ipv6DhcpDns_ = false;              ///< Use DHCPv6/RA DNS servers.
+  Ipv6Address ipv6Gateway_;               ///< IPv6 gateway; "::" for none.
+  std::vector<Ipv6Network> ipv6Networks_; ///< IPv6 addresses.
 };
 
 } // namespace HostCtl::Network

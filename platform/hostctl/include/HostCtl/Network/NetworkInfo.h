@@ -8,6 +8,7 @@
 
 #include "HostCtl/Network/NetstackInstance.h"
 #include "HostCtl/Network/Pnic.h"
+#include "HostCtl/Network/Switching.h"
 #include "HostCtl/Network/TvkNic.h"
 
 #include <cstdint>
@@ -56,6 +57,8 @@ public:
   virtual std::unique_ptr<TvKernelNicInfo> GetTvKernelNicInfo() = 0;
 
   // --- Port groups.
+  /// Port groups of every standard switch of the selector's kind, in host order.
+  virtual std::vector<std::unique_ptr<PortGroup>> GetAllPortGroups(PortsetGetType type) = 0;
 
   // --- ENS contexts.
 };
@@ -67,6 +70,15 @@ public:
   static std::unique_ptr<NetworkInfo> GetNetworkInfo();
 
   // --- Switching lookups.
+  /// The distributed or opaque switch of that name, or null.
+  static std::unique_ptr<DVSwitch> GetDVSwitchByName(const std::string& name);
+  /// The standard switch of that name and selector kind, or null.
+  static std::unique_ptr<VirtualSwitch> GetVirtualSwitchById(const std::string& name,
+                                                             PortsetGetType type);
+  /// The port group of that name, or null.
+  static std::unique_ptr<PortGroup> GetPortGroupByName(const std::string& name);
+  /// The distributed port \p param names, or null when the host has none.
+  static std::unique_ptr<DVPort> GetDVPort(const DVPortParam& param);
 };
 
 } // namespace HostCtl::Network

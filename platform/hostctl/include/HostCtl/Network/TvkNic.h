@@ -134,7 +134,8 @@ public:
   /// Creates an interface on \p point in \p netstack. An unset \p mac, an mtu
   /// or rxQueues of 0 and an empty \p name choose the defaults (a fresh MAC,
   /// MTU 1500, one queue, the lowest free name).
-  virtual std::unique_ptr<TvkNic> AddTvKernelNic(ConnectionPoint* point, const std::string& netstack,
+  virtual std::unique_ptr<TvkNic> AddTvKernelNic(ConnectionPoint* point,
+                                                 const std::string& netstack,
                                                  const IpConfig& config, const MacAddress& mac,
                                                  uint32_t flags, uint32_t mtu, uint32_t rxQueues,
                                                  const std::string& name, bool persistOnly) = 0;

@@ -19,15 +19,15 @@ namespace TvkCtl::Network {
 
 /// The settings of one netstack instance as the host stores them.
 struct NetstackData {
-  std::string key;              ///< Instance key.
-  std::string name;             ///< Display name.
-  uint32_t state = 0;           ///< STATE_ENABLED or STATE_DISABLED.
-  uint32_t maxConnections = 0;  ///< Configured maximum connections.
+  std::string key;                ///< Instance key.
+  std::string name;               ///< Display name.
+  uint32_t state = 0;             ///< STATE_ENABLED or STATE_DISABLED.
+  uint32_t maxConnections = 0;    ///< Configured maximum connections.
   uint32_t curMaxConnections = 0; ///< Running maximum connections.
-  std::string ccAlgorithm;      ///< Congestion control algorithm.
-  bool ipv6 = true;             ///< Configured IPv6 switch.
-  bool curIpv6 = true;          ///< Running IPv6 switch.
-  std::string ecn;              ///< ECN mode.
+  std::string ccAlgorithm;        ///< Congestion control algorithm.
+  bool ipv6 = true;               ///< Configured IPv6 switch.
+  bool curIpv6 = true;            ///< Running IPv6 switch.
+  std::string ecn;                ///< ECN mode.
 };
 
 class NetstackInstanceImpl : public HostCtl::Network::NetstackInstance {
@@ -71,9 +71,9 @@ public:
 
 private:
   void Refresh();
-  NetstackData data_;     ///< Cached settings.
-  bool onHost_;           ///< The instance was read from the host.
-  bool stale_ = false;    ///< Reload before the next read.
+  NetstackData data_;  ///< Cached settings.
+  bool onHost_;        ///< The instance was read from the host.
+  bool stale_ = false; ///< Reload before the next read.
 };
 
 } // namespace TvkCtl::Network

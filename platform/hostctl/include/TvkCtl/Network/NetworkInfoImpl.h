@@ -33,6 +33,8 @@ public:
   std::unique_ptr<HostCtl::Network::TvKernelNicInfo> GetTvKernelNicInfo() override;
 
   // --- Port groups.
+  std::vector<std::unique_ptr<HostCtl::Network::PortGroup>>
+  GetAllPortGroups(HostCtl::Network::PortsetGetType type) override;
 
   // --- ENS contexts.
 

@@ -24,14 +24,14 @@ HostCtl::Network::TvkNicTagType TvkNicTagNameToId(const std::string& name);
 
 /// The cached attributes of a kernel interface.
 struct TvkNicData {
-  std::string name;     ///< Interface name.
-  std::string netstack; ///< Netstack key.
-  std::string mac;      ///< MAC address text.
-  uint32_t mtu = 0;     ///< MTU.
-  uint32_t tsoMss = 0;  ///< TSO maximum segment size.
+  std::string name;      ///< Interface name.
+  std::string netstack;  ///< Netstack key.
+  std::string mac;       ///< MAC address text.
+  uint32_t mtu = 0;      ///< MTU.
+  uint32_t tsoMss = 0;   ///< TSO maximum segment size.
   uint32_t rxQueues = 0; ///< Receive dispatch queues.
-  bool enabled = false; ///< Administratively enabled.
-  int64_t portId = 0;   ///< Port id; 0 without a port.
+  bool enabled = false;  ///< Administratively enabled.
+  int64_t portId = 0;    ///< Port id; 0 without a port.
 };
 
 class TvkNicImpl : public HostCtl::Network::TvkNic, public HostCtl::Network::TvkNicAnnounce {
@@ -68,8 +68,8 @@ public:
 private:
   void Load();
   void SetEnabled(bool enabled);
-  TvkNicData data_;    ///< Cached attributes.
-  bool stale_;         ///< Reload before the next read.
+  TvkNicData data_; ///< Cached attributes.
+  bool stale_;      ///< Reload before the next read.
 };
 
 class TvKernelNicInfoImpl : public HostCtl::Network::TvKernelNicInfo {

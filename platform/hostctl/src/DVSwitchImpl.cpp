@@ -1,0 +1,375 @@
+//===- DVSwitchImpl.cpp - Distributed switches, their ports and LACP ------===//
+#include "HostCtl/Lib.h"
+#include "SwitchingStore.h"
+
+#include <cstring>
+
+namespace TvkCtl::Network {
+
+using HostCtl::Lib::HostCtlException;
+using namespace HostCtl::Network;
+using Model::Statement;
+using Model::Store;
+
+namespace {
+
+/// The identity and settings of a distributed switch.
+struct DvsRow {
+  std::string uuid;         ///< UUID.
+  std::string displayName;  ///< Display name.
+  uint32_t configuredPorts; ///< Configured ports.
+  std::string cdp;          ///< CDP status text.
+  int32_t beaconTimeout;    ///< Beacon timeout, -1 for none.
+  bool branded;             ///< Branded by the maker.
+  bool lacpOnDpu;           ///< LACP runs on the DPU.
+};
+
+DvsRow ReadDvs(Store& store, const PortsetData& data) {
+  Statement row = store.Prepare("SELECT uuid, display_name, configured_ports, cdp, "
+                                "beacon_timeout, branded, lacp_on_dpu FROM dvswitch "
+                                "WHERE portset_id = ?");
+  row.Bind(1, data.id);
+  if (!row.Step())
+    throw HostCtlException("The distributed switch " + data.name + " no longer exists");
+  return DvsRow{row.Text(0),
+                row.Text(1),
+                static_cast<uint32_t>(row.Int(2)),
+                row.Text(3),
+                static_cast<int32_t>(row.Int(4)),
+                row.Bool(5),
+                row.Bool(6)};
+}
+
+DvsRow LoadDvs(const char* operation, const PortsetData& data) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, data.name);
+  return store.Read([&] { return ReadDvs(store, data); });
+}
+
+/// Copies \p text into the fixed text field \p field, always NUL-terminated.
+template <std::size_t N> void CopyText(char (&field)[N], const std::string& text) {
+  std::size_t length = std::min(text.size(), N - 1);
+  std::memcpy(field, text.data(), length);
+  field[length] = '\0';
+}
+
+/// Flag letters of an LACP state: S or F for the timeout, A or P for the mode.
+std::string FlagLetters(uint8_t state) {
+  std::string flags = (state & 0x02) ? "F" : "S";
+  flags += (state & 0x01) ? "A" : "P";
+  return flags;
+}
+
+} // namespace
+
+DVSwitchImpl::DVSwitchImpl(PortsetData data) : PortsetImpl(std::move(data)) {}
+DVSwitchImpl::~DVSwitchImpl() = default;
+
+std::string DVSwitchImpl::GetUuid() const {
+  return LoadDvs("GetUuid", data_).uuid;
+}
+std::string DVSwitchImpl::GetDisplayName() const {
+  return LoadDvs("GetDisplayName", data_).displayName;
+}
+std::string DVSwitchImpl::GetDvsName() const {
+  return LoadDvs("GetDvsName", data_).displayName;
+}
+std::string DVSwitchImpl::GetDvsId() const {
+  return LoadDvs("GetDvsId", data_).uuid;
+}
+uint32_t DVSwitchImpl::GetNumConfiguredPorts() const {
+  return LoadDvs("GetNumConfiguredPorts", data_).configuredPorts;
+}
+std::string DVSwitchImpl::GetCdpStatusString() const {
+  return LoadDvs("GetCdpStatusString", data_).cdp;
+}
+int32_t DVSwitchImpl::GetBeaconTimeout() const {
+  return LoadDvs("GetBeaconTimeout", data_).beaconTimeout;
+}
+bool DVSwitchImpl::IsCorvexBranded() const {
+  return LoadDvs("IsCorvexBranded", data_).branded;
+}
+bool DVSwitchImpl::IsLacpOnDpu() const {
+  return LoadDvs("IsLacpOnDpu", data_).lacpOnDpu;
+}
+
+uint32_t DVSwitchImpl::GetMTU() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetMTU", data_.name);
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT mtu FROM portset WHERE id = ?");
+    row.Bind(1, data_.id);
+    return row.Step() ? static_cast<uint32_t>(row.Int(0)) : 0u;
+  });
+}
+
+std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetDVPorts", data_.name);
+  return store.Read([&] {
+    std::string uuid = ReadDvs(store, data_).uuid;
+    std::vector<std::unique_ptr<DVPort>> ports;
+    Statement rows = store.Prepare("SELECT port_key FROM dvport WHERE portset_id = ? ORDER BY ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step())
+      ports.push_back(std::make_unique<DVPortImpl>(uuid, rows.Text(0)));
+    return ports;
+  });
+}
+
+// --- LACP.
+
+std::vector<LagConfig> DVSwitchImpl::GetLagConfigs() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetLagConfigs", data_.name);
+  return store.Read([&] {
+    std::vector<LagConfig> configs;
+    Statement rows = store.Prepare("SELECT lag_id, name, load_balancing, mode, uplink_count "
+                                   "FROM lag WHERE portset_id = ? ORDER BY ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step()) {
+      LagConfig config;
+      CopyText(config.lagId, std::to_string(rows.Int(0)));
+      CopyText(config.lagName, rows.Text(1));
+      config.loadBalancing = static_cast<uint32_t>(rows.Int(2));
+      config.mode = static_cast<uint32_t>(rows.Int(3));
+      config.uplinkCount = static_cast<uint32_t>(rows.Int(4));
+      configs.push_back(config);
+    }
+    return configs;
+  });
+}
+
+std::map<std::string, DVPortParam> DVSwitchImpl::GetUplinkPortMap() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetUplinkPortMap", data_.name);
+  return store.Read([&] {
+    std::string uuid = ReadDvs(store, data_).uuid;
+    std::map<std::string, DVPortParam> map;
+    Statement rows = store.Prepare(
+        "SELECT p.client, d.port_key, d.connection_id FROM port p JOIN dvport d ON "
+        "d.portset_id = p.portset_id AND d.port_key = p.dvport_key WHERE p.portset_id = ? AND "
+        "p.client_kind = 'uplink'");
+    rows.Bind(1, data_.id);
+    while (rows.Step())
+      map[rows.Text(0)] = DVPortParam{uuid, rows.Text(1), static_cast<uint32_t>(rows.Int(2))};
+    return map;
+  });
+}
+
+std::vector<DVUplinkPortLacp> DVSwitchImpl::GetUplinkPortLacp() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetUplinkPortLacp", data_.name);
+  return store.Read([&] {
+    std::vector<DVUplinkPortLacp> ports;
+    Statement rows = store.Prepare(
+        "SELECT d.port_key, coalesce(l.lacp_enabled, 0), coalesce(l.lacp_mode, 0), "
+        "coalesce(l.uplink_pg_key, '') FROM dvport d LEFT JOIN dvport_lacp l ON l.portset_id = "
+        "d.portset_id AND l.port_key = d.port_key WHERE d.portset_id = ? AND d.is_uplink = 1 "
+        "ORDER BY d.ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step())
+      ports.push_back(DVUplinkPortLacp{rows.Text(0), rows.Bool(1),
+                                       static_cast<uint32_t>(rows.Int(2)), rows.Text(3)});
+    return ports;
+  });
+}
+
+void DVSwitchImpl::GetLacpInfo(std::vector<LacpLagInfo>& lags) const {
+  Store& store = Store::Host();
+  store.CheckFault("GetLacpInfo", data_.name);
+  store.Read([&] {
+    Statement rows =
+        store.Prepare("SELECT lag_id, name, mode FROM lag WHERE portset_id = ? ORDER BY ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step()) {
+      LacpLagInfo& lag = lags.emplace_back();
+      lag.lagId = static_cast<uint32_t>(rows.Int(0));
+      lag.mode = static_cast<uint32_t>(rows.Int(2));
+      CopyText(lag.lagName, rows.Text(1));
+      Statement nics = store.Prepare(
+          "SELECT nic, state, actor_port_number, actor_port_priority, actor_admin_key, "
+          "actor_oper_key, actor_state, partner_age, partner_port_number, "
+          "partner_port_priority, partner_oper_key, partner_state, partner_device_id, "
+          "rx_lacpdus, tx_lacpdus, rx_errors, tx_errors FROM lacp_nic "
+          "WHERE portset_id = ? AND lag_id = ? ORDER BY ord");
+      nics.BindAll(data_.id, rows.Int(0));
+      while (nics.Step()) {
+        auto nic = std::make_unique<LacpNicInfo>();
+        std::memset(nic.get(), 0, sizeof(LacpNicInfo));
+        CopyText(nic->nicName, nics.Text(0));
+        CopyText(nic->state, nics.Text(1));
+        nic->actorPortNumber = static_cast<uint16_t>(nics.Int(2));
+        nic->actorPortPriority = static_cast<uint16_t>(nics.Int(3));
+        nic->actorAdminKey = static_cast<uint16_t>(nics.Int(4));
+        nic->actorOperKey = static_cast<uint16_t>(nics.Int(5));
+        nic->actorState = static_cast<uint8_t>(nics.Int(6));
+        CopyText(nic->actorFlags, FlagLetters(nic->actorState));
+        nic->partnerAge = static_cast<uint32_t>(nics.Int(7));
+        nic->partnerPortNumber = static_cast<uint16_t>(nics.Int(8));
+        nic->partnerPortPriority = static_cast<uint16_t>(nics.Int(9));
+        nic->partnerOperKey = static_cast<uint16_t>(nics.Int(10));
+        nic->partnerState = static_cast<uint8_t>(nics.Int(11));
+        CopyText(nic->partnerDeviceId, nics.Text(12));
+        CopyText(nic->partnerFlags, FlagLetters(nic->partnerState));
+        nic->rxLacpdus = static_cast<uint64_t>(nics.Int(13));
+        nic->txLacpdus = static_cast<uint64_t>(nics.Int(14));
+        nic->rxErrors = static_cast<uint64_t>(nics.Int(15));
+        nic->txErrors = static_cast<uint64_t>(nics.Int(16));
+        lag.nics.push_back(std::move(nic));
+      }
+    }
+  });
+}
+
+void DVSwitchImpl::SetLacpTimeout(uint32_t lagId, bool shortTimeout, const std::string& nicName) {
+  Store& store = Store::Host();
+  store.CheckFault("SetLacpTimeout", data_.name);
+  store.Write([&] {
+    std::string displayName = ReadDvs(store, data_).displayName;
+    Statement lag = store.Prepare("SELECT 1 FROM lag WHERE portset_id = ? AND lag_id = ?");
+    lag.BindAll(data_.id, static_cast<int64_t>(lagId));
+    if (!lag.Step())
+      throw HostCtlException("Unable to set the LACP timeout: " + displayName +
+                             " has no LAG with ID " + std::to_string(lagId));
+    if (shortTimeout)
+      store
+          .Prepare("UPDATE lacp_nic SET actor_state = actor_state | 2 WHERE portset_id = ? AND "
+                   "lag_id = ? AND (? = '' OR nic = ?)")
+          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
+          .Run();
+    else
+      store
+          .Prepare("UPDATE lacp_nic SET actor_state = actor_state & ~2 WHERE portset_id = ? AND "
+                   "lag_id = ? AND (? = '' OR nic = ?)")
+          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
+          .Run();
+    if (!nicName.empty() && store.Changes() == 0)
+      throw HostCtlException("Unable to set the LACP timeout: " + nicName +
+                             " is not a NIC of LAG " + std::to_string(lagId) + " on " +
+                             displayName);
+  });
+}
+
+// --- DVPortImpl.
+
+DVPortImpl::DVPortImpl(DVPortParam param) : param_(std::move(param)) {}
+
+DVPortImpl::DVPortImpl(std::string switchId, std::string dvPortId) {
+  param_.switchUuid = std::move(switchId);
+  param_.portId = std::move(dvPortId);
+}
+
+DVPortImpl::~DVPortImpl() = default;
+
+namespace {
+
+/// The switch and port row a distributed port names.
+struct DVPortRow {
+  PortsetData portset;      ///< Its switch.
+  std::string portgroupKey; ///< Distributed port group key.
+  uint32_t connectionId;    ///< Connection id kept by the host.
+  std::string name;         ///< Port name.
+};
+
+std::optional<DVPortRow> FindDVPort(Store& store, const DVPortParam& param) {
+  auto portset = FindPortsetByIdentifier(store, param.switchUuid);
+  if (!portset)
+    return std::nullopt;
+  Statement row = store.Prepare(
+      "SELECT d.portgroup_key, d.connection_id, coalesce(l.name, '') FROM dvport d "
+      "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+      "WHERE d.portset_id = ? AND d.port_key = ?");
+  row.BindAll(portset->id, param.portId);
+  if (!row.Step())
+    return std::nullopt;
+  return DVPortRow{*portset, row.Text(0), static_cast<uint32_t>(row.Int(1)), row.Text(2)};
+}
+
+DVPortRow RequireDVPort(const char* operation, const DVPortParam& param) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, param.portId);
+  auto row = store.Read([&] { return FindDVPort(store, param); });
+  if (!row)
+    throw HostCtlException("The distributed switch " + param.switchUuid + " has no port " +
+                           param.portId);
+  return *row;
+}
+
+} // namespace
+
+std::string DVPortImpl::GetPortsetName() const {
+  Store& store = Store::Host();
+  auto portset = store.Read([&] { return FindPortsetByIdentifier(store, param_.switchUuid); });
+  return portset ? portset->name : std::string();
+}
+
+int DVPortImpl::GetType() const {
+  return ConnectionPoint::CONNECTION_DVPORT;
+}
+
+std::string DVPortImpl::GetPortGroupName() const {
+  return {};
+}
+
+DVPortParam DVPortImpl::GetDVPortParam() const {
+  return param_;
+}
+
+OpaqueNetworkParam DVPortImpl::GetOpaqueNetworkParam() const {
+  return {};
+}
+
+bool DVPortImpl::IsValid() const {
+  Store& store = Store::Host();
+  return store.Read([&] { return FindDVPort(store, param_).has_value(); });
+}
+
+std::string DVPortImpl::GetPortId() const {
+  return param_.portId;
+}
+
+std::string DVPortImpl::GetName() const {
+  return RequireDVPort("GetName", param_).name;
+}
+
+std::string DVPortImpl::GetDVPortgroupId() const {
+  return RequireDVPort("GetDVPortgroupId", param_).portgroupKey;
+}
+
+bool DVPortImpl::IsInUse(std::vector<std::string>& clients) const {
+  DVPortRow port = RequireDVPort("IsInUse", param_);
+  Store& store = Store::Host();
+  return store.Read([&] {
+    Statement rows = store.Prepare(
+        "SELECT client FROM port WHERE portset_id = ? AND dvport_key = ? ORDER BY id");
+    rows.BindAll(port.portset.id, param_.portId);
+    bool used = false;
+    while (rows.Step()) {
+      clients.push_back(rows.Text(0));
+      used = true;
+    }
+    return used;
+  });
+}
+
+uint32_t DVPortImpl::GetConnectionId() const {
+  return RequireDVPort("GetConnectionId", param_).connectionId;
+}
+
+void DVPortImpl::SetConnectionId(uint32_t connectionId) {
+  Store& store = Store::Host();
+  store.CheckFault("SetConnectionId", param_.portId);
+  store.Write([&] {
+    auto port = FindDVPort(store, param_);
+    if (!port)
+      throw HostCtlException("The distributed switch " + param_.switchUuid + " has no port " +
+                             param_.portId);
+    store.Prepare("UPDATE dvport SET connection_id = ? WHERE portset_id = ? AND port_key = ?")
+        .BindAll(connectionId, port->portset.id, param_.portId)
+        .Run();
+  });
+  param_.connectionId = connectionId;
+}
+
+} // namespace TvkCtl::Network

@@ -1,0 +1,368 @@
+//===- PortsetImpl.cpp - Switch identity, ports and the switch service ----===//
+#include "HostCtl/Lib.h"
+#include "HostCtl/Network/NetworkInfo.h"
+#include "SwitchingStore.h"
+#include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "model/Store.h"
+
+namespace TvkCtl::Network {
+
+using HostCtl::Lib::HostCtlException;
+using namespace HostCtl::Network;
+using Model::Statement;
+using Model::Store;
+
+namespace {
+
+PortsetKind KindOf(const std::string& text) {
+  if (text == "dvs")
+    return PortsetKind::Distributed;
+  if (text == "opaque")
+    return PortsetKind::Opaque;
+  return PortsetKind::Standard;
+}
+
+std::optional<PortsetData> ReadPortset(Statement& row) {
+  if (!row.Step())
+    return std::nullopt;
+  PortsetData data;
+  data.id = row.Int(0);
+  data.name = row.Text(1);
+  data.kind = KindOf(row.Text(2));
+  data.system = row.Bool(3);
+  return data;
+}
+
+/// Switches of \p kind ("standard", "dvs", "opaque"); \p system -1 for both.
+std::vector<PortsetData> ListPortsets(Store& store, const char* kind, int system) {
+  std::vector<PortsetData> list;
+  Statement rows = store.Prepare("SELECT id, name, kind, system FROM portset WHERE kind = ? AND "
+                                 "(? < 0 OR system = ?) ORDER BY ord");
+  rows.BindAll(kind, system, system);
+  while (auto data = ReadPortset(rows))
+    list.push_back(std::move(*data));
+  return list;
+}
+
+} // namespace
+
+std::optional<PortsetData> FindPortset(Store& store, const std::string& name) {
+  Statement row = store.Prepare("SELECT id, name, kind, system FROM portset WHERE name = ?");
+  row.Bind(1, name);
+  return ReadPortset(row);
+}
+
+std::optional<PortsetData> FindPortsetById(Store& store, int64_t id) {
+  Statement row = store.Prepare("SELECT id, name, kind, system FROM portset WHERE id = ?");
+  row.Bind(1, id);
+  return ReadPortset(row);
+}
+
+std::optional<PortsetData> FindPortsetByIdentifier(Store& store, const std::string& id) {
+  Statement row = store.Prepare("SELECT p.id, p.name, p.kind, p.system FROM portset p "
+                                "JOIN dvswitch d ON d.portset_id = p.id WHERE d.uuid = ?");
+  row.Bind(1, id);
+  if (auto data = ReadPortset(row))
+    return data;
+  auto data = FindPortset(store, id);
+  if (data && data->kind != PortsetKind::Standard)
+    return std::nullopt;
+  return data;
+}
+
+std::unique_ptr<Portset> MakePortset(PortsetData data) {
+  if (data.kind == PortsetKind::Standard)
+    return std::make_unique<VirtualSwitchImpl>(std::move(data));
+  return std::make_unique<DVSwitchImpl>(std::move(data));
+}
+
+void RequirePortset(Store& store, const PortsetData& data) {
+  Statement row = store.Prepare("SELECT 1 FROM portset WHERE id = ?");
+  row.Bind(1, data.id);
+  if (!row.Step())
+    throw HostCtlException("The virtual switch " + data.name + " no longer exists");
+}
+
+// --- PortsetImpl.
+
+PortsetImpl::PortsetImpl(PortsetData data) : data_(std::move(data)) {}
+PortsetImpl::~PortsetImpl() = default;
+
+bool PortsetImpl::IsValidVirtualSwitch(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("IsValidVirtualSwitch", name);
+  return store.Read([&] { return FindPortset(store, name).has_value(); });
+}
+
+std::string PortsetImpl::GetIdentifier() const {
+  if (data_.kind == PortsetKind::Standard)
+    return data_.name;
+  Store& store = Store::Host();
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT uuid FROM dvswitch WHERE portset_id = ?");
+    row.Bind(1, data_.id);
+    return row.Step() ? row.Text(0) : data_.name;
+  });
+}
+
+std::string PortsetImpl::GetName() const {
+  return data_.name;
+}
+
+std::string PortsetImpl::GetClassName() const {
+  if (data_.kind == PortsetKind::Standard)
+    return "corvex-vswitch";
+  Store& store = Store::Host();
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT class_name FROM dvswitch WHERE portset_id = ?");
+    row.Bind(1, data_.id);
+    return row.Step() ? row.Text(0) : std::string("corvex-dvs");
+  });
+}
+
+uint32_t PortsetImpl::GetNumPorts() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetNumPorts", data_.name);
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT num_ports FROM portset WHERE id = ?");
+    row.Bind(1, data_.id);
+    return row.Step() ? static_cast<uint32_t>(row.Int(0)) : 0u;
+  });
+}
+
+uint32_t PortsetImpl::GetConfiguredPorts() const {
+  if (data_.kind != PortsetKind::Standard)
+    return dynamic_cast<const DVSwitch&>(*this).GetNumConfiguredPorts();
+  return GetNumPorts();
+}
+
+uint32_t PortsetImpl::GetUsedPorts() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetUsedPorts", data_.name);
+  return store.Read([&] {
+    Statement row = store.Prepare("SELECT count(*) FROM port WHERE portset_id = ?");
+    row.Bind(1, data_.id);
+    row.Step();
+    return static_cast<uint32_t>(row.Int(0));
+  });
+}
+
+std::vector<std::string> PortsetImpl::GetUplinks() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetUplinks", data_.name);
+  return store.Read([&] {
+    std::vector<std::string> names;
+    Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+    rows.Bind(1, data_.id);
+    while (rows.Step())
+      names.push_back(rows.Text(0));
+    return names;
+  });
+}
+
+std::vector<std::unique_ptr<Port>> PortsetImpl::GetPorts() const {
+  Store& store = Store::Host();
+  store.CheckFault("GetPorts", data_.name);
+  return store.Read([&] {
+    std::vector<std::unique_ptr<Port>> ports;
+    Statement rows = store.Prepare(
+        "SELECT p.id, p.portset_id, coalesce(g.name, ''), coalesce(p.dvport_key, ''), "
+        "p.client_kind, p.client, p.world_id, p.port_type FROM port p "
+        "LEFT JOIN portgroup g ON g.id = p.portgroup_id WHERE p.portset_id = ? ORDER BY p.id");
+    rows.Bind(1, data_.id);
+    while (rows.Step()) {
+      PortData port;
+      port.id = rows.Int(0);
+      port.portsetId = rows.Int(1);
+      port.portGroup = rows.Text(2);
+      port.dvPortId = rows.Text(3);
+      port.clientKind = rows.Text(4);
+      port.client = rows.Text(5);
+      port.worldId = rows.Int(6);
+      port.type = static_cast<int>(rows.Int(7));
+      ports.push_back(std::make_unique<PortImpl>(std::move(port)));
+    }
+    return ports;
+  });
+}
+
+// --- PortImpl.
+
+PortImpl::PortImpl(PortData data) : data_(std::move(data)) {}
+PortImpl::~PortImpl() = default;
+
+int64_t PortImpl::GetId() const {
+  return data_.id;
+}
+int64_t PortImpl::GetWorldLeader() const {
+  return data_.worldId;
+}
+std::string PortImpl::GetPortGroupName() const {
+  return data_.portGroup;
+}
+std::string PortImpl::GetDVPortID() const {
+  return data_.dvPortId;
+}
+int PortImpl::GetType() const {
+  return data_.type;
+}
+
+// --- VirtualSwitchInfoImpl: listing and lookup.
+
+VirtualSwitchInfoImpl::VirtualSwitchInfoImpl() = default;
+VirtualSwitchInfoImpl::~VirtualSwitchInfoImpl() = default;
+
+std::vector<std::unique_ptr<Portset>> VirtualSwitchInfoImpl::GetAllSwitches() {
+  Store& store = Store::Host();
+  store.CheckFault("GetAllSwitches", "*");
+  std::vector<std::unique_ptr<Portset>> switches;
+  store.Read([&] {
+    for (const char* kind : {"standard", "dvs", "opaque"})
+      for (PortsetData& data : ListPortsets(store, kind, -1))
+        switches.push_back(MakePortset(std::move(data)));
+  });
+  return switches;
+}
+
+std::vector<std::unique_ptr<VirtualSwitch>>
+VirtualSwitchInfoImpl::GetVirtualSwitches(PortsetGetType type) {
+  Store& store = Store::Host();
+  store.CheckFault("GetVirtualSwitches", "*");
+  std::vector<std::unique_ptr<VirtualSwitch>> switches;
+  store.Read([&] {
+    for (PortsetData& data : ListPortsets(store, "standard", type == PortsetGetSystem ? 1 : 0))
+      switches.push_back(std::make_unique<VirtualSwitchImpl>(std::move(data)));
+  });
+  return switches;
+}
+
+std::unique_ptr<VirtualSwitch>
+VirtualSwitchInfoImpl::GetVirtualSwitchByName(const std::string& name, PortsetGetType type) {
+  Store& store = Store::Host();
+  store.CheckFault("GetVirtualSwitchByName", name);
+  auto data = store.Read([&] { return FindPortset(store, name); });
+  if (!data || data->kind != PortsetKind::Standard || data->system != (type == PortsetGetSystem))
+    return nullptr;
+  return std::make_unique<VirtualSwitchImpl>(std::move(*data));
+}
+
+namespace {
+std::vector<std::unique_ptr<DVSwitch>> ListDistributed(const char* operation, const char* kind) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, "*");
+  std::vector<std::unique_ptr<DVSwitch>> switches;
+  store.Read([&] {
+    for (PortsetData& data : ListPortsets(store, kind, -1))
+      switches.push_back(std::make_unique<DVSwitchImpl>(std::move(data)));
+  });
+  return switches;
+}
+
+std::unique_ptr<DVSwitch> FindDistributed(const char* operation, const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, name);
+  auto data = store.Read([&]() -> std::optional<PortsetData> {
+    auto found = FindPortset(store, name);
+    if (found && found->kind != PortsetKind::Standard)
+      return found;
+    Statement row = store.Prepare("SELECT p.id, p.name, p.kind, p.system FROM portset p JOIN "
+                                  "dvswitch d ON d.portset_id = p.id WHERE d.display_name = ? "
+                                  "ORDER BY p.ord LIMIT 1");
+    row.Bind(1, name);
+    return ReadPortset(row);
+  });
+  if (!data)
+    return nullptr;
+  return std::make_unique<DVSwitchImpl>(std::move(*data));
+}
+
+bool IsKind(const char* operation, const std::string& name, PortsetKind kind) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, name);
+  auto data = store.Read([&] { return FindPortset(store, name); });
+  return data && data->kind == kind;
+}
+} // namespace
+
+std::vector<std::unique_ptr<DVSwitch>> VirtualSwitchInfoImpl::GetDVSwitches() {
+  return ListDistributed("GetDVSwitches", "dvs");
+}
+
+std::vector<std::unique_ptr<DVSwitch>> VirtualSwitchInfoImpl::GetOpaqueDVSwitches() {
+  return ListDistributed("GetOpaqueDVSwitches", "opaque");
+}
+
+std::unique_ptr<DVSwitch> VirtualSwitchInfoImpl::GetDVSwitchByName(const std::string& name) {
+  return FindDistributed("GetDVSwitchByName", name);
+}
+
+bool VirtualSwitchInfoImpl::IsLegacySwitch(const std::string& name) {
+  return IsKind("IsLegacySwitch", name, PortsetKind::Standard);
+}
+
+bool VirtualSwitchInfoImpl::IsDVSwitch(const std::string& name) {
+  return IsKind("IsDVSwitch", name, PortsetKind::Distributed);
+}
+
+bool VirtualSwitchInfoImpl::IsOpaqueSwitch(const std::string& name) {
+  return IsKind("IsOpaqueSwitch", name, PortsetKind::Opaque);
+}
+
+// --- Lookups of the network root and factory.
+
+std::vector<std::unique_ptr<PortGroup>> NetworkInfoImpl::GetAllPortGroups(PortsetGetType type) {
+  Store& store = Store::Host();
+  store.CheckFault("GetAllPortGroups", "*");
+  std::vector<std::unique_ptr<PortGroup>> groups;
+  store.Read([&] {
+    Statement rows = store.Prepare("SELECT g.name FROM portgroup g JOIN portset p ON p.id = "
+                                   "g.portset_id WHERE g.system = ? ORDER BY p.ord, g.ord");
+    rows.Bind(1, type == PortsetGetSystem ? 1 : 0);
+    while (rows.Step())
+      groups.push_back(std::make_unique<PortGroupImpl>(rows.Text(0)));
+  });
+  return groups;
+}
+
+} // namespace TvkCtl::Network
+
+namespace HostCtl::Network {
+
+using TvkCtl::Network::PortsetData;
+using TvkCtl::Network::PortsetKind;
+
+std::unique_ptr<DVSwitch> NetworkFactory::GetDVSwitchByName(const std::string& name) {
+  return TvkCtl::Network::FindDistributed("GetDVSwitchByName", name);
+}
+
+std::unique_ptr<VirtualSwitch> NetworkFactory::GetVirtualSwitchById(const std::string& name,
+                                                                    PortsetGetType type) {
+  Model::Store& store = Model::Store::Host();
+  store.CheckFault("GetVirtualSwitchById", name);
+  auto data = store.Read([&] { return TvkCtl::Network::FindPortset(store, name); });
+  if (!data || data->kind != PortsetKind::Standard || data->system != (type == PortsetGetSystem))
+    return nullptr;
+  return std::make_unique<TvkCtl::Network::VirtualSwitchImpl>(std::move(*data));
+}
+
+std::unique_ptr<PortGroup> NetworkFactory::GetPortGroupByName(const std::string& name) {
+  Model::Store& store = Model::Store::Host();
+  store.CheckFault("GetPortGroupByName", name);
+  bool found = store.Read([&] {
+    Model::Statement row = store.Prepare("SELECT 1 FROM portgroup WHERE name = ?");
+    row.Bind(1, name);
+    return row.Step();
+  });
+  if (!found)
+    return nullptr;
+  return std::make_unique<TvkCtl::Network::PortGroupImpl>(name);
+}
+
+std::unique_ptr<DVPort> NetworkFactory::GetDVPort(const DVPortParam& param) {
+  auto port = std::make_unique<TvkCtl::Network::DVPortImpl>(param);
+  if (!port->IsValid())
+    return nullptr;
+  return port;
+}
+
+} // namespace HostCtl::Network
