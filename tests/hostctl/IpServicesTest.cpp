@@ -536,7 +536,7 @@ TEST_F(IpServicesTest, ImportNamesTheBadFieldAndKeepsTheHost) {
       Model::ImportHost(store, host);
       ADD_FAILURE() << "imported: " << c.change;
     } catch (const Model::ImportError& e) {
-      EXPECT_EQ(c.error, e.what());
+      EXPECT_EQ(std::string(c.error), e.what());
     }
     // The host made by the fixture is still there.
     EXPECT_EQ(
