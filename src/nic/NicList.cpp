@@ -36,7 +36,9 @@ const std::string kMtu = "MTU";
 const std::string kDescription = "Description";
 const std::string kDpuId = "DPU Id";
 
-const char* UpDown(bool up) { return up ? "Up" : "Down"; }
+const char* UpDown(bool up) {
+  return up ? "Up" : "Down";
+}
 
 } // namespace
 

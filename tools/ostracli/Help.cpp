@@ -1,7 +1,6 @@
 //===- Help.cpp - Help texts generated from the command tree ---------------===//
 #include "Help.h"
 
-
 #include <algorithm>
 #include <cstdio>
 #include <vector>
@@ -107,13 +106,23 @@ void Columns(std::string& out, const std::string& name, const std::string& text,
 
 std::string UnknownWordMessage(const AutoCli::NamespaceNode& node, const std::string& word) {
   std::string where = node.GetPathString(' ');
-  std::string message = "Error: unknown " +
-                        std::string(node.GetType() == AutoCli::CommandKind ? "argument" : "command") +
-                        " \"" + word + "\"" + (where.empty() ? "" : " under \"" + where + "\"");
+  std::string message =
+      "Error: unknown " +
+      std::string(node.GetType() == AutoCli::CommandKind ? "argument" : "command") + " \"" + word +
+      "\"" + (where.empty() ? "" : " under \"" + where + "\"");
+  // Suggest the children closest to the word: a different case, or one or two
+  // typing slips (one for short words).
   std::vector<std::string> close;
   if (node.GetType() == AutoCli::NamespaceKind) {
+    const std::size_t limit = word.size() <= 4 ? 1 : 2;
+    std::size_t best = limit + 1;
     for (const std::string& name : node.GetNamespaceNodeNames()) {
-      if (Lower(name) == Lower(word) || EditDistance(Lower(name), Lower(word)) <= 2)
+      std::size_t distance = EditDistance(Lower(name), Lower(word));
+      if (distance < best) {
+        best = distance;
+        close.clear();
+      }
+      if (distance == best)
         close.push_back(name);
     }
   }
@@ -154,25 +163,27 @@ std::string NamespaceHelpText(const AutoCli::NamespaceNode& node, const std::str
     out += "\nAvailable Namespaces:\n" + namespaces;
   if (!commands.empty())
     out += "\nAvailable Commands:\n" + commands;
-  out += "\nFor more information: " + PathText(node) + (root ? " {namespace} --help\n" : " {cmd} --help\n");
+  out += "\nFor more information: " + PathText(node) +
+         (root ? " {namespace} --help\n" : " {cmd} --help\n");
   return out;
 }
 
-std::string CommandHelpText(const AutoCli::CommandSpec& command,
-                            const CallSpec::InputSpec& spec) {
+std::string CommandHelpText(const AutoCli::CommandSpec& command, const CallSpec::InputSpec& spec) {
   std::string out = "Usage: " + PathText(command) + " [cmd options]\n\nDescription:\n";
   Columns(out, command.GetName(), command.GetDescription(), 24);
   if (spec.GetParameters().empty())
     return out + "\nThis command takes no options.\n";
   out += "\nCmd options:\n";
   for (const auto& parameter : spec.GetParameters()) {
-    std::string name = parameter->GetShortName().empty() ? "" : "-" + parameter->GetShortName() + "|";
+    std::string name =
+        parameter->GetShortName().empty() ? "" : "-" + parameter->GetShortName() + "|";
     name += "--" + parameter->GetName();
     if (parameter->GetType() != CallSpec::Flag)
       name += std::string("=<") + TypeName(parameter->GetType()) + ">";
     std::string text = parameter->GetExpandedDescription();
     if (const auto& constraint = parameter->GetConstraint()) {
-      if (constraint->GetType() == CallSpec::IntRange || constraint->GetType() == CallSpec::StringRegex)
+      if (constraint->GetType() == CallSpec::IntRange ||
+          constraint->GetType() == CallSpec::StringRegex)
         text += " (" + constraint->Describe() + ")";
     }
     if (parameter->GetType() == CallSpec::StringList)
@@ -195,7 +206,8 @@ std::string NamespaceHelpJson(const AutoCli::NamespaceNode& node) {
     out += first ? "\n    {\"name\": " : ",\n    {\"name\": ";
     first = false;
     JsonString(out, child->GetName());
-    out += child->GetType() == AutoCli::NamespaceKind ? ", \"kind\": \"namespace\"" : ", \"kind\": \"command\"";
+    out += child->GetType() == AutoCli::NamespaceKind ? ", \"kind\": \"namespace\""
+                                                      : ", \"kind\": \"command\"";
     out += ", \"description\": ";
     JsonString(out, child->GetDescription());
     out += "}";
@@ -204,8 +216,7 @@ std::string NamespaceHelpJson(const AutoCli::NamespaceNode& node) {
   return out;
 }
 
-std::string CommandHelpJson(const AutoCli::CommandSpec& command,
-                            const CallSpec::InputSpec& spec) {
+std::string CommandHelpJson(const AutoCli::CommandSpec& command, const CallSpec::InputSpec& spec) {
   std::string out = "{\n  \"path\": ";
   JsonString(out, command.GetPathString(' '));
   out += ",\n  \"kind\": \"command\",\n  \"description\": ";
@@ -226,7 +237,8 @@ std::string CommandHelpJson(const AutoCli::CommandSpec& command,
     out += ", \"description\": ";
     JsonString(out, parameter->GetExpandedDescription());
     if (const auto& constraint = parameter->GetConstraint()) {
-      out += ", \"constraint\": {\"type\": " + std::to_string(static_cast<int>(constraint->GetType()));
+      out +=
+          ", \"constraint\": {\"type\": " + std::to_string(static_cast<int>(constraint->GetType()));
       switch (constraint->GetType()) {
       case CallSpec::IntRange:
         out += ", \"min\": " + std::to_string(constraint->GetMin()) +

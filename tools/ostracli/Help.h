@@ -9,8 +9,7 @@ namespace Ostra {
 
 /// "Error: ..." for a path word that names no child of \p node, with the
 /// closest child names as suggestions.
-std::string UnknownWordMessage(const Fabrik::AutoCli::NamespaceNode& node,
-                               const std::string& word);
+std::string UnknownWordMessage(const Fabrik::AutoCli::NamespaceNode& node, const std::string& word);
 
 /// The children of a namespace with their descriptions; the root's help also
 /// explains the global options, exit statuses and where the host state lives.

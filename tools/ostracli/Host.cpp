@@ -109,18 +109,6 @@ std::unique_ptr<CommandTree> CommandTree::Load(const std::string& directory) {
   return tree;
 }
 
-namespace {
-
-struct GlobalOptions {
-  std::string formatter;                                     ///< --formatter, or "".
-  std::vector<std::pair<std::string, std::string>> params;   ///< --format-param, in order.
-  std::string hostPath;                                      ///< --host, or "".
-  bool help = false;                                         ///< --help or -h.
-  bool version = false;                                      ///< --version.
-};
-
-/// Reads the global options in front of the command path; returns the index
-/// of the first path word, or -1 after reporting a refusal in \p err.
 int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& options,
                        std::string& err) {
   std::size_t i = 0;
@@ -147,6 +135,20 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
       options.help = true;
     } else if (name == "--version") {
       options.version = true;
+    } else if (name == "--keep-going") {
+      options.keepGoing = true;
+    } else if (name == "--reference") {
+      options.reference = true;
+    } else if (name == "--complete") {
+      options.complete = true;
+      return static_cast<int>(i + 1);
+    } else if (name == "--batch") {
+      if (!value(name, options.batch))
+        return -1;
+      if (options.batch.empty()) {
+        err += "Error: option --batch requires a file (- for standard input)\n";
+        return -1;
+      }
     } else if (name == "--formatter") {
       if (!value(name, options.formatter))
         return -1;
@@ -176,18 +178,17 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
   return static_cast<int>(i);
 }
 
-bool IsMachineFormat(const std::string& name) {
-  return name == "json" || name == "xml" || name == "csv" || name == "keyvalue";
-}
-
-} // namespace
-
 int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
                    std::string& err) {
   GlobalOptions global;
   int first = ParseGlobalOptions(args, global, err);
   if (first < 0)
     return ExitUsage;
+  if (global.complete || global.reference || !global.batch.empty() || global.keepGoing) {
+    err += "Error: --batch, --keep-going, --complete and --reference are options of a whole "
+           "ostracli run, not of one command\n";
+    return ExitUsage;
+  }
   if (!global.formatter.empty() && !Format::MakeFormatter(global.formatter)) {
     std::string names;
     for (const std::string& name : Format::FormatterNames())
@@ -199,7 +200,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     out += "ostracli " OSTRA_VERSION "\n";
     for (const Plugin& plugin : tree.Plugins()) {
       std::string name = plugin.path.substr(plugin.path.find_last_of('/') + 1);
-      out += "plug-in " + name + (plugin.version.empty() ? "" : " " + plugin.version) + "\n";
+      out += (plugin.version.empty() ? name : plugin.version) + " (" + plugin.path + ")\n";
     }
     return ExitOk;
   }
@@ -232,8 +233,8 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   const bool machine = global.formatter == "json";
   if (node->GetType() == AutoCli::NamespaceKind) {
     if (!rest.empty() && !wantsHelp) {
-      err += "Error: " + rest[0] + " is not a command; \"ostracli " +
-             node->GetPathString(' ') + " --help\" lists the commands\n";
+      err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
+             " --help\" lists the commands\n";
       return ExitUsage;
     }
     out += machine ? NamespaceHelpJson(*node) : NamespaceHelpText(*node, HostStateText());
@@ -279,7 +280,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     if (!formatter)
       formatter = Format::MakeFormatter("simple");
     Format::Parameters params;
-    if (!IsMachineFormat(name))
+    if (!formatter->IsMachineFormat())
       for (const auto& [key, value] : command->GetDefaultOutputParameters())
         params.Set(key, value);
     for (const auto& [key, value] : global.params)
@@ -302,7 +303,40 @@ int RunHost(int argc, char** argv) {
     std::fprintf(stderr, "Error: %s\n", e.what());
     return ExitCommandError;
   }
-  std::string out, err;
+  // A first look at the global options finds the modes of the whole run;
+  // RunCommandLine reads them again (and reports their errors) for a command.
+  GlobalOptions global;
+  std::string out, err, ignored;
+  int first = ParseGlobalOptions(args, global, ignored);
+  if (first >= 0 && global.complete) {
+    out = Complete(*tree, std::vector<std::string>(args.begin() + first, args.end()));
+    std::fwrite(out.data(), 1, out.size(), stdout);
+    return ExitOk;
+  }
+  if (first >= 0 && global.reference) {
+    out = Reference(*tree);
+    std::fwrite(out.data(), 1, out.size(), stdout);
+    return ExitOk;
+  }
+  if (first >= 0 && !global.batch.empty()) {
+    // The global options in front of --batch apply to every line.
+    std::vector<std::string> defaults;
+    for (std::size_t i = 0; i < static_cast<std::size_t>(first); ++i) {
+      if (args[i] == "--batch" || args[i] == "--keep-going") {
+        i += args[i] == "--batch" ? 1 : 0;
+        continue;
+      }
+      if (args[i].rfind("--batch=", 0) == 0)
+        continue;
+      defaults.push_back(args[i]);
+    }
+    if (static_cast<std::size_t>(first) < args.size()) {
+      std::fprintf(stderr, "Error: --batch takes its commands from the file, not from the "
+                           "command line\n");
+      return ExitUsage;
+    }
+    return RunBatch(*tree, global.batch, defaults, global.keepGoing);
+  }
   int status = RunCommandLine(*tree, args, out, err);
   std::fwrite(out.data(), 1, out.size(), stdout);
   std::fflush(stdout);

@@ -43,8 +43,43 @@ public:
 
 private:
   Fabrik::AutoCli::NamespaceNodePtr root_; ///< Root node; children are the plug-ins' trees.
-  std::vector<Plugin> plugins_;           ///< Loaded plug-ins, in load order.
+  std::vector<Plugin> plugins_;            ///< Loaded plug-ins, in load order.
 };
+
+/// Options of the whole run that come before the command path.
+struct GlobalOptions {
+  std::string formatter;                                   ///< --formatter, or "".
+  std::vector<std::pair<std::string, std::string>> params; ///< --format-param, in order.
+  std::string hostPath;                                    ///< --host, or "".
+  std::string batch;                                       ///< --batch FILE, or "".
+  bool keepGoing = false;                                  ///< --keep-going.
+  bool help = false;                                       ///< --help or -h.
+  bool version = false;                                    ///< --version.
+  bool complete = false;                                   ///< --complete WORD...
+  bool reference = false;                                  ///< --reference.
+};
+
+/// Reads the global options in front of the command path; returns the index
+/// of the first path word (after --complete: of the first word to complete),
+/// or -1 after reporting a refusal in \p err.
+int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& options,
+                       std::string& err);
+
+/// Runs one command per line of \p file ("-" for standard input) with the
+/// global options \p defaults in front of each; see docs/cli.md.
+int RunBatch(const CommandTree& tree, const std::string& file,
+             const std::vector<std::string>& defaults, bool keepGoing);
+
+/// Splits a command line into words as a POSIX shell would for plain words,
+/// single and double quotes and backslashes; false for an unterminated quote.
+bool SplitWords(const std::string& line, std::vector<std::string>& words);
+
+/// Completion candidates, one per line, for the words typed so far (the last
+/// one being the word under the cursor).
+std::string Complete(const CommandTree& tree, const std::vector<std::string>& words);
+
+/// The command reference in Markdown, generated from the tree.
+std::string Reference(const CommandTree& tree);
 
 /// Where ostracli looks for plug-ins: $OSTRACLI_PLUGIN_DIR, else
 /// <directory of the executable>/../lib/ostracli/plugins.
@@ -52,8 +87,8 @@ std::string DefaultPluginDirectory();
 
 /// Runs one command line (without the program name) on \p tree; writes the
 /// result to \p out and messages to \p err; returns the exit status.
-int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args,
-                   std::string& out, std::string& err);
+int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
+                   std::string& err);
 
 /// The whole program: loads the tree, runs argv, prints, returns the status.
 int RunHost(int argc, char** argv);

@@ -325,6 +325,9 @@ Store::Scope::Scope(Store& store, bool write) : store_(store), outer_(store.dept
     store_.writing_ = write;
   } else if (write && !store_.writing_) {
     throw HostCtlException("Internal error: a change was attempted inside a read");
+  } else if (write) {
+    store_.Exec("SAVEPOINT operation");
+    savepoint_ = true;
   }
   ++store_.depth_;
 }
@@ -332,6 +335,8 @@ Store::Scope::Scope(Store& store, bool write) : store_(store), outer_(store.dept
 void Store::Scope::Commit() {
   if (outer_)
     store_.Exec("COMMIT");
+  else if (savepoint_)
+    store_.Exec("RELEASE operation");
   done_ = true;
   --store_.depth_;
 }
@@ -342,6 +347,32 @@ Store::Scope::~Scope() {
   --store_.depth_;
   if (outer_)
     sqlite3_exec(store_.db_, "ROLLBACK", nullptr, nullptr, nullptr);
+  else if (savepoint_)
+    sqlite3_exec(store_.db_, "ROLLBACK TO operation; RELEASE operation", nullptr, nullptr, nullptr);
+}
+
+void Store::BeginBatch() {
+  if (depth_ != 0)
+    throw HostCtlException("Internal error: a batch was started inside a transaction");
+  Exec("BEGIN IMMEDIATE");
+  writing_ = true;
+  depth_ = 1;
+}
+
+void Store::EndBatch(bool commit) {
+  if (depth_ != 1)
+    return;
+  depth_ = 0;
+  if (commit) {
+    try {
+      Exec("COMMIT");
+    } catch (...) {
+      sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+      throw;
+    }
+  } else {
+    sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+  }
 }
 
 void CheckFault(std::string_view operation, std::string_view object) {

@@ -123,6 +123,12 @@ public:
     }
   }
 
+  /// Starts a batch: the host operations that follow run inside one write
+  /// transaction (each as a savepoint, so a failed operation still changes
+  /// nothing) until EndBatch commits or rolls back the whole batch.
+  void BeginBatch();
+  void EndBatch(bool commit);
+
   /// A statement from the cache (prepared on first use).
   Statement Prepare(const char* sql);
   /// Runs SQL text that returns no rows (schema, pragmas).
@@ -140,7 +146,9 @@ public:
   [[noreturn]] void Fail(int rc, std::string_view doing) const;
 
 private:
-  /// One transaction; nested scopes join the outer one.
+  /// One transaction. A scope inside a write transaction is a savepoint, so
+  /// that a failed inner operation is undone alone; a read inside any
+  /// transaction joins it.
   class Scope {
   public:
     Scope(Store& store, bool write);
@@ -149,8 +157,9 @@ private:
 
   private:
     Store& store_;
-    bool outer_;
-    bool done_ = false;
+    bool outer_;             ///< Began the transaction.
+    bool savepoint_ = false; ///< Opened a savepoint.
+    bool done_ = false;      ///< Committed.
   };
 
   void LoadFaults();

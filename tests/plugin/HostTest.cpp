@@ -1,0 +1,218 @@
+//===- HostTest.cpp - Command-line parsing and the command host ------------===//
+#include "Host.h"
+#include "Options.h"
+
+#include "Fabrik/AutoCli.h"
+#include "HostCtl/Lib.h"
+
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+namespace {
+
+using namespace Fabrik;
+using CallSpec::Input;
+using CallSpec::InputSpec;
+using CallSpec::ParameterConstraint;
+using CallSpec::ParameterSpec;
+
+std::shared_ptr<InputSpec> SampleSpec() {
+  auto spec = InputSpec::New();
+  auto add = [&](const char* name, const char* shortName, CallSpec::ParameterType type,
+                 bool required = false) {
+    auto p = ParameterSpec::New(name, type);
+    p->SetShortName(shortName);
+    p->SetRequired(required);
+    spec->AddParameter(p);
+    return p;
+  };
+  add("nic-name", "n", CallSpec::String, true);
+  auto speed = add("speed", "S", CallSpec::Integer);
+  auto speeds = ParameterConstraint::New(CallSpec::IntEnum);
+  speeds->AddIntEnum(100);
+  speeds->AddIntEnum(1000);
+  speed->SetConstraint(speeds);
+  auto ports = add("ports", "P", CallSpec::Integer);
+  auto range = ParameterConstraint::New(CallSpec::IntRange);
+  range->SetIntRange(1, 4096);
+  ports->SetConstraint(range);
+  auto duplex = add("duplex", "D", CallSpec::String);
+  auto words = ParameterConstraint::New(CallSpec::StringEnum);
+  words->AddStringEnum("full");
+  words->AddStringEnum("half");
+  duplex->SetConstraint(words);
+  auto name = add("interface-name", "i", CallSpec::String);
+  auto pattern = ParameterConstraint::New(CallSpec::StringRegex);
+  pattern->SetStringRegex("tvk([0-9]|[1-9][0-9])");
+  name->SetConstraint(pattern);
+  add("enabled", "e", CallSpec::Boolean);
+  add("auto", "a", CallSpec::Flag);
+  add("vmnic", "m", CallSpec::StringList);
+  return spec;
+}
+
+std::string Parse(std::vector<std::string> args, Input& input) {
+  std::string problem;
+  return Ostra::ParseCommandOptions(*SampleSpec(), args, input, problem) ? "" : problem;
+}
+
+TEST(OptionsTest, AcceptsEveryFormAndType) {
+  Input input;
+  EXPECT_EQ(Parse({"-n", "vmnic0", "--speed=1000", "--ports", "-1"}, input),
+            "option --ports: value -1 is out of range [1 - 4096]");
+  Input ok;
+  EXPECT_EQ(Parse({"--nic-name", "vmnic0", "-S", "100", "--duplex=half", "-i", "tvk12", "-e", "ON",
+                   "-a", "-m", "a", "--vmnic", "b", "--ports", "+4096"},
+                  ok),
+            "");
+  EXPECT_EQ(ok.GetParameter("nic-name"), "vmnic0");
+  EXPECT_EQ(ok.GetParameterInt("speed"), 100);
+  EXPECT_EQ(ok.GetParameterInt("ports"), 4096);
+  EXPECT_EQ(ok.GetParameter("ports"), "+4096");
+  EXPECT_TRUE(ok.GetParameterBool("enabled"));
+  EXPECT_TRUE(ok.IsFlagSet("auto"));
+  std::vector<std::string> list;
+  ok.GetParameterList("vmnic", list);
+  EXPECT_EQ(list, (std::vector<std::string>{"a", "b"}));
+  EXPECT_FALSE(ok.HasParameter("duplex2"));
+}
+
+TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
+  struct Case {
+    std::vector<std::string> args;
+    std::string problem;
+  } cases[] = {
+      {{}, "missing required option --nic-name (-n)"},
+      {{"-n", "a", "--colour", "red"}, "unknown option --colour"},
+      {{"-n", "a", "-x", "1"}, "unknown option -x"},
+      {{"-n", "a", "-n", "b"}, "option --nic-name is given more than once"},
+      {{"-n", "a", "--speed", "fast"}, "option --speed: \"fast\" is not an integer"},
+      {{"-n", "a", "--speed", "99999999999999999999"},
+       "option --speed: \"99999999999999999999\" is not an integer"},
+      {{"-n", "a", "--speed", "10"}, "option --speed: value 10 is not one of: 100, 1000"},
+      {{"-n", "a", "--duplex", "Full"},
+       "option --duplex: value \"Full\" is not one of: full, half"},
+      {{"-n", "a", "-e", "maybe"},
+       "option --enabled: \"maybe\" is not a boolean (true/false, yes/no, on/off, 1/0)"},
+      {{"-n", "a", "--auto=yes"}, "option --auto takes no value"},
+      {{"-n"}, "option --nic-name requires a value"},
+      {{"-n", "a", "stray"}, "unexpected argument \"stray\" (options are written --name VALUE)"},
+      {{"-n", "a", "-i", "tvk100"},
+       "option --interface-name: value \"tvk100\" does not match the pattern "
+       "tvk([0-9]|[1-9][0-9])"},
+      {{"-n", std::string("a\x01") + "b"}, ""},
+      {{"-n", std::string(4097, 'x')}, "option --nic-name: the value is longer than 4096 bytes"},
+      {{"-n", std::string(4096, 'x')}, ""},
+      {{"-n", "caf\xc3\xa9"}, ""},
+      {{"-n", "caf\xe9"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "\xc0\xaf"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "\xed\xa0\x80"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "a", "-m", "\xff"}, "option --vmnic: the value is not valid UTF-8 text"},
+  };
+  for (const Case& c : cases) {
+    Input input;
+    std::string problem = Parse(c.args, input);
+    EXPECT_EQ(problem, c.problem);
+  }
+}
+
+TEST(OptionsTest, BooleanWordsAndIntegers) {
+  bool value = false;
+  for (const char* word : {"true", "TRUE", "1", "yes", "On"}) {
+    EXPECT_TRUE(Ostra::ParseBoolWord(word, value));
+    EXPECT_TRUE(value) << word;
+  }
+  for (const char* word : {"false", "0", "No", "OFF"}) {
+    EXPECT_TRUE(Ostra::ParseBoolWord(word, value));
+    EXPECT_FALSE(value) << word;
+  }
+  EXPECT_FALSE(Ostra::ParseBoolWord("", value));
+  EXPECT_FALSE(Ostra::ParseBoolWord("y", value));
+  long number = 0;
+  EXPECT_TRUE(Ostra::ParseInteger("-9223372036854775808", number));
+  EXPECT_EQ(number, LONG_MIN);
+  EXPECT_FALSE(Ostra::ParseInteger("9223372036854775808", number));
+  for (const char* bad : {"", "-", "1.0", "0x10", " 1", "1 ", "1e3"})
+    EXPECT_FALSE(Ostra::ParseInteger(bad, number)) << bad;
+}
+
+/// A command that fails in the ways a command can.
+class Probe : public Fabrik::AutoCli::Command {
+public:
+  explicit Probe(int mode) : mode_(mode) { SetDescription("Probe."); }
+
+protected:
+  std::shared_ptr<CallSpec::InputSpec> GetInputSpecInternal() override { return SampleSpec(); }
+  std::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+    auto spec = CallSpec::OutputSpec::New();
+    spec->SetRootObject(MetaObj::MetaBool::New());
+    return spec;
+  }
+  void ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
+                       const std::shared_ptr<CallSpec::Output>& output) override {
+    switch (mode_) {
+    case 0:
+      output->SetRootObject(MetaObj::MetaBool::New(true));
+      return;
+    case 1:
+      output->AddErrorMessage("first");
+      output->AddErrorMessage("second");
+      output->SetRootObject(MetaObj::MetaBool::New(true));
+      return;
+    case 2:
+      throw std::runtime_error("boom");
+    default:
+      throw 42;
+    }
+  }
+
+private:
+  int mode_; ///< Which behaviour to show.
+};
+
+TEST(HostTest, ExitStatusesAndEscapingExceptions) {
+  auto root = AutoCli::Namespace::New();
+  auto probes = AutoCli::Namespace::New();
+  for (int mode = 0; mode < 4; ++mode)
+    probes->RegisterNamespaceNode(std::make_shared<Probe>(mode), "p" + std::to_string(mode));
+  root->RegisterNamespaceNode(probes, "probe");
+  Ostra::CommandTree tree(root);
+  auto run = [&](std::vector<std::string> args, std::string& out, std::string& err) {
+    out.clear();
+    err.clear();
+    return Ostra::RunCommandLine(tree, args, out, err);
+  };
+  std::string out, err;
+  EXPECT_EQ(run({"probe", "p0", "-n", "x"}, out, err), 0);
+  EXPECT_EQ(out, "true\n");
+  EXPECT_EQ(run({"probe", "p1", "-n", "x"}, out, err), 1);
+  EXPECT_EQ(out, "true\n");
+  EXPECT_EQ(err, "first\nsecond\n");
+  EXPECT_EQ(run({"probe", "p2", "-n", "x"}, out, err), 1);
+  EXPECT_EQ(err, "Internal error: boom\n");
+  EXPECT_EQ(run({"probe", "p3", "-n", "x"}, out, err), 1);
+  EXPECT_EQ(err, "Internal error: unknown exception\n");
+  EXPECT_EQ(run({"probe", "p0"}, out, err), 2);
+  EXPECT_EQ(err, "Error: missing required option --nic-name (-n)\n");
+  EXPECT_EQ(out, "");
+  EXPECT_EQ(run({"probe"}, out, err), 0);
+  EXPECT_NE(out.find("Available Commands:"), std::string::npos);
+}
+
+} // namespace
+
+namespace {
+
+TEST(BatchTest, SplitsLinesLikeAShell) {
+  std::vector<std::string> words;
+  ASSERT_TRUE(Ostra::SplitWords("  network ip hosts add -i 10.0.0.1 -n 'my host'  ", words));
+  EXPECT_EQ(words, (std::vector<std::string>{"network", "ip", "hosts", "add", "-i", "10.0.0.1",
+                                             "-n", "my host"}));
+  ASSERT_TRUE(Ostra::SplitWords(R"(a "b \"c\" d" e\ f '' "")", words));
+  EXPECT_EQ(words, (std::vector<std::string>{"a", "b \"c\" d", "e f", "", ""}));
+  EXPECT_FALSE(Ostra::SplitWords("a 'b", words));
+  EXPECT_FALSE(Ostra::SplitWords("a \"b", words));
+}
+
+} // namespace
