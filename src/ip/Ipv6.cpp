@@ -368,7 +368,8 @@ void IpInterfaceIpv6AddressList::ExecuteInternal(const std::shared_ptr<CallSpec:
       if (!nic)
         continue;
       std::string name = nic->GetInterfaceName();
-      for (const Ipv6Network& network : nic->GetIpConfig().GetIpv6Network()) {
+      const IpConfig config = nic->GetIpConfig();
+      for (const Ipv6Network& network : config.GetIpv6Network()) {
         auto row = GetOutputStructure();
         row->SetField(kInterface, name);
         row->SetField(kAddress, network.GetAddress().GetStringAddress());

@@ -239,3 +239,79 @@ TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
 }
 
 } // namespace
+
+namespace {
+
+TEST_F(StoreTest, TruncatedStoreIsReportedNotReset) {
+  Make(TwoNics())->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+  for (const char* suffix : {"-wal", "-shm"})
+    ::unlink((path_ + suffix).c_str());
+  struct stat st {};
+  ASSERT_EQ(::stat(path_.c_str(), &st), 0);
+  ASSERT_EQ(::truncate(path_.c_str(), st.st_size / 2), 0);
+  try {
+    Model::Store store(path_);
+    store.Read([&] { return Model::ExportHost(store); });
+    ADD_FAILURE() << "a truncated store was read";
+  } catch (const HostCtlException& e) {
+    EXPECT_NE(std::string(e.what()).find("is corrupt"), std::string::npos) << e.what();
+  }
+  struct stat after {};
+  ASSERT_EQ(::stat(path_.c_str(), &after), 0);
+  EXPECT_EQ(after.st_size, st.st_size / 2);
+}
+
+TEST_F(StoreTest, WriterWaitsForALockThenGivesUpClearly) {
+  Make(TwoNics());
+  int ready[2], release[2];
+  ASSERT_EQ(::pipe(ready), 0);
+  ASSERT_EQ(::pipe(release), 0);
+  pid_t pid = ::fork();
+  if (pid == 0) {
+    Model::Store holder(path_);
+    holder.BeginBatch(); // Holds the write lock.
+    char c = 1;
+    (void)!::write(ready[1], &c, 1);
+    (void)!::read(release[0], &c, 1);
+    holder.EndBatch(false);
+    ::_exit(0);
+  }
+  char c;
+  ASSERT_EQ(::read(ready[0], &c, 1), 1);
+  ::setenv("OSTRACLI_BUSY_TIMEOUT_MS", "200", 1);
+  {
+    Model::Store store(path_);
+    try {
+      store.Write([&] { Model::PutSetting(store, "x", "1"); });
+      ADD_FAILURE() << "wrote through a held lock";
+    } catch (const HostCtlException& e) {
+      EXPECT_EQ(std::string(e.what()),
+                "The host state at " + path_ + " is locked by another process; try again");
+    }
+    // Reads go on while the other process holds the write lock.
+    EXPECT_FALSE(store.Read([&] { return Model::GetSetting(store, "x").has_value(); }));
+  }
+  ::unsetenv("OSTRACLI_BUSY_TIMEOUT_MS");
+  (void)!::write(release[1], &c, 1);
+  int status = 0;
+  ::waitpid(pid, &status, 0);
+}
+
+TEST_F(StoreTest, FullDiskChangesNothing) {
+  auto store = Make(TwoNics());
+  // Caps the file at its present size, as a full disk would.
+  store->Exec("PRAGMA max_page_count = 1");
+  try {
+    store->Write([&] {
+      for (int i = 0; i < 2000; ++i)
+        Model::PutSetting(*store, "key" + std::to_string(i), std::string(200, 'x'));
+    });
+    ADD_FAILURE() << "the store grew past its cap";
+  } catch (const HostCtlException& e) {
+    EXPECT_EQ(std::string(e.what()),
+              "The host state at " + path_ + " cannot be changed: the disk is full");
+  }
+  EXPECT_FALSE(store->Read([&] { return Model::GetSetting(*store, "key0").has_value(); }));
+}
+
+} // namespace

@@ -102,6 +102,13 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
        "option --interface-name: value \"tvk100\" does not match the pattern "
        "tvk([0-9]|[1-9][0-9])"},
       {{"-n", std::string("a\x01") + "b"}, ""},
+      {{"-n", std::string(4097, 'x')}, "option --nic-name: the value is longer than 4096 bytes"},
+      {{"-n", std::string(4096, 'x')}, ""},
+      {{"-n", "caf\xc3\xa9"}, ""},
+      {{"-n", "caf\xe9"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "\xc0\xaf"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "\xed\xa0\x80"}, "option --nic-name: the value is not valid UTF-8 text"},
+      {{"-n", "a", "-m", "\xff"}, "option --vmnic: the value is not valid UTF-8 text"},
   };
   for (const Case& c : cases) {
     Input input;

@@ -44,6 +44,10 @@ bool ParseInteger(const std::string& text, long& value) {
 
 namespace {
 
+/// No parameter of any command needs a longer text; refusing longer ones here
+/// keeps unbounded input away from every command and from the host state.
+constexpr std::size_t kMaxValueBytes = 4096;
+
 std::string Quote(const std::string& text) {
   // Keeps messages readable for long or binary input.
   std::string shown = text.size() > 64 ? text.substr(0, 64) + "..." : text;
@@ -63,6 +67,46 @@ std::string Quote(const std::string& text) {
 
 std::string OptionName(const ParameterSpec& spec) {
   return "--" + spec.GetName();
+}
+
+/// Whether \p text is well-formed UTF-8 (no overlong forms, surrogates or
+/// code points above U+10FFFF).
+bool IsUtf8(const std::string& text) {
+  const auto* p = reinterpret_cast<const unsigned char*>(text.data());
+  const auto* end = p + text.size();
+  while (p < end) {
+    unsigned c = *p++;
+    if (c < 0x80)
+      continue;
+    int more;
+    unsigned min;
+    if ((c & 0xe0) == 0xc0) {
+      more = 1;
+      min = 0x80;
+      c &= 0x1f;
+    } else if ((c & 0xf0) == 0xe0) {
+      more = 2;
+      min = 0x800;
+      c &= 0x0f;
+    } else if ((c & 0xf8) == 0xf0) {
+      more = 3;
+      min = 0x10000;
+      c &= 0x07;
+    } else {
+      return false;
+    }
+    if (end - p < more)
+      return false;
+    for (int i = 0; i < more; ++i) {
+      if ((p[i] & 0xc0) != 0x80)
+        return false;
+      c = (c << 6) | (p[i] & 0x3f);
+    }
+    p += more;
+    if (c < min || c > 0x10ffff || (c >= 0xd800 && c <= 0xdfff))
+      return false;
+  }
+  return true;
 }
 
 bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
@@ -97,6 +141,15 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
   }
   case String:
   case StringList:
+    if (value.size() > kMaxValueBytes) {
+      problem = "option " + name + ": the value is longer than " + std::to_string(kMaxValueBytes) +
+                " bytes";
+      return false;
+    }
+    if (!IsUtf8(value)) {
+      problem = "option " + name + ": the value is not valid UTF-8 text";
+      return false;
+    }
     if (constraint) {
       if (auto bad = constraint->CheckString(value)) {
         problem = "option " + name + ": " + *bad;

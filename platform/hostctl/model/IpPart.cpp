@@ -566,9 +566,11 @@ void ExportIp(ordered_json& host, Store& store) {
   ordered_json nics = ordered_json::array();
   Statement nic = store.Prepare(
       "SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
-      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, e.tso_mss, e.rx_queues, e.dhcp_dns, "
-      "e.ipv6_enabled, e.ipv6_dhcp, e.ipv6_ra, e.ipv6_dhcp_dns, e.ipv6_gateway, t.port_id "
-      "FROM tvknic t JOIN tvknic_ext e ON e.name = t.name ORDER BY t.ord");
+      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, coalesce(e.tso_mss, 65535), "
+      "coalesce(e.rx_queues, 1), coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), "
+      "coalesce(e.ipv6_dhcp, 0), coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), "
+      "coalesce(e.ipv6_gateway, '::'), t.port_id "
+      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name ORDER BY t.ord");
   while (nic.Step()) {
     std::string name = nic.Text(0);
     ordered_json out = ordered_json::object();

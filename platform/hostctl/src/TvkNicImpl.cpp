@@ -69,9 +69,10 @@ bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
 /// The running (\p running true) or configured IP configuration of \p name.
 IpConfig ReadIpConfig(Store& store, const std::string& name, bool running) {
   Statement row = store.Prepare(
-      "SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, e.dhcp_dns, "
-      "e.ipv6_enabled, e.ipv6_dhcp, e.ipv6_ra, e.ipv6_dhcp_dns, e.ipv6_gateway "
-      "FROM tvknic t JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
+      "SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
+      "coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), coalesce(e.ipv6_dhcp, 0), "
+      "coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), coalesce(e.ipv6_gateway, '::') "
+      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Tarvik network interface " + name + " does not exist");
@@ -159,6 +160,7 @@ void WriteIpConfig(Store& store, const std::string& name, const IpConfig& config
                Ipv4Address(netmask).GetStringAddress(), Ipv4Address(gateway).GetStringAddress(),
                name)
       .Run();
+  store.Prepare("INSERT OR IGNORE INTO tvknic_ext(name) VALUES(?)").Bind(1, name).Run();
   store
       .Prepare("UPDATE tvknic_ext SET dhcp_dns = ?, ipv6_enabled = ?, ipv6_dhcp = ?, ipv6_ra = ?, "
                "ipv6_dhcp_dns = ?, ipv6_gateway = ? WHERE name = ?")
