@@ -9,6 +9,9 @@
 
 #include "common/CommandBase.h"
 
+#include <cstdint>
+#include <string>
+
 namespace CorvexCli::NetworkNamespace {
 
 // Kernel network interfaces (Interface.cpp).
@@ -239,6 +242,12 @@ class IpConnectionList : public virtual Fabrik::AutoCli::Command {
   CORVEX_OUTPUT_STRUCTURE
 };
 
+/// The name of TCP state \p state ("CLOSED" ... "TIME_WAIT"); "" above 10.
+std::string TcpStateName(uint32_t state);
+
+/// "address:port", or "[address]:port" for an address with colons (IPv6).
+std::string ConnectionEndpointText(const std::string& address, uint16_t port);
+
 // IPsec security associations and policies (Ipsec.cpp).
 
 /// network ip ipsec sa add
@@ -272,5 +281,13 @@ class IpIpsecSPList : public virtual Fabrik::AutoCli::Command {
   CORVEX_COMMAND(IpIpsecSPList)
   CORVEX_OUTPUT_STRUCTURE
 };
+
+/// Reads an SPI typed in hexadecimal (an optional "0x", then hex digits);
+/// false for anything else, a sign or an overflow included.
+bool ParseSpiText(const std::string& text, uint32_t& spi);
+
+/// A lifetime as text: "infinite" for 0, else hours, minutes and seconds,
+/// each part present only when not zero and followed by a blank ("1h 1m 1s ").
+std::string ConvertToHrsMinsAndSecs(uint64_t seconds);
 
 } // namespace CorvexCli::NetworkNamespace

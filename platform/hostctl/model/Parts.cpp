@@ -20,8 +20,10 @@ extern const Part kNicHwPart;
 extern const Part kSwitchingPart;
 
 // IP: netstacks, kernel interfaces, addresses, tags, multicast.
+extern const Part kIpPart;
 
 // IP services: routes, DNS, hosts, neighbours, connections, IPsec.
+extern const Part kIpServicesPart;
 
 // Datapath: VMs and their ports, port statistics, ENS.
 extern const Part kDatapathPart;
@@ -43,8 +45,10 @@ const std::vector<const Part*>& AllParts() {
       &kSwitchingPart,
 
       // IP.
+      &kIpPart,
 
       // IP services.
+      &kIpServicesPart,
 
       // Datapath.
       &kDatapathPart,

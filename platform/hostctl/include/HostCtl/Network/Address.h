@@ -31,7 +31,10 @@ public:
   std::string GetStringAddress() const;
   bool IsUnset() const;
   bool IsMulticast() const { return (bytes_[0] & 1) != 0; }
-  const std::array<uint8_t, 6>& GetBytes() const { return bytes_; }
+  const std::array<uint8_t, 6>& GetBytes() const& { return bytes_; }
+  /// A temporary hands out a copy, so that a reference bound to the result
+  /// of MacAddress(...).GetBytes() never outlives the bytes.
+  std::array<uint8_t, 6> GetBytes() const&& { return bytes_; }
   bool operator==(const MacAddress& other) const { return bytes_ == other.bytes_; }
 
 private:
@@ -73,7 +76,9 @@ public:
   /// RFC 5952 canonical text (lower case, longest zero run compressed).
   std::string GetStringAddress() const;
   bool IsUnspecified() const;
-  const std::array<uint8_t, 16>& GetBytes() const { return bytes_; }
+  const std::array<uint8_t, 16>& GetBytes() const& { return bytes_; }
+  /// A temporary hands out a copy (see MacAddress::GetBytes).
+  std::array<uint8_t, 16> GetBytes() const&& { return bytes_; }
   bool operator==(const Ipv6Address& other) const { return bytes_ == other.bytes_; }
   bool operator<(const Ipv6Address& other) const { return bytes_ < other.bytes_; }
 
@@ -132,7 +137,7 @@ public:
   }
 
 private:
-  Ipv6Address address_; ///< The address (host bits kept).
+  Ipv6Address address_;  ///< The address (host bits kept).
   int prefixLength_ = 0; ///< 0 to 128.
   int type_ = 0;         ///< Address type code (7 autoconf, 9 DHCP, else static).
   int status_ = 0;       ///< Status code (2 tentative, 3 duplicated, 5 deprecated).

@@ -6,9 +6,11 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "HostCtl/Network/NetstackInstance.h"
 #include "HostCtl/Network/Pnic.h"
 #include "HostCtl/Network/Sriov.h"
 #include "HostCtl/Network/Switching.h"
+#include "HostCtl/Network/TvkNic.h"
 
 #include <cstdint>
 #include <memory>
@@ -42,8 +44,30 @@ public:
   virtual void GetSriovNicVFStats(SriovNicVFStats& stats, const std::string& name, int vfId) = 0;
 
   // --- Netstacks and the kernel IPv6 switch.
+  /// Every netstack instance, in the host's order.
+  virtual std::vector<std::unique_ptr<NetstackInstance>> ListNetstackInstances() = 0;
+  /// The instance with that key, or null.
+  virtual std::unique_ptr<NetstackInstance> LookupNetstackInstanceByKey(const std::string& key) = 0;
+  /// Adds \p instance; with \p disabled only to the configuration. Refused
+  /// for a key in use or a key that is not a word of letters, digits, "-" and
+  /// "_" of at most 32 characters.
+  virtual void AddNetstackInstance(NetstackInstance& instance, bool disabled) = 0;
+  /// Removes an instance; refused for the default instance and while it has
+  /// interfaces.
+  virtual void RemoveNetstackInstance(const std::string& key, bool force) = 0;
+  /// The state of instance \p key (NetstackInstance::STATE_ENABLED when it is
+  /// created in the kernel); STATE_DISABLED for a key that names no instance.
+  virtual uint32_t GetNetstackInstanceState(const std::string& key) = 0;
+  /// Keys of the pre-defined (service) netstack instances.
+  virtual std::vector<std::string> GetPredefinedNetstackInstances() = 0;
+  /// The kernel's IPv6 switch as configured (it takes effect on the next boot).
+  virtual bool IsTvkIpv6Enabled() = 0;
+  /// Configures the kernel's IPv6 switch for the next boot.
+  virtual void SetTvkIpv6Enabled(bool enabled) = 0;
 
   // --- Kernel interfaces.
+  /// The kernel interface service, owned by the caller.
+  virtual std::unique_ptr<TvKernelNicInfo> GetTvKernelNicInfo() = 0;
 
   // --- Port groups.
   /// Port groups of every standard switch of the selector's kind, in host order.

@@ -1,6 +1,7 @@
 //===- TvkCtl/Network/NetworkInfoImpl.h - Network root of the host --------===//
 #pragma once
 
+#include "HostCtl/Network/Connection.h"
 #include "HostCtl/Network/NetworkInfo.h"
 
 namespace TvkCtl::Network {
@@ -23,8 +24,18 @@ public:
                           int vfId) override;
 
   // --- Netstacks and the kernel IPv6 switch.
+  std::vector<std::unique_ptr<HostCtl::Network::NetstackInstance>> ListNetstackInstances() override;
+  std::unique_ptr<HostCtl::Network::NetstackInstance>
+  LookupNetstackInstanceByKey(const std::string& key) override;
+  void AddNetstackInstance(HostCtl::Network::NetstackInstance& instance, bool disabled) override;
+  void RemoveNetstackInstance(const std::string& key, bool force) override;
+  uint32_t GetNetstackInstanceState(const std::string& key) override;
+  std::vector<std::string> GetPredefinedNetstackInstances() override;
+  bool IsTvkIpv6Enabled() override;
+  void SetTvkIpv6Enabled(bool enabled) override;
 
   // --- Kernel interfaces.
+  std::unique_ptr<HostCtl::Network::TvKernelNicInfo> GetTvKernelNicInfo() override;
 
   // --- Port groups.
   std::vector<std::unique_ptr<HostCtl::Network::PortGroup>>
@@ -40,6 +51,16 @@ public:
   int32_t GetEnsLcoreAffinity(int64_t id) override;
   bool SetEnsLcoreSwitch(const std::string& name, int64_t id) override;
   bool SetEnsLcoreAffinity(int64_t affinity, int64_t id) override;
+
+  // --- Connections of a netstack (IP services).
+  /// Append the netstack's TCP, UDP or raw IP sockets to \p list, in the
+  /// host's order; a netstack that does not exist is refused.
+  void GetCurrentTcpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                      const std::string& netstack);
+  void GetCurrentUdpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                      const std::string& netstack);
+  void GetCurrentIpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
+                                     const std::string& netstack);
 };
 
 } // namespace TvkCtl::Network

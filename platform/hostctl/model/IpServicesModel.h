@@ -1,0 +1,74 @@
+//===- model/IpServicesModel.h - Rules of routes, DNS, hosts and IPsec ----===//
+//
+// The invariants of the IP services area, as functions over a store inside a
+// transaction. The host operations (RoutingInfoImpl, DnsConfigImpl,
+// HostsFile, IpSecConfigImpl) and the import of a host description both go
+// through them, so that a description cannot create what a command could
+// not. Refusals throw HostCtl::Lib::HostCtlException.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "HostCtl/Network/Address.h"
+#include "HostCtl/Network/IpSec.h"
+#include "model/Store.h"
+
+#include <string>
+#include <vector>
+
+namespace Model::IpSvc {
+
+/// The key of the default netstack instance.
+inline constexpr const char* kDefaultNetstack = "defaultTcpipStack";
+
+/// Refuses a netstack instance that does not exist.
+void RequireNetstack(Store& store, const std::string& netstack);
+/// Whether IPv6 runs on \p netstack: the kernel switch and the netstack's own.
+bool Ipv6Running(Store& store, const std::string& netstack);
+/// Refuses an IPv6 change while IPv6 does not run on \p netstack.
+void RequireIpv6(Store& store, const std::string& netstack);
+
+/// The interface of \p netstack whose subnet holds \p gateway (longest
+/// prefix first); throws when no interface reaches it.
+std::string ReachingInterface(Store& store, const std::string& netstack,
+                              const HostCtl::Network::Ipv4Address& gateway);
+std::string ReachingInterface(Store& store, const std::string& netstack,
+                              const HostCtl::Network::Ipv6Address& gateway);
+
+/// Stores a route. An empty \p interfaceName is chosen by the gateway; a
+/// given one must be an interface of the netstack. Refuses a network with
+/// host bits set and a network that already has a route.
+void InsertRoute(Store& store, const std::string& netstack,
+                 const HostCtl::Network::Ipv4Network& network,
+                 const HostCtl::Network::Ipv4Address& gateway, std::string interfaceName,
+                 const std::string& source, bool system);
+void InsertRoute(Store& store, const std::string& netstack,
+                 const HostCtl::Network::Ipv6Network& network,
+                 const HostCtl::Network::Ipv6Address& gateway, std::string interfaceName,
+                 const std::string& source, bool system);
+/// Whether \p source is a route source a description may give.
+bool IsStoredRouteSource(const std::string& source);
+
+/// The configured default gateway of one family, as text ("" when none).
+std::string ConfiguredGateway(Store& store, const std::string& netstack, int family);
+void PutConfiguredGateway(Store& store, const std::string& netstack, int family,
+                          const std::string& gateway);
+
+/// The resolver configuration of a netstack.
+void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>& servers,
+             std::vector<std::string>& domains);
+void SaveDns(Store& store, const std::string& netstack, const std::vector<std::string>& servers,
+             const std::vector<std::string>& domains);
+/// Refuses a malformed search domain.
+void CheckSearchDomain(const std::string& domain);
+
+/// Stores a hosts entry after checking it (see HostsFile::AddEntryFromUser).
+void InsertHostsEntry(Store& store, const std::string& ip, const std::string& hostname,
+                      const std::vector<std::string>& aliases, const std::string& comment,
+                      bool system);
+
+/// Stores an SA or an SP after checking it (see IpSecConfigImpl).
+void InsertSa(Store& store, const HostCtl::Network::IpSecSadParam& sa);
+void InsertSp(Store& store, const HostCtl::Network::IpSecSpdParam& sp);
+
+} // namespace Model::IpSvc

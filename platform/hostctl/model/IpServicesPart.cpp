@@ -1,0 +1,603 @@
+//===- model/IpServicesPart.cpp - Routes, DNS, hosts, neighbours, IPsec ---===//
+//
+// The IP services part owns the per-netstack routing tables, configured
+// default gateways, resolver configurations, neighbour caches and
+// connections, and the host-wide hosts table and IPsec databases. Rows of a
+// netstack or of an interface go away with it (foreign keys with cascade).
+//
+// Host description keys (all top-level arrays of objects):
+//   routes          {netstack, network ("a/len" or "default"), gateway,
+//                    interface (chosen from the subnets when absent), source
+//                    ("user", "config", "dhcp"), system}
+//   defaultGateways {netstack, ipv4, ipv6}: the configured default gateways
+//   dns             {netstack, servers [..], searchDomains [..]}
+//   hostsEntries    {address, hostname, aliases [..], comment, system}
+//   neighbors       {interface, address, mac, expiry, type, state}
+//   connections     {netstack, protocol ("tcp", "udp", "ip"), recvQueue,
+//                    sendQueue, localAddress, localPort, foreignAddress,
+//                    foreignPort, worldId, state, ccAlgorithm}
+//   serviceWorlds   {id, name}: worlds of host services that own sockets
+//   ipsecSAs        {name, source, destination, spi, mode, encryption,
+//                    encryptionKey, integrity, integrityKey, state, lifetime}
+//   ipsecSPs        {name, source, sourcePort, destination, destinationPort,
+//                    protocol, direction, action, mode, saName}
+//
+//===----------------------------------------------------------------------===//
+#include "model/IpServicesModel.h"
+
+#include "HostCtl/Lib.h"
+#include "HostCtl/Misc.h"
+#include "HostCtl/Network/IpAddress.h"
+#include "TvkCtl/Network/IpSecConfigImpl.h"
+#include "TvkCtl/Network/RoutingInfoImpl.h"
+#include "model/JsonRead.h"
+#include "model/Part.h"
+
+#include <algorithm>
+
+namespace Model {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::Network::Ipv4Address;
+using HostCtl::Network::Ipv4Network;
+using HostCtl::Network::Ipv6Address;
+using HostCtl::Network::Ipv6Network;
+using nlohmann::ordered_json;
+using TvkCtl::Network::IpSecConfigImpl;
+using TvkCtl::Network::RoutingInfoImpl;
+
+namespace {
+
+const char* const kIpServicesSchema = R"sql(
+-- Static and default routes of a netstack, one row each; the routes of the
+-- interfaces' own subnets are not stored (they follow the interfaces).
+-- `source` is "user", "config" or "dhcp".
+CREATE TABLE ipsvc_route(
+  id INTEGER PRIMARY KEY,
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  family INTEGER NOT NULL CHECK(family IN (4, 6)),
+  system INTEGER NOT NULL DEFAULT 0,
+  network TEXT NOT NULL,
+  prefix INTEGER NOT NULL,
+  gateway TEXT NOT NULL,
+  interface TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
+  source TEXT NOT NULL,
+  UNIQUE(netstack, family, system, network, prefix)
+);
+CREATE INDEX ipsvc_route_list ON ipsvc_route(netstack, family, system, id);
+CREATE INDEX ipsvc_route_by_interface ON ipsvc_route(interface);
+
+-- Configured default gateways of a netstack, per family.
+CREATE TABLE ipsvc_gateway(
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  family INTEGER NOT NULL,
+  gateway TEXT NOT NULL,
+  PRIMARY KEY(netstack, family)
+) WITHOUT ROWID;
+
+-- Resolver configuration of a netstack, in order.
+CREATE TABLE ipsvc_dns_server(
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  ord INTEGER NOT NULL,
+  address TEXT NOT NULL,
+  PRIMARY KEY(netstack, address)
+) WITHOUT ROWID;
+CREATE TABLE ipsvc_dns_search(
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  ord INTEGER NOT NULL,
+  domain TEXT NOT NULL,
+  PRIMARY KEY(netstack, domain)
+) WITHOUT ROWID;
+
+-- The hosts table; `aliases` are separated by blanks. System entries are the
+-- host's own and are not shown to or removable by users.
+CREATE TABLE ipsvc_hosts(
+  id INTEGER PRIMARY KEY,
+  address TEXT NOT NULL,
+  hostname TEXT NOT NULL,
+  aliases TEXT NOT NULL DEFAULT '',
+  comment TEXT NOT NULL DEFAULT '',
+  system INTEGER NOT NULL DEFAULT 0
+);
+CREATE UNIQUE INDEX ipsvc_hosts_key ON ipsvc_hosts(address, hostname COLLATE NOCASE);
+CREATE INDEX ipsvc_hosts_list ON ipsvc_hosts(system, id);
+
+-- Neighbour caches; the netstack is the interface's. `type` and `state` index
+-- RoutingInfoImpl::NeighborTypeNames() and NeighborStateNames().
+CREATE TABLE ipsvc_neighbor(
+  id INTEGER PRIMARY KEY,
+  family INTEGER NOT NULL CHECK(family IN (4, 6)),
+  interface TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
+  address TEXT NOT NULL,
+  mac TEXT NOT NULL,
+  expiry INTEGER NOT NULL DEFAULT 0,
+  type INTEGER NOT NULL DEFAULT 1,
+  state INTEGER NOT NULL DEFAULT 0,
+  UNIQUE(interface, family, address)
+);
+CREATE INDEX ipsvc_neighbor_by_address ON ipsvc_neighbor(family, address);
+
+-- Sockets of a netstack; `protocol` 0 tcp, 1 udp, 2 raw ip.
+CREATE TABLE ipsvc_connection(
+  id INTEGER PRIMARY KEY,
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  protocol INTEGER NOT NULL CHECK(protocol IN (0, 1, 2)),
+  recv_queue INTEGER NOT NULL DEFAULT 0,
+  send_queue INTEGER NOT NULL DEFAULT 0,
+  local_address TEXT NOT NULL,
+  local_port INTEGER NOT NULL DEFAULT 0,
+  foreign_address TEXT NOT NULL,
+  foreign_port INTEGER NOT NULL DEFAULT 0,
+  world_id INTEGER NOT NULL DEFAULT 0,
+  state INTEGER NOT NULL DEFAULT 0,
+  ccalgo TEXT NOT NULL DEFAULT ''
+);
+CREATE INDEX ipsvc_connection_list ON ipsvc_connection(netstack, protocol, id);
+
+-- Worlds of host services (the VMs are in the core table `world`).
+CREATE TABLE ipsvc_world(id INTEGER PRIMARY KEY, name TEXT NOT NULL);
+
+-- IPsec databases. SAs named "auto" come from key exchange and may repeat.
+-- An SP whose SA was removed keeps sa_lost = 1 and no SA name.
+CREATE TABLE ipsvc_ipsec_sa(
+  id INTEGER PRIMARY KEY,
+  name TEXT NOT NULL,
+  source TEXT NOT NULL,
+  destination TEXT NOT NULL,
+  spi INTEGER NOT NULL,
+  mode INTEGER NOT NULL,
+  encryption INTEGER NOT NULL,
+  integrity INTEGER NOT NULL,
+  encryption_key TEXT NOT NULL,
+  integrity_key TEXT NOT NULL,
+  state INTEGER NOT NULL,
+  lifetime INTEGER NOT NULL,
+  UNIQUE(destination, spi)
+);
+CREATE UNIQUE INDEX ipsvc_ipsec_sa_name ON ipsvc_ipsec_sa(name) WHERE name <> 'auto';
+CREATE TABLE ipsvc_ipsec_sp(
+  id INTEGER PRIMARY KEY,
+  name TEXT NOT NULL UNIQUE,
+  source TEXT NOT NULL,
+  source_prefix INTEGER NOT NULL,
+  source_port INTEGER NOT NULL,
+  destination TEXT NOT NULL,
+  destination_prefix INTEGER NOT NULL,
+  destination_port INTEGER NOT NULL,
+  protocol INTEGER NOT NULL,
+  direction INTEGER NOT NULL,
+  action INTEGER NOT NULL,
+  mode INTEGER NOT NULL,
+  sa_name TEXT NOT NULL DEFAULT '',
+  sa_lost INTEGER NOT NULL DEFAULT 0
+);
+CREATE INDEX ipsvc_ipsec_sp_by_sa ON ipsvc_ipsec_sp(sa_name);
+)sql";
+
+/// Runs \p fn, turning a refusal of the host into an ImportError on \p key.
+template <typename Fn> void AsField(const JsonObject& object, const char* key, Fn&& fn) {
+  try {
+    fn();
+  } catch (const HostCtlException& e) {
+    object.Fail(key, e.what());
+  }
+}
+
+/// The index of \p text in \p table; fails on \p key otherwise.
+template <typename Table>
+int CodeOf(const JsonObject& object, const char* key, const Table& table, const std::string& text) {
+  auto it = std::find(std::begin(table), std::end(table), text);
+  if (it == std::end(table)) {
+    std::string known;
+    for (const auto& name : table)
+      known += (known.empty() ? "" : ", ") + std::string(name);
+    object.Fail(key, "expected one of " + known);
+  }
+  return static_cast<int>(it - std::begin(table));
+}
+
+const std::vector<std::string> kProtocols = {"tcp", "udp", "ip"};
+
+void ImportRoutes(const JsonObject& root, Store& store) {
+  for (const JsonObject& route : root.Objects("routes")) {
+    std::string netstack = route.String("netstack", IpSvc::kDefaultNetstack);
+    std::string network = route.String("network");
+    std::string gateway = route.String("gateway");
+    std::string interfaceName = route.String("interface", "");
+    std::string source = route.String("source", RoutingInfoImpl::SOURCE_USER);
+    bool system = route.Bool("system", false);
+    if (!IpSvc::IsStoredRouteSource(source))
+      route.Fail("source", "expected one of user, config, dhcp");
+    bool ipv6 = network == "default" ? gateway.find(':') != std::string::npos
+                                     : network.find(':') != std::string::npos;
+    AsField(route, "network", [&] {
+      if (ipv6) {
+        Ipv6Network net =
+            network == "default" ? RoutingInfoImpl::DEFAULT_IPV6_ROUTE : Ipv6Network(network);
+        IpSvc::InsertRoute(store, netstack, net, Ipv6Address(gateway), interfaceName, source,
+                           system);
+      } else {
+        Ipv4Network net =
+            network == "default" ? RoutingInfoImpl::DEFAULT_IPV4_ROUTE : Ipv4Network(network);
+        IpSvc::InsertRoute(store, netstack, net, Ipv4Address(gateway), interfaceName, source,
+                           system);
+      }
+    });
+  }
+  for (const JsonObject& gateways : root.Objects("defaultGateways")) {
+    std::string netstack = gateways.String("netstack", IpSvc::kDefaultNetstack);
+    AsField(gateways, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+    if (gateways.Has("ipv4"))
+      AsField(gateways, "ipv4", [&] {
+        IpSvc::PutConfiguredGateway(store, netstack, 4,
+                                    Ipv4Address(gateways.String("ipv4")).GetStringAddress());
+      });
+    if (gateways.Has("ipv6"))
+      AsField(gateways, "ipv6", [&] {
+        IpSvc::PutConfiguredGateway(store, netstack, 6,
+                                    Ipv6Address(gateways.String("ipv6")).GetStringAddress());
+      });
+  }
+}
+
+void ImportDns(const JsonObject& root, Store& store) {
+  for (const JsonObject& dns : root.Objects("dns")) {
+    std::string netstack = dns.String("netstack", IpSvc::kDefaultNetstack);
+    AsField(dns, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+    std::vector<std::string> servers;
+    for (const std::string& server : dns.Strings("servers")) {
+      AsField(dns, "servers", [&] {
+        servers.push_back(HostCtl::Network::IpAddress::FromString(server).GetStringAddress());
+      });
+      if (std::count(servers.begin(), servers.end(), servers.back()) > 1)
+        dns.Fail("servers", servers.back() + " is listed twice");
+    }
+    std::vector<std::string> domains = dns.Strings("searchDomains");
+    for (const std::string& domain : domains) {
+      AsField(dns, "searchDomains", [&] { IpSvc::CheckSearchDomain(domain); });
+      if (std::count(domains.begin(), domains.end(), domain) > 1)
+        dns.Fail("searchDomains", domain + " is listed twice");
+    }
+    std::vector<std::string> stored;
+    std::vector<std::string> ignored;
+    IpSvc::LoadDns(store, netstack, stored, ignored);
+    if (!stored.empty() || !ignored.empty())
+      dns.Fail("netstack", "netstack " + netstack + " is described twice");
+    IpSvc::SaveDns(store, netstack, servers, domains);
+  }
+}
+
+void ImportHostsEntries(const JsonObject& root, Store& store) {
+  for (const JsonObject& entry : root.Objects("hostsEntries"))
+    AsField(entry, "address", [&] {
+      IpSvc::InsertHostsEntry(store, entry.String("address"), entry.String("hostname"),
+                              entry.Strings("aliases"), entry.String("comment", ""),
+                              entry.Bool("system", false));
+    });
+}
+
+void ImportNeighbors(const JsonObject& root, Store& store) {
+  const auto& types = RoutingInfoImpl::NeighborTypeNames();
+  const auto& states = RoutingInfoImpl::NeighborStateNames();
+  for (const JsonObject& neighbor : root.Objects("neighbors")) {
+    std::string interfaceName = neighbor.String("interface");
+    Statement nic = store.Prepare("SELECT 1 FROM tvknic WHERE name = ?");
+    nic.Bind(1, interfaceName);
+    if (!nic.Step())
+      neighbor.Fail("interface", "no kernel interface is named " + interfaceName);
+    std::string text = neighbor.String("address");
+    int family = 4;
+    std::string address;
+    if (Ipv4Address::IsValidAddress(text)) {
+      address = Ipv4Address(text).GetStringAddress();
+    } else if (Ipv6Address::IsValidAddress(text)) {
+      address = Ipv6Address(text).GetStringAddress();
+      family = 6;
+    } else {
+      neighbor.Fail("address", "expected an IPv4 or IPv6 address");
+    }
+    std::string mac = neighbor.String("mac");
+    if (!HostCtl::Network::MacAddress::IsValid(mac))
+      neighbor.Fail("mac", "expected a unicast MAC address such as 00:50:56:01:02:03");
+    int type = CodeOf(neighbor, "type", types, neighbor.String("type", types[1]));
+    int state = 0;
+    if (neighbor.Has("state")) {
+      if (family == 4)
+        neighbor.Fail("state", "only IPv6 neighbours have a state");
+      state = CodeOf(neighbor, "state", states, neighbor.String("state"));
+    }
+    Statement insert = store.Prepare(
+        "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
+        "VALUES(?, ?, ?, ?, ?, ?, ?)");
+    insert.BindAll(family, interfaceName, address,
+                   HostCtl::Network::MacAddress(mac).GetStringAddress(),
+                   neighbor.Int("expiry", 0, 86400 * 365, 0), type, state);
+    AsField(neighbor, "address", [&] {
+      try {
+        insert.Run();
+      } catch (const HostCtlException&) {
+        throw HostCtlException(address + " is listed twice on " + interfaceName);
+      }
+    });
+  }
+}
+
+void ImportConnections(const JsonObject& root, Store& store) {
+  for (const JsonObject& world : root.Objects("serviceWorlds")) {
+    int64_t id = world.Int("id", 1, INT32_MAX);
+    Statement insert = store.Prepare("INSERT INTO ipsvc_world(id, name) VALUES(?, ?)");
+    insert.BindAll(id, world.String("name"));
+    AsField(world, "id", [&] {
+      try {
+        insert.Run();
+      } catch (const HostCtlException&) {
+        throw HostCtlException("world " + std::to_string(id) + " is listed twice");
+      }
+    });
+  }
+  for (const JsonObject& connection : root.Objects("connections")) {
+    std::string netstack = connection.String("netstack", IpSvc::kDefaultNetstack);
+    AsField(connection, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+    int protocol = CodeOf(connection, "protocol", kProtocols, connection.String("protocol"));
+    std::string local;
+    std::string foreign;
+    AsField(connection, "localAddress", [&] {
+      local = HostCtl::Network::IpAddress::FromString(connection.String("localAddress"))
+                  .GetStringAddress();
+    });
+    AsField(connection, "foreignAddress", [&] {
+      foreign = HostCtl::Network::IpAddress::FromString(connection.String("foreignAddress"))
+                    .GetStringAddress();
+    });
+    store
+        .Prepare("INSERT INTO ipsvc_connection(netstack, protocol, recv_queue, send_queue, "
+                 "local_address, local_port, foreign_address, foreign_port, world_id, state, "
+                 "ccalgo) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")
+        .BindAll(netstack, protocol, connection.Int("recvQueue", 0, INT32_MAX, 0),
+                 connection.Int("sendQueue", 0, INT32_MAX, 0), local,
+                 connection.Int("localPort", 0, 65535, 0), foreign,
+                 connection.Int("foreignPort", 0, 65535, 0),
+                 connection.Int("worldId", 0, INT32_MAX, 0),
+                 connection.Int("state", 0, UINT32_MAX, 0), connection.String("ccAlgorithm", ""))
+        .Run();
+  }
+}
+
+void ImportIpsec(const JsonObject& root, Store& store) {
+  for (const JsonObject& object : root.Objects("ipsecSAs")) {
+    HostCtl::Network::IpSecSadParam sa;
+    sa.name = object.String("name");
+    sa.srcAddress = object.String("source");
+    sa.dstAddress = object.String("destination");
+    sa.spi = static_cast<uint32_t>(object.Int("spi", 256, UINT32_MAX));
+    sa.mode = CodeOf(object, "mode",
+                     std::vector<std::string>(IpSecConfigImpl::SA_MODE.begin(),
+                                              IpSecConfigImpl::SA_MODE.begin() + 2),
+                     object.String("mode", IpSecConfigImpl::SA_MODE[0]));
+    sa.encryptionAlgorithm =
+        CodeOf(object, "encryption", IpSecConfigImpl::SA_ENCPT_ALG, object.String("encryption"));
+    sa.encryptionKey = object.String("encryptionKey", "");
+    sa.integrityAlgorithm =
+        CodeOf(object, "integrity", IpSecConfigImpl::SA_AUTH_ALG, object.String("integrity"));
+    sa.integrityKey = object.String("integrityKey");
+    sa.state = CodeOf(object, "state", IpSecConfigImpl::SA_STATE,
+                      object.String("state", IpSecConfigImpl::SA_STATE[1]));
+    sa.lifetime = static_cast<uint64_t>(object.Int("lifetime", 0, INT64_MAX, 0));
+    AsField(object, "name", [&] { IpSvc::InsertSa(store, sa); });
+  }
+  for (const JsonObject& object : root.Objects("ipsecSPs")) {
+    HostCtl::Network::IpSecSpdParam sp;
+    sp.name = object.String("name");
+    auto network = [&](const char* key, std::string& address, int& prefix) {
+      std::string text = object.String(key);
+      if (text == "any")
+        return;
+      AsField(object, key, [&] {
+        Ipv6Network parsed(text);
+        address = parsed.GetAddress().GetStringAddress();
+        prefix = parsed.GetNetmask();
+      });
+    };
+    network("source", sp.srcAddress, sp.srcPrefixLength);
+    network("destination", sp.dstAddress, sp.dstPrefixLength);
+    sp.srcPort = static_cast<uint32_t>(object.Int("sourcePort", 0, 65535, 0));
+    sp.dstPort = static_cast<uint32_t>(object.Int("destinationPort", 0, 65535, 0));
+    sp.ulProto = CodeOf(object, "protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE,
+                        object.String("protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE[0]));
+    sp.direction = CodeOf(object, "direction", IpSecConfigImpl::SP_DIRECTION,
+                          object.String("direction", IpSecConfigImpl::SP_DIRECTION[1]));
+    sp.action = CodeOf(object, "action", IpSecConfigImpl::SP_ACTION,
+                       object.String("action", IpSecConfigImpl::SP_ACTION[0]));
+    sp.mode = CodeOf(object, "mode", IpSecConfigImpl::SA_MODE,
+                     object.String("mode", IpSecConfigImpl::SA_MODE[2]));
+    sp.saName = object.String("saName", "");
+    AsField(object, "name", [&] { IpSvc::InsertSp(store, sp); });
+  }
+}
+
+void ImportIpServices(const ordered_json& host, Store& store) {
+  JsonObject root(host, "");
+  ImportRoutes(root, store);
+  ImportDns(root, store);
+  ImportHostsEntries(root, store);
+  ImportNeighbors(root, store);
+  ImportConnections(root, store);
+  ImportIpsec(root, store);
+}
+
+/// Adds \p array to \p host under \p key unless it is empty.
+void PutArray(ordered_json& host, const char* key, ordered_json array) {
+  if (!array.empty())
+    host[key] = std::move(array);
+}
+
+void ExportIpServices(ordered_json& host, Store& store) {
+  ordered_json routes = ordered_json::array();
+  Statement route = store.Prepare("SELECT netstack, family, network, prefix, gateway, interface, "
+                                  "source, system FROM ipsvc_route ORDER BY id");
+  while (route.Step()) {
+    ordered_json object = {{"netstack", route.Text(0)}};
+    bool isDefault = route.Int(3) == 0 && (route.Text(2) == "0.0.0.0" || route.Text(2) == "::");
+    object["network"] =
+        isDefault ? std::string("default") : route.Text(2) + "/" + std::to_string(route.Int(3));
+    object["gateway"] = route.Text(4);
+    object["interface"] = route.Text(5);
+    object["source"] = route.Text(6);
+    if (route.Bool(7))
+      object["system"] = true;
+    routes.push_back(std::move(object));
+  }
+  PutArray(host, "routes", std::move(routes));
+
+  ordered_json gateways = ordered_json::array();
+  Statement gateway = store.Prepare("SELECT netstack, family, gateway FROM ipsvc_gateway ORDER BY "
+                                    "netstack, family");
+  while (gateway.Step()) {
+    if (gateways.empty() || gateways.back()["netstack"] != gateway.Text(0))
+      gateways.push_back({{"netstack", gateway.Text(0)}});
+    gateways.back()[gateway.Int(1) == 4 ? "ipv4" : "ipv6"] = gateway.Text(2);
+  }
+  PutArray(host, "defaultGateways", std::move(gateways));
+
+  ordered_json dns = ordered_json::array();
+  Statement netstacks = store.Prepare(
+      "SELECT key FROM netstack WHERE key IN (SELECT netstack FROM ipsvc_dns_server UNION "
+      "SELECT netstack FROM ipsvc_dns_search) ORDER BY ord");
+  while (netstacks.Step()) {
+    std::vector<std::string> servers;
+    std::vector<std::string> domains;
+    IpSvc::LoadDns(store, netstacks.Text(0), servers, domains);
+    dns.push_back(
+        {{"netstack", netstacks.Text(0)}, {"servers", servers}, {"searchDomains", domains}});
+  }
+  PutArray(host, "dns", std::move(dns));
+
+  ordered_json entries = ordered_json::array();
+  Statement entry = store.Prepare(
+      "SELECT address, hostname, aliases, comment, system FROM ipsvc_hosts ORDER BY id");
+  while (entry.Step()) {
+    ordered_json object = {{"address", entry.Text(0)}, {"hostname", entry.Text(1)}};
+    std::vector<std::string> aliases = HostCtl::Misc::StringTokenize(entry.Text(2), " ");
+    if (!aliases.empty())
+      object["aliases"] = aliases;
+    if (!entry.Text(3).empty())
+      object["comment"] = entry.Text(3);
+    if (entry.Bool(4))
+      object["system"] = true;
+    entries.push_back(std::move(object));
+  }
+  PutArray(host, "hostsEntries", std::move(entries));
+
+  ordered_json neighbors = ordered_json::array();
+  Statement neighbor = store.Prepare("SELECT family, interface, address, mac, expiry, type, state "
+                                     "FROM ipsvc_neighbor ORDER BY id");
+  while (neighbor.Step()) {
+    ordered_json object = {{"interface", neighbor.Text(1)},
+                           {"address", neighbor.Text(2)},
+                           {"mac", neighbor.Text(3)},
+                           {"expiry", neighbor.Int(4)},
+                           {"type", RoutingInfoImpl::NeighborTypeNames().at(neighbor.Int(5))}};
+    if (neighbor.Int(0) == 6)
+      object["state"] = RoutingInfoImpl::NeighborStateNames().at(neighbor.Int(6));
+    neighbors.push_back(std::move(object));
+  }
+  PutArray(host, "neighbors", std::move(neighbors));
+
+  ordered_json worlds = ordered_json::array();
+  Statement world = store.Prepare("SELECT id, name FROM ipsvc_world ORDER BY id");
+  while (world.Step())
+    worlds.push_back({{"id", world.Int(0)}, {"name", world.Text(1)}});
+  PutArray(host, "serviceWorlds", std::move(worlds));
+
+  ordered_json connections = ordered_json::array();
+  Statement connection = store.Prepare(
+      "SELECT netstack, protocol, recv_queue, send_queue, local_address, local_port, "
+      "foreign_address, foreign_port, world_id, state, ccalgo FROM ipsvc_connection ORDER BY id");
+  while (connection.Step())
+    connections.push_back({{"netstack", connection.Text(0)},
+                           {"protocol", kProtocols.at(connection.Int(1))},
+                           {"recvQueue", connection.Int(2)},
+                           {"sendQueue", connection.Int(3)},
+                           {"localAddress", connection.Text(4)},
+                           {"localPort", connection.Int(5)},
+                           {"foreignAddress", connection.Text(6)},
+                           {"foreignPort", connection.Int(7)},
+                           {"worldId", connection.Int(8)},
+                           {"state", connection.Int(9)},
+                           {"ccAlgorithm", connection.Text(10)}});
+  PutArray(host, "connections", std::move(connections));
+
+  ordered_json sas = ordered_json::array();
+  Statement sa = store.Prepare(
+      "SELECT name, source, destination, spi, mode, encryption, encryption_key, integrity, "
+      "integrity_key, state, lifetime FROM ipsvc_ipsec_sa ORDER BY id");
+  while (sa.Step()) {
+    ordered_json object = {{"name", sa.Text(0)},
+                           {"source", sa.Text(1)},
+                           {"destination", sa.Text(2)},
+                           {"spi", sa.Int(3)},
+                           {"mode", IpSecConfigImpl::SA_MODE.at(sa.Int(4))},
+                           {"encryption", IpSecConfigImpl::SA_ENCPT_ALG.at(sa.Int(5))}};
+    if (!sa.Text(6).empty())
+      object["encryptionKey"] = sa.Text(6);
+    object["integrity"] = IpSecConfigImpl::SA_AUTH_ALG.at(sa.Int(7));
+    object["integrityKey"] = sa.Text(8);
+    object["state"] = IpSecConfigImpl::SA_STATE.at(sa.Int(9));
+    object["lifetime"] = sa.Int(10);
+    sas.push_back(std::move(object));
+  }
+  PutArray(host, "ipsecSAs", std::move(sas));
+
+  ordered_json sps = ordered_json::array();
+  Statement sp = store.Prepare(
+      "SELECT name, source, source_prefix, source_port, destination, destination_prefix, "
+      "destination_port, protocol, direction, action, mode, sa_name, sa_lost FROM ipsvc_ipsec_sp "
+      "ORDER BY id");
+  while (sp.Step()) {
+    ordered_json object = {{"name", sp.Text(0)},
+                           {"source", sp.Text(1) + "/" + std::to_string(sp.Int(2))},
+                           {"sourcePort", sp.Int(3)},
+                           {"destination", sp.Text(4) + "/" + std::to_string(sp.Int(5))},
+                           {"destinationPort", sp.Int(6)},
+                           {"protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE.at(sp.Int(7))},
+                           {"direction", IpSecConfigImpl::SP_DIRECTION.at(sp.Int(8))},
+                           {"action", IpSecConfigImpl::SP_ACTION.at(sp.Int(9))},
+                           {"mode", IpSecConfigImpl::SA_MODE.at(sp.Int(10))}};
+    if (sp.Bool(12))
+      object["saName"] = "UNKNOWN";
+    else if (!sp.Text(11).empty())
+      object["saName"] = sp.Text(11);
+    sps.push_back(std::move(object));
+  }
+  PutArray(host, "ipsecSPs", std::move(sps));
+}
+
+} // namespace
+
+extern const Part kIpServicesPart;
+const Part kIpServicesPart = {
+    "ipsvc",
+    kIpServicesSchema,
+    {{"",
+      {"routes", "defaultGateways", "dns", "hostsEntries", "neighbors", "connections",
+       "serviceWorlds", "ipsecSAs", "ipsecSPs"}},
+     {"routes", {"netstack", "network", "gateway", "interface", "source", "system"}},
+     {"defaultGateways", {"netstack", "ipv4", "ipv6"}},
+     {"dns", {"netstack", "servers", "searchDomains"}},
+     {"hostsEntries", {"address", "hostname", "aliases", "comment", "system"}},
+     {"neighbors", {"interface", "address", "mac", "expiry", "type", "state"}},
+     {"connections",
+      {"netstack", "protocol", "recvQueue", "sendQueue", "localAddress", "localPort",
+       "foreignAddress", "foreignPort", "worldId", "state", "ccAlgorithm"}},
+     {"serviceWorlds", {"id", "name"}},
+     {"ipsecSAs",
+      {"name", "source", "destination", "spi", "mode", "encryption", "encryptionKey", "integrity",
+       "integrityKey", "state", "lifetime"}},
+     {"ipsecSPs",
+      {"name", "source", "sourcePort", "destination", "destinationPort", "protocol", "direction",
+       "action", "mode", "saName"}}},
+    ImportIpServices,
+    ExportIpServices,
+};
+
+} // namespace Model

@@ -1,0 +1,217 @@
+//===- IpSecConfigImpl.cpp - The kernel's IPsec databases -----------------===//
+#include "TvkCtl/Network/IpSecConfigImpl.h"
+
+#include "HostCtl/Lib.h"
+#include "model/IpServicesModel.h"
+#include "model/Store.h"
+
+#include <algorithm>
+
+namespace TvkCtl::Network {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::Network::IpSecSadParam;
+using HostCtl::Network::IpSecSpdParam;
+using Model::Statement;
+using Model::Store;
+
+const std::array<std::string, 4> IpSecConfigImpl::SA_STATE = {"larval", "mature", "dying", "dead"};
+const std::array<std::string, 3> IpSecConfigImpl::SA_MODE = {"transport", "tunnel", "any"};
+const std::array<std::string, 3> IpSecConfigImpl::SA_ENCPT_ALG = {"null", "3des-cbc", "aes128-cbc"};
+const std::array<std::string, 2> IpSecConfigImpl::SA_AUTH_ALG = {"hmac-sha1", "hmac-sha2-256"};
+const std::array<std::string, 3> IpSecConfigImpl::SP_ACTION = {"none", "discard", "ipsec"};
+const std::array<std::string, 2> IpSecConfigImpl::SP_DIRECTION = {"in", "out"};
+const std::array<std::string, 4> IpSecConfigImpl::SP_UL_PROTO_TYPE = {"any", "tcp", "udp", "icmp6"};
+
+namespace {
+
+/// The code of \p text in the first \p count entries of \p table; \p dflt for
+/// the empty text.
+template <std::size_t N>
+int ToCode(const std::array<std::string, N>& table, std::size_t count, const std::string& text,
+           int dflt, const char* what) {
+  if (text.empty())
+    return dflt;
+  auto end = table.begin() + static_cast<std::ptrdiff_t>(count);
+  auto it = std::find(table.begin(), end, text);
+  if (it == end)
+    throw HostCtlException("Unknown IPsec " + std::string(what) + " '" + text + "'");
+  return static_cast<int>(it - table.begin());
+}
+
+} // namespace
+
+IpSecConfigImpl::IpSecConfigImpl() = default;
+IpSecConfigImpl::~IpSecConfigImpl() = default;
+
+int IpSecConfigImpl::StringToIpSecMode(const std::string& text) {
+  return ToCode(SA_MODE, 2, text, 0, "mode");
+}
+int IpSecConfigImpl::StringToIpSecEncyptAlgo(const std::string& text) {
+  return ToCode(SA_ENCPT_ALG, SA_ENCPT_ALG.size(), text, 0, "encryption algorithm");
+}
+int IpSecConfigImpl::StringToIpSecAuthAlgo(const std::string& text) {
+  return ToCode(SA_AUTH_ALG, SA_AUTH_ALG.size(), text, 0, "integrity algorithm");
+}
+int IpSecConfigImpl::StringToIpSecAction(const std::string& text) {
+  return ToCode(SP_ACTION, SP_ACTION.size(), text, 0, "action");
+}
+int IpSecConfigImpl::StringToIpSecDirection(const std::string& text) {
+  return ToCode(SP_DIRECTION, SP_DIRECTION.size(), text, 1, "direction");
+}
+int IpSecConfigImpl::StringToIpSecULProtoType(const std::string& text) {
+  return ToCode(SP_UL_PROTO_TYPE, SP_UL_PROTO_TYPE.size(), text, 0, "protocol");
+}
+
+int IpSecConfigImpl::EncryptionKeyLength(int algorithm) {
+  switch (algorithm) {
+  case 1:
+    return 24; // 3des-cbc: three 64-bit keys.
+  case 2:
+    return 16; // aes128-cbc.
+  default:
+    return 0; // null.
+  }
+}
+
+int IpSecConfigImpl::IntegrityKeyLength(int algorithm) {
+  return algorithm == 1 ? 32 : 20; // hmac-sha2-256, hmac-sha1.
+}
+
+void IpSecConfigImpl::AddSADConfig(const IpSecSadParam& sa) {
+  Store& store = Store::Host();
+  store.CheckFault("AddSADConfig", sa.name);
+  if (sa.name == "auto")
+    throw HostCtlException("The SA name auto is reserved for SAs made by key exchange");
+  IpSecSadParam added = sa;
+  added.state = 1; // A manually keyed SA is mature at once.
+  added.lifetime = 0;
+  store.Write([&] { Model::IpSvc::InsertSa(store, added); });
+}
+
+namespace {
+
+/// Marks the policies bound to SA \p name as having lost their SA.
+void OrphanPolicies(Store& store, const std::string& name) {
+  store.Prepare("UPDATE ipsvc_ipsec_sp SET sa_name = '', sa_lost = 1 WHERE sa_name = ?")
+      .Bind(1, name)
+      .Run();
+}
+
+} // namespace
+
+void IpSecConfigImpl::RemoveSADConfig(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveSADConfig", name);
+  store.Write([&] {
+    if (name != "auto")
+      store.Prepare("DELETE FROM ipsvc_ipsec_sa WHERE name = ?").Bind(1, name).Run();
+    if (name == "auto" || store.Changes() == 0)
+      throw HostCtlException("No SA named " + name + " exists");
+    OrphanPolicies(store, name);
+  });
+}
+
+void IpSecConfigImpl::RemoveAutoSADConfig(const IpSecSadParam& sa) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveAutoSADConfig", sa.name);
+  std::string source = HostCtl::Network::Ipv6Address(sa.srcAddress).GetStringAddress();
+  std::string destination = HostCtl::Network::Ipv6Address(sa.dstAddress).GetStringAddress();
+  store.Write([&] {
+    store
+        .Prepare("DELETE FROM ipsvc_ipsec_sa WHERE name = 'auto' AND source = ? AND destination "
+                 "= ? AND spi = ?")
+        .BindAll(source, destination, static_cast<int64_t>(sa.spi))
+        .Run();
+    if (store.Changes() == 0)
+      throw HostCtlException("No auto SA from " + source + " to " + destination +
+                             " with that SPI exists");
+  });
+}
+
+void IpSecConfigImpl::FlushSADConfig() {
+  Store& store = Store::Host();
+  store.CheckFault("FlushSADConfig", "*");
+  store.Write([&] {
+    store.Exec("UPDATE ipsvc_ipsec_sp SET sa_name = '', sa_lost = 1 WHERE sa_name <> ''");
+    store.Exec("DELETE FROM ipsvc_ipsec_sa");
+  });
+}
+
+void IpSecConfigImpl::GetSADConfigList(std::vector<IpSecSadParam>& list) {
+  Store& store = Store::Host();
+  store.CheckFault("GetSADConfigList", "*");
+  store.Read([&] {
+    Statement rows = store.Prepare(
+        "SELECT name, source, destination, spi, mode, encryption, integrity, encryption_key, "
+        "integrity_key, state, lifetime FROM ipsvc_ipsec_sa ORDER BY id");
+    while (rows.Step()) {
+      IpSecSadParam sa;
+      sa.name = rows.Text(0);
+      sa.srcAddress = rows.Text(1);
+      sa.dstAddress = rows.Text(2);
+      sa.spi = static_cast<uint32_t>(rows.Int(3));
+      sa.mode = static_cast<int>(rows.Int(4));
+      sa.encryptionAlgorithm = static_cast<int>(rows.Int(5));
+      sa.integrityAlgorithm = static_cast<int>(rows.Int(6));
+      sa.encryptionKey = rows.Text(7);
+      sa.integrityKey = rows.Text(8);
+      sa.state = static_cast<int>(rows.Int(9));
+      sa.lifetime = static_cast<uint64_t>(rows.Int(10));
+      list.push_back(std::move(sa));
+    }
+  });
+}
+
+void IpSecConfigImpl::AddSPDConfig(const IpSecSpdParam& sp) {
+  Store& store = Store::Host();
+  store.CheckFault("AddSPDConfig", sp.name);
+  if (sp.saName == "UNKNOWN" || sp.saName == "auto")
+    throw HostCtlException("No SA named " + sp.saName + " exists");
+  store.Write([&] { Model::IpSvc::InsertSp(store, sp); });
+}
+
+void IpSecConfigImpl::RemoveSPDConfig(const std::string& name) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveSPDConfig", name);
+  store.Write([&] {
+    store.Prepare("DELETE FROM ipsvc_ipsec_sp WHERE name = ?").Bind(1, name).Run();
+    if (store.Changes() == 0)
+      throw HostCtlException("No SP named " + name + " exists");
+  });
+}
+
+void IpSecConfigImpl::FlushSPDConfig() {
+  Store& store = Store::Host();
+  store.CheckFault("FlushSPDConfig", "*");
+  store.Write([&] { store.Exec("DELETE FROM ipsvc_ipsec_sp"); });
+}
+
+void IpSecConfigImpl::GetSPDConfigList(std::vector<IpSecSpdParam>& list) {
+  Store& store = Store::Host();
+  store.CheckFault("GetSPDConfigList", "*");
+  store.Read([&] {
+    Statement rows = store.Prepare(
+        "SELECT name, source, source_prefix, source_port, destination, destination_prefix, "
+        "destination_port, protocol, direction, action, mode, sa_name, sa_lost FROM "
+        "ipsvc_ipsec_sp ORDER BY id");
+    while (rows.Step()) {
+      IpSecSpdParam sp;
+      sp.name = rows.Text(0);
+      sp.srcAddress = rows.Text(1);
+      sp.srcPrefixLength = static_cast<int>(rows.Int(2));
+      sp.srcPort = static_cast<uint32_t>(rows.Int(3));
+      sp.dstAddress = rows.Text(4);
+      sp.dstPrefixLength = static_cast<int>(rows.Int(5));
+      sp.dstPort = static_cast<uint32_t>(rows.Int(6));
+      sp.ulProto = static_cast<int>(rows.Int(7));
+      sp.direction = static_cast<int>(rows.Int(8));
+      sp.action = static_cast<int>(rows.Int(9));
+      sp.mode = static_cast<int>(rows.Int(10));
+      sp.saName = rows.Bool(12) ? std::string("UNKNOWN") : rows.Text(11);
+      list.push_back(std::move(sp));
+    }
+  });
+}
+
+} // namespace TvkCtl::Network

@@ -1,0 +1,412 @@
+//===- RoutingInfoImpl.cpp - Routes and neighbours of one netstack --------===//
+#include "TvkCtl/Network/RoutingInfoImpl.h"
+
+#include "HostCtl/Lib.h"
+#include "model/IpServicesModel.h"
+#include "model/Store.h"
+
+namespace TvkCtl::Network {
+
+using HostCtl::Lib::HostCtlException;
+using HostCtl::Network::Ipv4Address;
+using HostCtl::Network::Ipv4Neighbor;
+using HostCtl::Network::Ipv4Network;
+using HostCtl::Network::Ipv4Route;
+using HostCtl::Network::Ipv6Address;
+using HostCtl::Network::Ipv6Neighbor;
+using HostCtl::Network::Ipv6Network;
+using HostCtl::Network::Ipv6Route;
+using HostCtl::Network::PortsetGetType;
+using Model::Statement;
+using Model::Store;
+namespace IpSvc = Model::IpSvc;
+
+const Ipv4Network RoutingInfoImpl::DEFAULT_IPV4_ROUTE(Ipv4Address(0u), Ipv4Address(0u));
+const Ipv6Network RoutingInfoImpl::DEFAULT_IPV6_ROUTE(Ipv6Address(), 0);
+
+namespace {
+
+/// The text of a route's destination for messages.
+template <typename Network> std::string Destination(const Network& network, const Network& dflt) {
+  return network == dflt ? std::string("default") : network.GetStringAddress();
+}
+
+/// The text of a neighbour entry for messages.
+template <typename Neighbor>
+std::string NeighborText(const char* family, const Neighbor& neighbor,
+                         const std::string& netstack) {
+  std::string text =
+      std::string("No ") + family + " neighbor " + neighbor.GetAddress().GetStringAddress();
+  if (neighbor.GetInterfaceName().empty())
+    return text + " in netstack " + netstack;
+  return text + " on interface " + neighbor.GetInterfaceName() + " in netstack " + netstack;
+}
+
+/// Deletes the neighbour entries of one address; true when there were any.
+template <typename Neighbor>
+bool DeleteNeighbors(Store& store, int family, const Neighbor& neighbor,
+                     const std::string& netstack) {
+  store
+      .Prepare("DELETE FROM ipsvc_neighbor WHERE family = ?1 AND address = ?2 AND interface IN "
+               "(SELECT name FROM tvknic WHERE netstack = ?3) AND (?4 = '' OR interface = ?4)")
+      .BindAll(family, neighbor.GetAddress().GetStringAddress(), netstack,
+               neighbor.GetInterfaceName())
+      .Run();
+  return store.Changes() > 0;
+}
+
+/// The neighbour rows of a netstack.
+Statement NeighborRows(Store& store, int family, const std::string& netstack,
+                       const std::string& interfaceName, PortsetGetType selector) {
+  Statement rows = store.Prepare(
+      "SELECT n.address, n.mac, n.interface, n.expiry, n.type, n.state FROM ipsvc_neighbor n "
+      "JOIN tvknic t ON t.name = n.interface WHERE t.netstack = ?1 AND t.system = ?2 AND "
+      "n.family = ?3 AND (?4 = '' OR n.interface = ?4) ORDER BY t.ord, n.id");
+  rows.BindAll(netstack, selector == HostCtl::Network::PortsetGetSystem, family, interfaceName);
+  return rows;
+}
+
+} // namespace
+
+RoutingInfoImpl::RoutingInfoImpl(std::string netstackKey) : netstack_(std::move(netstackKey)) {}
+
+void RoutingInfoImpl::SetNetstackInstanceKey(const std::string& key) {
+  netstack_ = key;
+  Refresh();
+}
+
+void RoutingInfoImpl::Refresh() {
+  sources_.clear();
+}
+
+// --- IPv4 routes -------------------------------------------------------------
+
+std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType selector) {
+  Store& store = Store::Host();
+  store.CheckFault("GetCurrentTarvikRoutes", netstack_);
+  std::vector<Ipv4Route> routes;
+  sources_.clear();
+  store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    bool system = selector == HostCtl::Network::PortsetGetSystem;
+    Statement nics = store.Prepare(
+        "SELECT name, ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = ? AND system = ? "
+        "AND enabled = 1 AND ipv4_address <> '0.0.0.0' ORDER BY ord");
+    nics.BindAll(netstack_, system);
+    while (nics.Step()) {
+      uint32_t address = 0;
+      uint32_t mask = 0;
+      if (!Ipv4Address::Parse(nics.Text(1), address) || !Ipv4Address::Parse(nics.Text(2), mask) ||
+          mask == 0 || !Ipv4Address(mask).IsNetmask())
+        continue;
+      Ipv4Network network(Ipv4Address(address & mask), Ipv4Address(mask));
+      sources_.emplace(network.GetStringAddress(), SOURCE_CONNECTED);
+      routes.emplace_back(network, Ipv4Address(), nics.Text(0));
+    }
+    Statement rows = store.Prepare(
+        "SELECT network, prefix, gateway, interface, source FROM ipsvc_route WHERE netstack = ? "
+        "AND family = 4 AND system = ? ORDER BY id");
+    rows.BindAll(netstack_, system);
+    while (rows.Step()) {
+      Ipv4Network network(Ipv4Address(rows.Text(0)),
+                          Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));
+      sources_.emplace(network.GetStringAddress(), rows.Text(4));
+      routes.emplace_back(network, Ipv4Address(rows.Text(2)), rows.Text(3));
+    }
+  });
+  return routes;
+}
+
+void RoutingInfoImpl::AddTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) {
+  Store& store = Store::Host();
+  store.CheckFault("AddTarvikRoute", netstack_);
+  store.Write(
+      [&] { IpSvc::InsertRoute(store, netstack_, network, gateway, "", SOURCE_USER, false); });
+}
+
+void RoutingInfoImpl::RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveTarvikRoute", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    store
+        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
+                 "network = ? AND prefix = ? AND gateway = ?")
+        .BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength(),
+                 gateway.GetStringAddress())
+        .Run();
+    if (store.Changes() == 0)
+      throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV4_ROUTE) +
+                             " through " + gateway.GetStringAddress() + " in netstack " +
+                             netstack_);
+  });
+}
+
+namespace {
+
+/// The gateway of the ordinary default route of one family, or "".
+std::string RunningGateway(Store& store, const std::string& netstack, int family) {
+  Statement row = store.Prepare(
+      "SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? AND system = 0 AND "
+      "prefix = 0 AND network IN ('0.0.0.0', '::')");
+  row.BindAll(netstack, family);
+  return row.Step() ? row.Text(0) : std::string();
+}
+
+} // namespace
+
+Ipv4Address RoutingInfoImpl::GetTvKernelDefaultGateway() {
+  Store& store = Store::Host();
+  store.CheckFault("GetTvKernelDefaultGateway", netstack_);
+  std::string gateway = store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    return RunningGateway(store, netstack_, 4);
+  });
+  return gateway.empty() ? Ipv4Address() : Ipv4Address(gateway);
+}
+
+Ipv4Address RoutingInfoImpl::GetTvKernelConfigDefaultGateway() {
+  Store& store = Store::Host();
+  store.CheckFault("GetTvKernelConfigDefaultGateway", netstack_);
+  std::string gateway = store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    return IpSvc::ConfiguredGateway(store, netstack_, 4);
+  });
+  return gateway.empty() ? Ipv4Address() : Ipv4Address(gateway);
+}
+
+void RoutingInfoImpl::SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool runningOnly) {
+  Store& store = Store::Host();
+  store.CheckFault("SetTvKernelDefaultGateway", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    store
+        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
+                 "network = '0.0.0.0' AND prefix = 0")
+        .Bind(1, netstack_)
+        .Run();
+    bool clear = gateway.GetValue() == 0;
+    if (!clear)
+      IpSvc::InsertRoute(store, netstack_, DEFAULT_IPV4_ROUTE, gateway, "", SOURCE_CONFIG, false);
+    if (!runningOnly)
+      IpSvc::PutConfiguredGateway(store, netstack_, 4, clear ? "" : gateway.GetStringAddress());
+  });
+}
+
+std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network) {
+  Store& store = Store::Host();
+  store.CheckFault("GetDefaultGatewaySource", netstack_);
+  auto known = sources_.find(network.GetStringAddress());
+  if (known != sources_.end())
+    return known->second;
+  return store.Read([&] {
+    Statement row = store.Prepare(
+        "SELECT source FROM ipsvc_route WHERE netstack = ? AND family = 4 AND network = ? AND "
+        "prefix = ? ORDER BY system");
+    row.BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength());
+    if (row.Step())
+      return row.Text(0);
+    Statement nics = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack "
+                                   "= ? AND enabled = 1 AND ipv4_address <> '0.0.0.0'");
+    nics.Bind(1, netstack_);
+    while (nics.Step()) {
+      uint32_t address = 0;
+      uint32_t mask = 0;
+      if (Ipv4Address::Parse(nics.Text(0), address) && Ipv4Address::Parse(nics.Text(1), mask) &&
+          Ipv4Network(Ipv4Address(address & mask), Ipv4Address(mask)) == network)
+        return std::string(SOURCE_CONNECTED);
+    }
+    return std::string();
+  });
+}
+
+// --- IPv6 routes -------------------------------------------------------------
+
+std::vector<Ipv6Route> RoutingInfoImpl::GetCurrentIpv6TarvikRoutes(PortsetGetType selector) {
+  Store& store = Store::Host();
+  store.CheckFault("GetCurrentIpv6TarvikRoutes", netstack_);
+  std::vector<Ipv6Route> routes;
+  store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    if (!IpSvc::Ipv6Running(store, netstack_))
+      return;
+    bool system = selector == HostCtl::Network::PortsetGetSystem;
+    Statement nics = store.Prepare(
+        "SELECT t.name, a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = a.nic "
+        "WHERE t.netstack = ? AND t.system = ? AND t.enabled = 1 AND a.status <> 3 AND "
+        "a.prefix > 0 AND a.prefix < 128 ORDER BY t.ord, a.ord");
+    nics.BindAll(netstack_, system);
+    while (nics.Step()) {
+      std::array<uint8_t, 16> bytes{};
+      if (!Ipv6Address::Parse(nics.Text(1), bytes))
+        continue;
+      int prefix = static_cast<int>(nics.Int(2));
+      const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
+      for (int i = 0; i < 16; ++i)
+        bytes[i] &= mask[i];
+      routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(0));
+    }
+    Statement rows = store.Prepare(
+        "SELECT network, prefix, gateway, interface FROM ipsvc_route WHERE netstack = ? AND "
+        "family = 6 AND system = ? ORDER BY id");
+    rows.BindAll(netstack_, system);
+    while (rows.Step())
+      routes.emplace_back(Ipv6Network(Ipv6Address(rows.Text(0)), static_cast<int>(rows.Int(1))),
+                          Ipv6Address(rows.Text(2)), rows.Text(3));
+  });
+  return routes;
+}
+
+void RoutingInfoImpl::AddIpv6TarvikRoute(const Ipv6Network& network, const Ipv6Address& gateway) {
+  Store& store = Store::Host();
+  store.CheckFault("AddIpv6TarvikRoute", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    IpSvc::RequireIpv6(store, netstack_);
+    IpSvc::InsertRoute(store, netstack_, network, gateway, "", SOURCE_USER, false);
+  });
+}
+
+void RoutingInfoImpl::RemoveIpv6TarvikRoute(const Ipv6Network& network,
+                                            const Ipv6Address& gateway) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveIpv6TarvikRoute", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    IpSvc::RequireIpv6(store, netstack_);
+    store
+        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
+                 "network = ? AND prefix = ? AND gateway = ?")
+        .BindAll(netstack_, network.GetAddress().GetStringAddress(), network.GetNetmask(),
+                 gateway.GetStringAddress())
+        .Run();
+    if (store.Changes() == 0)
+      throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV6_ROUTE) +
+                             " through " + gateway.GetStringAddress() + " in netstack " +
+                             netstack_);
+  });
+}
+
+Ipv6Address RoutingInfoImpl::GetIpv6TvKernelDefaultGateway() {
+  Store& store = Store::Host();
+  store.CheckFault("GetIpv6TvKernelDefaultGateway", netstack_);
+  std::string gateway = store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    if (!IpSvc::Ipv6Running(store, netstack_))
+      return std::string();
+    return RunningGateway(store, netstack_, 6);
+  });
+  return gateway.empty() ? Ipv6Address() : Ipv6Address(gateway);
+}
+
+Ipv6Address RoutingInfoImpl::GetIpv6TvKernelConfigDefaultGateway() {
+  Store& store = Store::Host();
+  store.CheckFault("GetIpv6TvKernelConfigDefaultGateway", netstack_);
+  std::string gateway = store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    return IpSvc::ConfiguredGateway(store, netstack_, 6);
+  });
+  return gateway.empty() ? Ipv6Address() : Ipv6Address(gateway);
+}
+
+void RoutingInfoImpl::SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) {
+  Store& store = Store::Host();
+  store.CheckFault("SetIpv6TvKernelDefaultGateway", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    bool clear = gateway.IsUnspecified();
+    if (!clear)
+      IpSvc::RequireIpv6(store, netstack_);
+    store
+        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
+                 "network = '::' AND prefix = 0")
+        .Bind(1, netstack_)
+        .Run();
+    if (!clear)
+      IpSvc::InsertRoute(store, netstack_, DEFAULT_IPV6_ROUTE, gateway, "", SOURCE_CONFIG, false);
+    IpSvc::PutConfiguredGateway(store, netstack_, 6, clear ? "" : gateway.GetStringAddress());
+  });
+}
+
+// --- Neighbour caches --------------------------------------------------------
+
+const std::vector<std::string>& RoutingInfoImpl::NeighborTypeNames() {
+  static const std::vector<std::string> names = {"Unknown", "Dynamic", "Static", "Local", "Router"};
+  return names;
+}
+
+const std::vector<std::string>& RoutingInfoImpl::NeighborStateNames() {
+  static const std::vector<std::string> names = {"Incomplete", "Reachable", "Stale",
+                                                 "Delay",      "Probe",     "Unreachable"};
+  return names;
+}
+
+void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& list,
+                                                    const std::string& interfaceName,
+                                                    PortsetGetType selector) {
+  Store& store = Store::Host();
+  store.CheckFault("GetCurrentIpv4TarvikNeighbors", netstack_);
+  store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    Statement rows = NeighborRows(store, 4, netstack_, interfaceName, selector);
+    while (rows.Step())
+      list.emplace_back(Ipv4Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
+                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+  });
+}
+
+void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& list,
+                                                    const std::string& interfaceName,
+                                                    PortsetGetType selector) {
+  Store& store = Store::Host();
+  store.CheckFault("GetCurrentIpv6TarvikNeighbors", netstack_);
+  store.Read([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    if (!IpSvc::Ipv6Running(store, netstack_))
+      return;
+    Statement rows = NeighborRows(store, 6, netstack_, interfaceName, selector);
+    while (rows.Step())
+      list.emplace_back(Ipv6Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
+                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+  });
+}
+
+namespace {
+std::string NameOf(const std::vector<std::string>& names, int code) {
+  return code >= 0 && static_cast<std::size_t>(code) < names.size() ? names[code] : names[0];
+}
+} // namespace
+
+std::string RoutingInfoImpl::GetIpv4NeighborType(const Ipv4Neighbor& neighbor) const {
+  return NameOf(NeighborTypeNames(), neighbor.GetTypeCode());
+}
+
+std::string RoutingInfoImpl::GetIpv6NeighborType(const Ipv6Neighbor& neighbor) const {
+  return NameOf(NeighborTypeNames(), neighbor.GetTypeCode());
+}
+
+std::string RoutingInfoImpl::GetIpv6NeighborState(const Ipv6Neighbor& neighbor) const {
+  return NameOf(NeighborStateNames(), neighbor.GetStateCode());
+}
+
+void RoutingInfoImpl::RemoveIpv4Neighbor(const Ipv4Neighbor& neighbor) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveIpv4Neighbor", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    if (!DeleteNeighbors(store, 4, neighbor, netstack_))
+      throw HostCtlException(NeighborText("IPv4", neighbor, netstack_));
+  });
+}
+
+void RoutingInfoImpl::RemoveIpv6Neighbor(const Ipv6Neighbor& neighbor) {
+  Store& store = Store::Host();
+  store.CheckFault("RemoveIpv6Neighbor", netstack_);
+  store.Write([&] {
+    IpSvc::RequireNetstack(store, netstack_);
+    if (!DeleteNeighbors(store, 6, neighbor, netstack_))
+      throw HostCtlException(NeighborText("IPv6", neighbor, netstack_));
+  });
+}
+
+} // namespace TvkCtl::Network

@@ -1,0 +1,391 @@
+//===- Route.cpp - network ip route ipv4|ipv6 add, remove, list -----------===//
+//
+// The six route commands. IPv4 and IPv6 share one implementation: a traits
+// structure per family names the routing service's operations, the default
+// network and the texts that differ.
+//
+//===----------------------------------------------------------------------===//
+#include "ip.h"
+
+#include "HostCtl/Lib.h"
+#include "TvkCtl/Network/RoutingInfoImpl.h"
+#include "ip/ParamTable.h"
+
+namespace CorvexCli::NetworkNamespace {
+
+using Fabrik::CallSpec::Input;
+using Fabrik::CallSpec::InputSpec;
+using Fabrik::CallSpec::Output;
+using Fabrik::CallSpec::OutputSpec;
+using Fabrik::MetaObj::MetaBool;
+using Fabrik::MetaObj::MetaList;
+using Fabrik::MetaObj::MetaStruct;
+using HostCtl::Lib::HostCtlException;
+using TvkCtl::Network::RoutingInfoImpl;
+
+namespace {
+
+const std::string kDefaultNetstack = "defaultTcpipStack";
+const std::string kDefaultNetwork = "default";
+const std::string kNetwork = "Network";
+const std::string kNetmask = "Netmask";
+const std::string kGateway = "Gateway";
+const std::string kInterface = "Interface";
+const std::string kSource = "Source";
+
+/// What differs between the IPv4 and the IPv6 commands.
+struct Ipv4Family {
+  using Network = HostCtl::Network::Ipv4Network;
+  using Address = HostCtl::Network::Ipv4Address;
+  static constexpr const char* kWord = "Ipv4";      ///< In parameter descriptions.
+  static constexpr const char* kUpperWord = "IPv4"; ///< In the type description.
+  static const Network& DefaultNetwork() { return RoutingInfoImpl::DEFAULT_IPV4_ROUTE; }
+  static void Add(RoutingInfoImpl& routing, const Network& network, const Address& gateway) {
+    routing.AddTarvikRoute(network, gateway);
+  }
+  static void Remove(RoutingInfoImpl& routing, const Network& network, const Address& gateway) {
+    routing.RemoveTarvikRoute(network, gateway);
+  }
+  static Address Running(RoutingInfoImpl& routing) { return routing.GetTvKernelDefaultGateway(); }
+  static Address Configured(RoutingInfoImpl& routing) {
+    return routing.GetTvKernelConfigDefaultGateway();
+  }
+  static void ClearDefaultGateway(RoutingInfoImpl& routing) {
+    routing.SetTvKernelDefaultGateway(Address("0.0.0.0"), false);
+  }
+};
+
+struct Ipv6Family {
+  using Network = HostCtl::Network::Ipv6Network;
+  using Address = HostCtl::Network::Ipv6Address;
+  static constexpr const char* kWord = "Ipv6";
+  static constexpr const char* kUpperWord = "IPv6";
+  static const Network& DefaultNetwork() { return RoutingInfoImpl::DEFAULT_IPV6_ROUTE; }
+  static void Add(RoutingInfoImpl& routing, const Network& network, const Address& gateway) {
+    routing.AddIpv6TarvikRoute(network, gateway);
+  }
+  static void Remove(RoutingInfoImpl& routing, const Network& network, const Address& gateway) {
+    routing.RemoveIpv6TarvikRoute(network, gateway);
+  }
+  static Address Running(RoutingInfoImpl& routing) {
+    return routing.GetIpv6TvKernelDefaultGateway();
+  }
+  static Address Configured(RoutingInfoImpl& routing) {
+    return routing.GetIpv6TvKernelConfigDefaultGateway();
+  }
+  static void ClearDefaultGateway(RoutingInfoImpl& routing) {
+    routing.SetIpv6TvKernelDefaultGateway(Address());
+  }
+};
+
+/// Parameters of add (\p add true) and remove.
+template <typename Family> std::shared_ptr<InputSpec> ChangeInputSpec(bool add) {
+  std::string word = Family::kWord;
+  std::string networkText = add ? "The " + word +
+                                      " address and prefix length of the network to add the "
+                                      "route to. Specify 'default' to indicate the default network."
+                                : "The " + word +
+                                      " address and prefix length of the network to remove the "
+                                      "route from. Specify 'default' to indicate the default "
+                                      "network.";
+  std::string gatewayText =
+      add ? "The " + word + " address of the gateway through which a route to be added."
+          : "The " + word + " address of the gateway through which a route to be removed";
+  return MakeInputSpec({
+      {"network", Fabrik::CallSpec::String, "n", true, networkText},
+      {"gateway", Fabrik::CallSpec::String, "g", true, gatewayText},
+      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
+  });
+}
+
+template <typename Family> std::shared_ptr<InputSpec> ListInputSpec() {
+  return MakeInputSpec({
+      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
+      {"type", Fabrik::CallSpec::String, "t", false,
+       std::string("List ") + Family::kUpperWord + " routes with given type(e.g. system)."},
+  });
+}
+
+/// The routing service of the command's netstack.
+RoutingInfoImpl OpenRouting(const Input& input) {
+  RoutingInfoImpl routing(kDefaultNetstack);
+  if (input.HasParameter("netstack") && !input.GetParameter("netstack").empty())
+    routing.SetNetstackInstanceKey(input.GetParameter("netstack"));
+  return routing;
+}
+
+/// The network the user named ("default" or address/prefix length).
+template <typename Family> typename Family::Network ParseNetwork(const std::string& text) {
+  if (text == kDefaultNetwork)
+    return Family::DefaultNetwork();
+  return typename Family::Network(text);
+}
+
+template <typename Family> void ExecuteAdd(const Input& input, Output& output) {
+  try {
+    RoutingInfoImpl routing = OpenRouting(input);
+    typename Family::Address gateway(input.GetParameter("gateway"));
+    typename Family::Network network = ParseNetwork<Family>(input.GetParameter("network"));
+    Family::Add(routing, network, gateway);
+    output.SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
+  }
+}
+
+template <typename Family> void ExecuteRemove(const Input& input, Output& output) {
+  try {
+    RoutingInfoImpl routing = OpenRouting(input);
+    const std::string& gatewayText = input.GetParameter("gateway");
+    typename Family::Address gateway(gatewayText);
+    typename Family::Network network = ParseNetwork<Family>(input.GetParameter("network"));
+    if (!(network == Family::DefaultNetwork())) {
+      Family::Remove(routing, network, gateway);
+    } else if (gateway == Family::Running(routing) || gateway == Family::Configured(routing)) {
+      // The default route is the default gateway: clearing it removes both
+      // the running route and its configuration.
+      Family::ClearDefaultGateway(routing);
+    } else {
+      output.AddErrorMessage(gatewayText + " is not a default route.");
+    }
+    output.SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
+  }
+}
+
+/// Checks the "type" parameter of a listing and gives the selector; false
+/// (with the error added) when the listing must stop.
+bool ListSelector(const Input& input, const RoutingInfoImpl& routing, Output& output,
+                  HostCtl::Network::PortsetGetType& selector) {
+  selector = HostCtl::Network::PortsetGetRegular;
+  if (!input.HasParameter("type"))
+    return true;
+  if (input.GetParameter("type") != "system") {
+    output.AddErrorMessage("Invalid type value, should be 'system'.");
+    return false;
+  }
+  if (routing.GetNetstackInstanceKey() != kDefaultNetstack) {
+    output.AddErrorMessage("Invalid netstack value, should be 'defaultTcpipStack'.");
+    return false;
+  }
+  selector = HostCtl::Network::PortsetGetSystem;
+  return true;
+}
+
+/// The "Network" text of a route.
+template <typename Family> std::string NetworkText(const typename Family::Network& network);
+template <> std::string NetworkText<Ipv4Family>(const Ipv4Family::Network& network) {
+  return network == Ipv4Family::DefaultNetwork() ? kDefaultNetwork
+                                                 : network.GetNetwork().GetStringAddress();
+}
+template <> std::string NetworkText<Ipv6Family>(const Ipv6Family::Network& network) {
+  return network == Ipv6Family::DefaultNetwork() ? kDefaultNetwork
+                                                 : network.GetAddress().GetStringAddress();
+}
+
+} // namespace
+
+// network ip route ipv4 add
+
+CORVEX_DEFINE_NEW(IpRouteIpv4Add)
+
+IpRouteIpv4Add::IpRouteIpv4Add() {
+  SetDescription("Add IPv4 route to the Tarvik.");
+}
+
+IpRouteIpv4Add::~IpRouteIpv4Add() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv4Add::GetInputSpecInternal() {
+  return ChangeInputSpec<Ipv4Family>(true);
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv4Add::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaBool::New());
+}
+
+void IpRouteIpv4Add::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                     const std::shared_ptr<Output>& output) {
+  ExecuteAdd<Ipv4Family>(*input, *output);
+}
+
+// network ip route ipv4 remove
+
+CORVEX_DEFINE_NEW(IpRouteIpv4Remove)
+
+IpRouteIpv4Remove::IpRouteIpv4Remove() {
+  SetDescription("Remove IPv4 route");
+}
+
+IpRouteIpv4Remove::~IpRouteIpv4Remove() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv4Remove::GetInputSpecInternal() {
+  return ChangeInputSpec<Ipv4Family>(false);
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv4Remove::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaBool::New());
+}
+
+void IpRouteIpv4Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                        const std::shared_ptr<Output>& output) {
+  ExecuteRemove<Ipv4Family>(*input, *output);
+}
+
+// network ip route ipv4 list
+
+CORVEX_DEFINE_NEW(IpRouteIpv4List)
+
+IpRouteIpv4List::IpRouteIpv4List() {
+  SetDescription("List configured IPv4 routes");
+  SetDefaultOutputFormatter("table");
+  SetDefaultOutputParameter("fields:Ipv4Route", kNetwork + "," + kNetmask + "," + kGateway + "," +
+                                                    kInterface + "," + kSource);
+}
+
+IpRouteIpv4List::~IpRouteIpv4List() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv4List::GetInputSpecInternal() {
+  return ListInputSpec<Ipv4Family>();
+}
+
+std::shared_ptr<MetaStruct> IpRouteIpv4List::GetOutputStructure() {
+  using Fabrik::MetaObj::String;
+  return MakeStructure("Ipv4Route", {{kNetwork.c_str(), String},
+                                     {kNetmask.c_str(), String},
+                                     {kGateway.c_str(), String},
+                                     {kInterface.c_str(), String},
+                                     {kSource.c_str(), String}});
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+}
+
+void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                      const std::shared_ptr<Output>& output) {
+  try {
+    RoutingInfoImpl routing = OpenRouting(*input);
+    HostCtl::Network::PortsetGetType selector;
+    if (!ListSelector(*input, routing, *output, selector))
+      return;
+    std::vector<HostCtl::Network::Ipv4Route> routes = routing.GetCurrentTarvikRoutes(selector);
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
+    list->Reserve(routes.size());
+    for (const HostCtl::Network::Ipv4Route& route : routes) {
+      auto row = GetOutputStructure();
+      row->SetField(kNetmask, route.GetNetwork().GetNetmask().GetStringAddress());
+      row->SetField(kInterface, route.GetInterfaceName());
+      row->SetField(kNetwork, NetworkText<Ipv4Family>(route.GetNetwork()));
+      row->SetField(kGateway, route.GetGateway().GetStringAddress());
+      row->SetField(kSource, routing.GetDefaultGatewaySource(route.GetNetwork()));
+      list->Add(row);
+    }
+    output->SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network ip route ipv6 add
+
+CORVEX_DEFINE_NEW(IpRouteIpv6Add)
+
+IpRouteIpv6Add::IpRouteIpv6Add() {
+  SetDescription("Add IPv6 route to the Tarvik.");
+}
+
+IpRouteIpv6Add::~IpRouteIpv6Add() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv6Add::GetInputSpecInternal() {
+  return ChangeInputSpec<Ipv6Family>(true);
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv6Add::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaBool::New());
+}
+
+void IpRouteIpv6Add::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                     const std::shared_ptr<Output>& output) {
+  ExecuteAdd<Ipv6Family>(*input, *output);
+}
+
+// network ip route ipv6 remove
+
+CORVEX_DEFINE_NEW(IpRouteIpv6Remove)
+
+IpRouteIpv6Remove::IpRouteIpv6Remove() {
+  SetDescription("Remove IPv6 route from the Tarvik");
+}
+
+IpRouteIpv6Remove::~IpRouteIpv6Remove() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv6Remove::GetInputSpecInternal() {
+  return ChangeInputSpec<Ipv6Family>(false);
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv6Remove::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaBool::New());
+}
+
+void IpRouteIpv6Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                        const std::shared_ptr<Output>& output) {
+  ExecuteRemove<Ipv6Family>(*input, *output);
+}
+
+// network ip route ipv6 list
+
+CORVEX_DEFINE_NEW(IpRouteIpv6List)
+
+IpRouteIpv6List::IpRouteIpv6List() {
+  SetDescription("List configured IPv6 routes");
+  SetDefaultOutputFormatter("table");
+  SetDefaultOutputParameter("fields:Ipv6Route",
+                            kNetwork + "," + kNetmask + "," + kGateway + "," + kInterface);
+}
+
+IpRouteIpv6List::~IpRouteIpv6List() = default;
+
+std::shared_ptr<InputSpec> IpRouteIpv6List::GetInputSpecInternal() {
+  return ListInputSpec<Ipv6Family>();
+}
+
+std::shared_ptr<MetaStruct> IpRouteIpv6List::GetOutputStructure() {
+  using Fabrik::MetaObj::String;
+  return MakeStructure("Ipv6Route", {{kNetwork.c_str(), String},
+                                     {kNetmask.c_str(), String},
+                                     {kGateway.c_str(), String},
+                                     {kInterface.c_str(), String}});
+}
+
+std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {
+  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+}
+
+void IpRouteIpv6List::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                      const std::shared_ptr<Output>& output) {
+  try {
+    RoutingInfoImpl routing = OpenRouting(*input);
+    HostCtl::Network::PortsetGetType selector;
+    if (!ListSelector(*input, routing, *output, selector))
+      return;
+    std::vector<HostCtl::Network::Ipv6Route> routes = routing.GetCurrentIpv6TarvikRoutes(selector);
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
+    list->Reserve(routes.size());
+    for (const HostCtl::Network::Ipv6Route& route : routes) {
+      auto row = GetOutputStructure();
+      row->SetField(kNetmask, HostCtl::Network::Ipv6Network::NetmaskFromNumber(
+                                  route.GetNetwork().GetNetmask())
+                                  .GetStringAddress());
+      row->SetField(kInterface, route.GetInterfaceName());
+      row->SetField(kNetwork, NetworkText<Ipv6Family>(route.GetNetwork()));
+      row->SetField(kGateway, route.GetGateway().GetStringAddress());
+      list->Add(row);
+    }
+    output->SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+} // namespace CorvexCli::NetworkNamespace
