@@ -9,6 +9,13 @@
 
 #include "common/CommandBase.h"
 
+#include "HostCtl/Network/Switching.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
 namespace CorvexCli::NetworkNamespace {
 
 // Standard virtual switches and their uplinks (Standard.cpp).
@@ -141,6 +148,11 @@ class VirtualSwitchPortGroupPolicySecuritySet : public virtual Fabrik::AutoCli::
 class VirtualSwitchDVSCorvexList : public virtual Fabrik::AutoCli::Command {
   CORVEX_COMMAND(VirtualSwitchDVSCorvexList)
   CORVEX_OUTPUT_STRUCTURE
+  /// The template of one distributed port of a row.
+  std::shared_ptr<Fabrik::MetaObj::MetaStruct> GetDVPortStructure();
+  /// The "DVPort" values of \p ports, in order.
+  std::shared_ptr<Fabrik::MetaObj::MetaList>
+  GetDVPortList(const std::vector<std::unique_ptr<HostCtl::Network::DVPort>>& ports);
 };
 
 // LACP (Lacp.cpp).
@@ -167,5 +179,13 @@ class LacpGetStats : public virtual Fabrik::AutoCli::Command {
 class LacpSetTimeout : public virtual Fabrik::AutoCli::Command {
   CORVEX_COMMAND(LacpSetTimeout)
 };
+
+/// The names of the set bits of LACP state \p state ("ACT" for bit 0 to
+/// "EXP" for bit 7), each followed by ",".
+std::string LacpPortStateToString(uint8_t state);
+/// A partner age in seconds as hours:minutes:seconds, two digits at least each.
+std::string LacpAgeToString(uint32_t seconds);
+/// The name of load-balancing index \p index of a LAG.
+std::string LacpLoadBalanceToString(uint32_t index);
 
 } // namespace CorvexCli::NetworkNamespace

@@ -3,6 +3,7 @@
 #include "SwitchingStore.h"
 
 #include <cstring>
+#include <map>
 
 namespace TvkCtl::Network {
 
@@ -108,11 +109,26 @@ std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
   store.CheckFault("GetDVPorts", data_.name);
   return store.Read([&] {
     std::string uuid = ReadDvs(store, data_).uuid;
+    std::map<std::string, std::vector<std::string>> clients;
+    Statement users = store.Prepare("SELECT dvport_key, client FROM port WHERE portset_id = ? "
+                                    "AND dvport_key IS NOT NULL ORDER BY id");
+    users.Bind(1, data_.id);
+    while (users.Step())
+      clients[users.Text(0)].push_back(users.Text(1));
     std::vector<std::unique_ptr<DVPort>> ports;
-    Statement rows = store.Prepare("SELECT port_key FROM dvport WHERE portset_id = ? ORDER BY ord");
+    Statement rows = store.Prepare(
+        "SELECT d.port_key, d.connection_id, coalesce(l.name, ''), d.portgroup_key FROM dvport d "
+        "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+        "WHERE d.portset_id = ? ORDER BY d.ord");
     rows.Bind(1, data_.id);
-    while (rows.Step())
-      ports.push_back(std::make_unique<DVPortImpl>(uuid, rows.Text(0)));
+    while (rows.Step()) {
+      std::string key = rows.Text(0);
+      auto used = clients.find(key);
+      DVPortData port{rows.Text(2), rows.Text(3),
+                      used == clients.end() ? std::vector<std::string>() : used->second};
+      ports.push_back(std::make_unique<DVPortImpl>(
+          DVPortParam{uuid, key, static_cast<uint32_t>(rows.Int(1))}, std::move(port)));
+    }
     return ports;
   });
 }
@@ -260,6 +276,9 @@ DVPortImpl::DVPortImpl(std::string switchId, std::string dvPortId) {
   param_.portId = std::move(dvPortId);
 }
 
+DVPortImpl::DVPortImpl(DVPortParam param, DVPortData data)
+    : param_(std::move(param)), listed_(std::move(data)) {}
+
 DVPortImpl::~DVPortImpl() = default;
 
 namespace {
@@ -330,14 +349,22 @@ std::string DVPortImpl::GetPortId() const {
 }
 
 std::string DVPortImpl::GetName() const {
+  if (listed_)
+    return listed_->name;
   return RequireDVPort("GetName", param_).name;
 }
 
 std::string DVPortImpl::GetDVPortgroupId() const {
+  if (listed_)
+    return listed_->portgroupKey;
   return RequireDVPort("GetDVPortgroupId", param_).portgroupKey;
 }
 
 bool DVPortImpl::IsInUse(std::vector<std::string>& clients) const {
+  if (listed_) {
+    clients.insert(clients.end(), listed_->clients.begin(), listed_->clients.end());
+    return !listed_->clients.empty();
+  }
   DVPortRow port = RequireDVPort("IsInUse", param_);
   Store& store = Store::Host();
   return store.Read([&] {

@@ -2,7 +2,10 @@
 //
 // A port group keeps only the policy fields it overrides; the policy in
 // force is computed on every read as the override merged over the switch's
-// policy in force, so it follows later changes of the switch.
+// policy in force, so it follows later changes of the switch. The configured
+// policy handed out carries the override's set mask, and in the fields it
+// does not set the values in force, so that an edit starts from what the
+// port group has now.
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
@@ -70,6 +73,14 @@ ShapingPolicy ConfiguredShaping(Store& store, int64_t id) {
       PolicyText(store, id, "SELECT shaping FROM portgroup_policy WHERE portgroup_id = ?"));
 }
 
+/// \p configured with the fields it does not set holding \p parent's values;
+/// the set mask stays the port group's own.
+template <typename Policy> Policy WithParentValues(const Policy& configured, const Policy& parent) {
+  Policy filled = configured.MergedOver(parent);
+  filled.SetSetMask(configured.GetSetMask());
+  return filled;
+}
+
 void StorePolicy(Store& store, int64_t id, const char* column, const std::string& text) {
   store
       .Prepare("INSERT INTO portgroup_policy(portgroup_id) VALUES(?) "
@@ -93,6 +104,7 @@ void StorePolicy(Store& store, int64_t id, const char* column, const std::string
 } // namespace
 
 PortGroupImpl::PortGroupImpl(std::string name) : name_(std::move(name)) {}
+PortGroupImpl::PortGroupImpl(PortGroupData data) : name_(data.name), listed_(std::move(data)) {}
 PortGroupImpl::~PortGroupImpl() = default;
 
 // --- Connection point.
@@ -100,6 +112,8 @@ PortGroupImpl::~PortGroupImpl() = default;
 std::string PortGroupImpl::GetPortsetName() const {
   Store& store = Store::Host();
   store.CheckFault("GetPortsetName", name_);
+  if (listed_)
+    return listed_->portsetName;
   auto group = store.Read([&] { return FindGroup(store, name_); });
   return group ? group->portsetName : std::string();
 }
@@ -134,6 +148,8 @@ std::string PortGroupImpl::GetName() const {
 uint32_t PortGroupImpl::GetActiveClients() const {
   Store& store = Store::Host();
   store.CheckFault("GetActiveClients", name_);
+  if (listed_)
+    return listed_->activeClients;
   return store.Read([&] {
     GroupRow group = RequireGroup(store, name_);
     Statement row = store.Prepare("SELECT count(*) FROM port WHERE portgroup_id = ? AND "
@@ -147,6 +163,8 @@ uint32_t PortGroupImpl::GetActiveClients() const {
 uint16_t PortGroupImpl::GetVlanId() const {
   Store& store = Store::Host();
   store.CheckFault("GetVlanId", name_);
+  if (listed_)
+    return listed_->vlanId;
   return store.Read([&] { return RequireGroup(store, name_).vlanId; });
 }
 
@@ -163,6 +181,8 @@ void PortGroupImpl::SetVlanId(uint16_t vlanId) {
         .BindAll(static_cast<int>(vlanId), group.id)
         .Run();
   });
+  if (listed_)
+    listed_->vlanId = vlanId;
 }
 
 std::unique_ptr<VirtualSwitch> PortGroupImpl::GetVirtualSwitch() const {
@@ -185,7 +205,11 @@ NicTeamingPolicy PortGroupImpl::GetNicTeamingPolicy() const {
 NicTeamingPolicy PortGroupImpl::GetConfiguredNicTeamingPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredNicTeamingPolicy", name_);
-  return store.Read([&] { return ConfiguredTeaming(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredTeaming(store, group.id),
+                            SwitchTeaming(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetNicTeamingPolicy(const NicTeamingPolicy& policy) {
@@ -228,7 +252,11 @@ PortSecurityPolicy PortGroupImpl::GetPortSecurityPolicy() const {
 PortSecurityPolicy PortGroupImpl::GetConfiguredPortSecurityPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredPortSecurityPolicy", name_);
-  return store.Read([&] { return ConfiguredSecurity(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredSecurity(store, group.id),
+                            SwitchSecurity(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetPortSecurityPolicy(const PortSecurityPolicy& policy) {
@@ -252,7 +280,11 @@ ShapingPolicy PortGroupImpl::GetTrafficShapingPolicy() const {
 ShapingPolicy PortGroupImpl::GetConfiguredTrafficShapingPolicy() const {
   Store& store = Store::Host();
   store.CheckFault("GetConfiguredTrafficShapingPolicy", name_);
-  return store.Read([&] { return ConfiguredShaping(store, RequireGroup(store, name_).id); });
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name_);
+    return WithParentValues(ConfiguredShaping(store, group.id),
+                            SwitchShaping(store, group.portsetId));
+  });
 }
 
 void PortGroupImpl::SetTrafficShapingPolicy(const ShapingPolicy& policy) {

@@ -315,11 +315,15 @@ std::vector<std::unique_ptr<PortGroup>> NetworkInfoImpl::GetAllPortGroups(Portse
   store.CheckFault("GetAllPortGroups", "*");
   std::vector<std::unique_ptr<PortGroup>> groups;
   store.Read([&] {
-    Statement rows = store.Prepare("SELECT g.name FROM portgroup g JOIN portset p ON p.id = "
-                                   "g.portset_id WHERE g.system = ? ORDER BY p.ord, g.ord");
+    Statement rows = store.Prepare(
+        "SELECT g.name, p.name, g.vlan_id, (SELECT count(*) FROM port WHERE portgroup_id = g.id "
+        "AND client_kind IN ('tvknic', 'vm')) FROM portgroup g JOIN portset p ON p.id = "
+        "g.portset_id WHERE g.system = ? ORDER BY p.ord, g.ord");
     rows.Bind(1, type == PortsetGetSystem ? 1 : 0);
     while (rows.Step())
-      groups.push_back(std::make_unique<PortGroupImpl>(rows.Text(0)));
+      groups.push_back(std::make_unique<PortGroupImpl>(
+          PortGroupData{rows.Text(0), rows.Text(1), static_cast<uint16_t>(rows.Int(2)),
+                        static_cast<uint32_t>(rows.Int(3))}));
   });
   return groups;
 }

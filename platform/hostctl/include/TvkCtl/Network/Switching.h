@@ -13,6 +13,7 @@
 #include <cstdint>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -116,11 +117,22 @@ public:
   void SetLacpTimeout(uint32_t lagId, bool shortTimeout, const std::string& nicName) override;
 };
 
+/// What a listing of port groups reads of each at once.
+struct PortGroupData {
+  std::string name;           ///< Port group name.
+  std::string portsetName;    ///< Its switch.
+  uint16_t vlanId = 0;        ///< VLAN ID.
+  uint32_t activeClients = 0; ///< Kernel interfaces and VM ports on it.
+};
+
 /// A port group, by name. It is valid while the host has a port group of that
 /// name; operations on one it does not have throw HostCtlException.
 class PortGroupImpl : public virtual HostCtl::Network::PortGroup {
 public:
   explicit PortGroupImpl(std::string name);
+  /// A port group as a listing read it; its switch, VLAN ID and client count
+  /// are answered from \p data until SetVlanId.
+  explicit PortGroupImpl(PortGroupData data);
   ~PortGroupImpl() override;
 
   // --- Connection point.
@@ -148,7 +160,15 @@ public:
   void SetTrafficShapingPolicy(const HostCtl::Network::ShapingPolicy& policy) override;
 
 private:
-  std::string name_; ///< Port group name.
+  std::string name_;                    ///< Port group name.
+  std::optional<PortGroupData> listed_; ///< Values read by a listing.
+};
+
+/// What a listing of distributed ports reads of each at once.
+struct DVPortData {
+  std::string name;                 ///< Port name.
+  std::string portgroupKey;         ///< Distributed port group key.
+  std::vector<std::string> clients; ///< Clients using the port.
 };
 
 /// A distributed port, by switch UUID and port key.
@@ -156,6 +176,9 @@ class DVPortImpl : public virtual HostCtl::Network::DVPort {
 public:
   explicit DVPortImpl(HostCtl::Network::DVPortParam param);
   DVPortImpl(std::string switchId, std::string dvPortId);
+  /// A port as a listing read it; name, port group and clients are answered
+  /// from \p data.
+  DVPortImpl(HostCtl::Network::DVPortParam param, DVPortData data);
   ~DVPortImpl() override;
 
   // --- Connection point.
@@ -178,6 +201,7 @@ public:
 
 private:
   HostCtl::Network::DVPortParam param_; ///< Switch UUID, port key, connection.
+  std::optional<DVPortData> listed_;    ///< Values read by a listing.
 };
 
 /// What the host keeps of a virtual port.

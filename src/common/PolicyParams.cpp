@@ -1,0 +1,438 @@
+//===- PolicyParams.cpp - Teaming, security and shaping parameters --------===//
+#include "common/PolicyParams.h"
+
+#include "TvkCtl/Network/PnicImpl.h"
+
+#include <boost/regex.hpp>
+
+#include <algorithm>
+#include <limits>
+
+namespace CorvexCli::NetworkNamespace {
+
+using Fabrik::CallSpec::InputSpec;
+using Fabrik::CallSpec::ParameterConstraint;
+using Fabrik::CallSpec::ParameterSpec;
+using HostCtl::Network::LinkCriteriaSelectionPolicy;
+using HostCtl::Network::NicTeamingPolicy;
+using HostCtl::Network::PortSecurityPolicy;
+using HostCtl::Network::ShapingPolicy;
+
+const std::string kParamLoadBalancing = "load-balancing";
+const std::string kParamFailureDetection = "failure-detection";
+const std::string kParamNotifySwitches = "notify-switches";
+const std::string kParamFailback = "failback";
+const std::string kParamActiveUplinks = "active-uplinks";
+const std::string kParamStandbyUplinks = "standby-uplinks";
+const std::string kParamAllowPromiscuous = "allow-promiscuous";
+const std::string kParamAllowMacChange = "allow-mac-change";
+const std::string kParamAllowForgedTransmits = "allow-forged-transmits";
+const std::string kParamEnabled = "enabled";
+const std::string kParamAvgBandwidth = "avg-bandwidth";
+const std::string kParamPeakBandwidth = "peak-bandwidth";
+const std::string kParamBurstSize = "burst-size";
+
+const std::string kFieldLoadBalancing = "Load Balancing";
+const std::string kFieldFailureDetection = "Network Failure Detection";
+const std::string kFieldNotifySwitches = "Notify Switches";
+const std::string kFieldFailback = "Failback";
+const std::string kFieldActiveAdapters = "Active Adapters";
+const std::string kFieldStandbyAdapters = "Standby Adapters";
+const std::string kFieldUnusedAdapters = "Unused Adapters";
+const std::string kFieldAllowPromiscuous = "Allow Promiscuous";
+const std::string kFieldAllowMacChange = "Allow MAC Address Change";
+const std::string kFieldAllowForgedTransmits = "Allow Forged Transmits";
+const std::string kFieldEnabled = "Enabled";
+const std::string kFieldAverageBandwidth = "Average Bandwidth";
+const std::string kFieldPeakBandwidth = "Peak Bandwidth";
+const std::string kFieldBurstSize = "Burst Size";
+
+namespace {
+
+/// One value of a string enumeration with its description.
+struct EnumChoice {
+  const char* value;       ///< Accepted value.
+  const char* description; ///< Its description.
+};
+
+/// One parameter of a policy family.
+struct PolicyParam {
+  const std::string& name;              ///< Long name.
+  const char* shortName;                ///< Short name.
+  Fabrik::CallSpec::ParameterType type; ///< Value type.
+  const char* description;              ///< Description.
+  std::vector<EnumChoice> choices;      ///< String enumeration, if any.
+};
+
+const std::vector<PolicyParam> kFailoverParams = {
+    {kParamLoadBalancing,
+     "l",
+     Fabrik::CallSpec::String,
+     "Set the load balancing policy for this policy. This can be one of the following options: "
+     "%FULLENUM%",
+     {{"portid", "Route based on the originating virtual port ID."},
+      {"iphash", "Route based on hashing the src and destination IP addresses"},
+      {"mac", "Route based on the MAC address of the packet source."},
+      {"explicit", "Always use the highest order uplink from the list of active adapters which "
+                   "pass failover criteria."}}},
+    {kParamFailureDetection,
+     "f",
+     Fabrik::CallSpec::String,
+     "Set the method of determining how a network outage is detected. %FULLENUM%",
+     {{"link", "Detect failures based on the NIC link state"},
+      {"beacon", "Detect failures based on active beaconing to the vswitch"}}},
+    {kParamNotifySwitches,
+     "n",
+     Fabrik::CallSpec::Boolean,
+     "Indicate whether to send a notification to physical switches on failover",
+     {}},
+    {kParamFailback,
+     "b",
+     Fabrik::CallSpec::Boolean,
+     "Configure whether a NIC will be used immediately when it comes back in service after a "
+     "failover",
+     {}},
+    {kParamActiveUplinks,
+     "a",
+     Fabrik::CallSpec::String,
+     "Configure the list of active adapters and their failover order. This list must be a comma "
+     "seperated list of values with the uplink name and no spaces. Example:  "
+     "--active-uplinks=vmnic0,vmnic3,vmnic7,vmnic1",
+     {}},
+    {kParamStandbyUplinks,
+     "s",
+     Fabrik::CallSpec::String,
+     "Configure the list of standby adapters and their failover order. This list must be a comma "
+     "seperated list of values with the uplink name and no spaces. Example:  "
+     "--standby-uplinks=vmnic2,vmnic4,vmnic8,vmnic6,vmnic11",
+     {}},
+};
+
+const std::vector<PolicyParam> kSecurityParams = {
+    {kParamAllowPromiscuous,
+     "o",
+     Fabrik::CallSpec::Boolean,
+     "Allow ports on the virtual switch to enter promiscuous mode.",
+     {}},
+    {kParamAllowMacChange,
+     "m",
+     Fabrik::CallSpec::Boolean,
+     "Allow ports on the virtual switch to change their MAC address.",
+     {}},
+    {kParamAllowForgedTransmits,
+     "f",
+     Fabrik::CallSpec::Boolean,
+     "Allow ports on the virtual switch to send packets with forged source information.",
+     {}},
+};
+
+/// The three shaping rates: parameter, short name, description.
+struct RateParam {
+  const std::string& name; ///< Long name.
+  const char* shortName;   ///< Short name.
+  const char* description; ///< Description.
+};
+const RateParam kRateParams[] = {
+    {kParamAvgBandwidth, "b",
+     "The averge bandwidth allowed for this shaping policy. This value is in Kbps (1 Kbps = 1000 "
+     "bits/s)"},
+    {kParamPeakBandwidth, "k",
+     "The peak bandwidth allowed for this shaping policy. This value is in Kbps (1 Kbps = 1000 "
+     "bits/s)"},
+    {kParamBurstSize, "t",
+     "The largest burst size allowed for this shaping policy. This value is in Kib (1 Kib = 1024 "
+     "bits)"},
+};
+
+void AddParams(const std::shared_ptr<InputSpec>& spec, const std::vector<PolicyParam>& params) {
+  for (const PolicyParam& param : params) {
+    auto parameter = ParameterSpec::New(param.name, param.type);
+    parameter->SetShortName(param.shortName);
+    parameter->SetDescription(param.description);
+    parameter->SetRequired(false);
+    if (!param.choices.empty()) {
+      auto constraint = ParameterConstraint::New(Fabrik::CallSpec::StringEnum);
+      for (const EnumChoice& choice : param.choices)
+        constraint->AddStringEnum(choice.value, choice.description);
+      parameter->SetConstraint(constraint);
+    }
+    spec->AddParameter(parameter);
+  }
+}
+
+/// Load-balancing parameter values and the team policy type each selects.
+struct TeamChoice {
+  const char* value;                     ///< Parameter value.
+  NicTeamingPolicy::TeamPolicyType type; ///< Type set.
+};
+const TeamChoice kTeamChoices[] = {
+    {"portid", NicTeamingPolicy::TEAM_SRC_PORT},
+    {"iphash", NicTeamingPolicy::TEAM_IP_HASH},
+    {"mac", NicTeamingPolicy::TEAM_SRC_MAC},
+    {"explicit", NicTeamingPolicy::TEAM_EXPLICIT},
+};
+
+/// Names shown by the get commands, by team policy type.
+struct TeamShown {
+  NicTeamingPolicy::TeamPolicyType type; ///< Type.
+  const char* shown;                     ///< Shown name.
+};
+const TeamShown kTeamShown[] = {
+    {NicTeamingPolicy::TEAM_IP_HASH, "iphash"},
+    {NicTeamingPolicy::TEAM_SRC_MAC, "srcmac"},
+    {NicTeamingPolicy::TEAM_SRC_PORT, "srcport"},
+    {NicTeamingPolicy::TEAM_EXPLICIT, "explicit"},
+};
+
+bool Contains(const std::vector<std::string>& list, const std::string& name) {
+  return std::find(list.begin(), list.end(), name) != list.end();
+}
+
+/// Checks each uplink name and appends the good ones to \p order.
+void AppendUplinks(const std::string& text, const char* unknownMessage,
+                   const std::vector<std::string>& connected, std::vector<std::string>& order,
+                   const std::shared_ptr<Fabrik::CallSpec::Output>& output) {
+  for (const std::string& name : SplitUplinks(text)) {
+    if (!TvkCtl::Network::PnicImpl::IsValidPnic(name))
+      output->AddErrorMessage(unknownMessage + name);
+    else if (!Contains(connected, name))
+      output->AddErrorMessage("NIC is not connected to the vswitch : " + name);
+    else
+      order.push_back(name);
+  }
+}
+
+/// Reads rate \p name in Kbps (or Kib) and scales it to bps (or bytes); false
+/// with an error added when the result would not fit the policy's 64 bits.
+bool ScaledRate(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                const std::shared_ptr<Fabrik::CallSpec::Output>& output, const std::string& name,
+                long factor, uint64_t& scaled) {
+  long value = input->GetParameterInt(name);
+  if (value < 1 || value > std::numeric_limits<int64_t>::max() / factor) {
+    output->AddErrorMessage("The value of --" + name + " is out of range (1 - " +
+                            std::to_string(std::numeric_limits<int64_t>::max() / factor) + ")");
+    return false;
+  }
+  scaled = static_cast<uint64_t>(value) * static_cast<uint64_t>(factor);
+  return true;
+}
+
+} // namespace
+
+void AddParameterTable(const std::shared_ptr<InputSpec>& spec,
+                       const std::vector<ParameterDef>& table) {
+  for (const ParameterDef& def : table) {
+    auto parameter = ParameterSpec::New(def.name, def.type);
+    parameter->SetShortName(def.shortName);
+    parameter->SetDescription(def.description);
+    parameter->SetRequired(def.required);
+    spec->AddParameter(parameter);
+  }
+}
+
+void AddFailoverParameters(const std::shared_ptr<InputSpec>& spec) {
+  AddParams(spec, kFailoverParams);
+}
+
+void AddSecurityParameters(const std::shared_ptr<InputSpec>& spec) {
+  AddParams(spec, kSecurityParams);
+}
+
+void AddShapingParameters(const std::shared_ptr<InputSpec>& spec) {
+  auto enabled = ParameterSpec::New(kParamEnabled, Fabrik::CallSpec::Boolean);
+  enabled->SetShortName("e");
+  enabled->SetDescription("Indicate whether to enable traffic shaping on this policy. If this is "
+                          "true then the --avg-bandwidth, --peak-bandwidth and --burst-size "
+                          "options are required.");
+  enabled->SetRequired(false);
+  spec->AddParameter(enabled);
+  auto range = ParameterConstraint::New(Fabrik::CallSpec::IntRange);
+  range->SetIntRange(1, std::numeric_limits<long>::max());
+  for (const RateParam& rate : kRateParams) {
+    auto parameter = ParameterSpec::New(rate.name, Fabrik::CallSpec::Integer);
+    parameter->SetShortName(rate.shortName);
+    parameter->SetDescription(rate.description);
+    parameter->SetRequired(false);
+    parameter->SetConstraint(range);
+    spec->AddParameter(parameter);
+  }
+}
+
+std::vector<std::string> SplitUplinks(const std::string& text) {
+  static const boost::regex separator(",", boost::regex::perl);
+  std::vector<std::string> names;
+  boost::sregex_token_iterator it(text.begin(), text.end(), separator, -1);
+  for (boost::sregex_token_iterator end; it != end; ++it)
+    names.push_back(it->str());
+  return names;
+}
+
+void SetSecurityPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                       const std::shared_ptr<Fabrik::CallSpec::Output>& /*output*/,
+                       PortSecurityPolicy& policy) {
+  if (input->HasParameter(kParamAllowPromiscuous))
+    policy.SetAllowPromiscuous(input->GetParameterBool(kParamAllowPromiscuous));
+  if (input->HasParameter(kParamAllowMacChange))
+    policy.SetAllowMacAddressChange(input->GetParameterBool(kParamAllowMacChange));
+  if (input->HasParameter(kParamAllowForgedTransmits))
+    policy.SetAllowForgedTransmits(input->GetParameterBool(kParamAllowForgedTransmits));
+}
+
+void SetShapingPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                      const std::shared_ptr<Fabrik::CallSpec::Output>& output,
+                      ShapingPolicy& policy, bool requireAll) {
+  bool enabledNow = false;
+  if (input->HasParameter(kParamEnabled)) {
+    enabledNow = input->GetParameterBool(kParamEnabled);
+    policy.SetEnabled(enabledNow);
+  }
+  if (!policy.IsEnabled())
+    return;
+  bool required = enabledNow || requireAll;
+  uint64_t value = 0;
+  if (input->HasParameter(kParamAvgBandwidth)) {
+    if (ScaledRate(input, output, kParamAvgBandwidth, 1000, value))
+      policy.SetAverageBps(value);
+  } else if (required) {
+    output->AddErrorMessage("Missing required parameter --avg-bandwidth");
+  }
+  if (input->HasParameter(kParamPeakBandwidth)) {
+    if (ScaledRate(input, output, kParamPeakBandwidth, 1000, value))
+      policy.SetPeakBps(value);
+  } else if (required) {
+    output->AddErrorMessage("Missing required parameter --peak-bandwidth");
+  }
+  if (input->HasParameter(kParamBurstSize)) {
+    if (ScaledRate(input, output, kParamBurstSize, 128, value))
+      policy.SetBurstSize(value);
+  } else if (required) {
+    output->AddErrorMessage("Missing required parameter --burst-size");
+  }
+}
+
+void SetFailoverPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                       const std::shared_ptr<Fabrik::CallSpec::Output>& output,
+                       NicTeamingPolicy& policy, const NicTeamingPolicy& current,
+                       const std::vector<std::string>& connectedUplinks) {
+  if (input->HasParameter(kParamLoadBalancing)) {
+    const std::string& value = input->GetParameter(kParamLoadBalancing);
+    const TeamChoice* choice = nullptr;
+    for (const TeamChoice& entry : kTeamChoices)
+      if (value == entry.value)
+        choice = &entry;
+    if (choice)
+      policy.SetTeamingPolicy(choice->type);
+    else
+      output->AddErrorMessage("Unknown Load Balancing policy: " + value);
+  }
+  if (input->HasParameter(kParamFailureDetection)) {
+    const std::string& value = input->GetParameter(kParamFailureDetection);
+    LinkCriteriaSelectionPolicy criteria;
+    if (value == "link")
+      criteria.SetBeacon(true);
+    else if (value == "beacon")
+      criteria.SetBeacon(false);
+    else
+      output->AddErrorMessage("Unknown failure detection type " + value);
+    policy.SetLinkCriteria(criteria);
+  }
+  if (input->HasParameter(kParamNotifySwitches))
+    policy.SetNotifySwitchOnFailure(input->GetParameterBool(kParamNotifySwitches));
+  if (input->HasParameter(kParamFailback))
+    policy.SetRollingRestoration(!input->GetParameterBool(kParamFailback));
+
+  bool hasActive = input->HasParameter(kParamActiveUplinks);
+  bool hasStandby = input->HasParameter(kParamStandbyUplinks);
+  if (!hasActive && !hasStandby)
+    return;
+
+  std::vector<std::string> order;
+  if (hasActive) {
+    AppendUplinks(input->GetParameter(kParamActiveUplinks),
+                  "Unknown NIC name in active uplinks : ", connectedUplinks, order, output);
+    auto activeCount = static_cast<int32_t>(order.size());
+    if (!hasStandby) {
+      // The present standby uplinks stay standby.
+      std::vector<std::string> previous = current.GetUplinkOrder();
+      std::size_t m = static_cast<std::size_t>(std::max(0, current.GetMaxActiveUplinks()));
+      if (m < previous.size()) {
+        for (std::size_t i = m; i < previous.size();) {
+          if (Contains(order, previous[i]))
+            previous.erase(previous.begin() + static_cast<std::ptrdiff_t>(i));
+          else
+            ++i;
+        }
+        order.insert(order.end(), previous.begin() + static_cast<std::ptrdiff_t>(m),
+                     previous.end());
+      }
+    }
+    policy.SetMaxActiveUplinks(activeCount);
+  }
+  if (hasStandby) {
+    AppendUplinks(input->GetParameter(kParamStandbyUplinks),
+                  "Unknown NIC name in standby uplinks : ", connectedUplinks, order, output);
+    if (!hasActive) {
+      // The present active uplinks stay active.
+      std::vector<std::string> previous = current.GetUplinkOrder();
+      int32_t m = std::max(0, current.GetMaxActiveUplinks());
+      for (std::size_t i = 0; static_cast<int32_t>(i) < m && i < previous.size();) {
+        if (Contains(order, previous[i])) {
+          previous.erase(previous.begin() + static_cast<std::ptrdiff_t>(i));
+          --m;
+        } else {
+          ++i;
+        }
+      }
+      policy.SetMaxActiveUplinks(m);
+      std::size_t keep = std::min(static_cast<std::size_t>(m), previous.size());
+      std::vector<std::string> merged(previous.begin(),
+                                      previous.begin() + static_cast<std::ptrdiff_t>(keep));
+      merged.insert(merged.end(), order.begin(), order.end());
+      order = std::move(merged);
+    }
+  }
+  std::vector<std::string> sorted = order;
+  std::sort(sorted.begin(), sorted.end());
+  if (std::adjacent_find(sorted.begin(), sorted.end()) != sorted.end()) {
+    output->AddErrorMessage("some NICs appear in the input for more than once.");
+    return;
+  }
+  policy.SetUplinkOrder(order);
+}
+
+FailoverValues DescribeFailover(const NicTeamingPolicy& policy,
+                                const std::vector<std::string>& uplinks) {
+  FailoverValues values;
+  values.loadBalancing = "unknown";
+  for (const TeamShown& entry : kTeamShown)
+    if (policy.GetTeamingPolicy() == entry.type)
+      values.loadBalancing = entry.shown;
+  const LinkCriteriaSelectionPolicy& criteria = policy.GetLinkCriteria();
+  bool beacon = (criteria.GetFlagWord(0) & LinkCriteriaSelectionPolicy::BEACON_BIT) != 0 &&
+                (criteria.GetFlagWord(1) & LinkCriteriaSelectionPolicy::BEACON_BIT) == 0;
+  values.failureDetection = beacon ? "beacon" : "link";
+  values.notifySwitches = policy.GetNotifySwitchOnFailure();
+  values.failback = !policy.GetRollingRestoration();
+  const std::vector<std::string>& order = policy.GetUplinkOrder();
+  std::size_t n =
+      std::min(static_cast<std::size_t>(std::max(0, policy.GetMaxActiveUplinks())), order.size());
+  values.active.assign(order.begin(), order.begin() + static_cast<std::ptrdiff_t>(n));
+  values.standby.assign(order.begin() + static_cast<std::ptrdiff_t>(n), order.end());
+  for (const std::string& uplink : uplinks)
+    if (!Contains(order, uplink))
+      values.unused.push_back(uplink);
+  return values;
+}
+
+ShapingValues DescribeShaping(const ShapingPolicy& policy) {
+  ShapingValues values;
+  values.enabled = policy.IsEnabled();
+  if (values.enabled) {
+    values.average = static_cast<long>(policy.GetAverageBps() / 1000);
+    values.peak = static_cast<long>(policy.GetPeakBps() / 1000);
+    values.burst = static_cast<long>(policy.GetBurstSize() / 128);
+  }
+  return values;
+}
+
+} // namespace CorvexCli::NetworkNamespace

@@ -1,0 +1,122 @@
+//===- PolicyParams.h - Teaming, security and shaping parameters ----------===//
+//
+// The policy "set" commands of standard switches and of port groups share one
+// vocabulary of parameters and one way of applying them to a policy value.
+// The Add*Parameters functions declare the parameters; the Set*Policy
+// functions copy the given ones into a policy value, adding an error message
+// to the output for every problem and never stopping early, so that the
+// caller stores the policy only when the output holds no error. The get
+// commands share the conversions of policies into result values.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "Fabrik/CallSpec.h"
+#include "HostCtl/Network/Policy.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace CorvexCli::NetworkNamespace {
+
+// --- Parameter names.
+extern const std::string kParamLoadBalancing;
+extern const std::string kParamFailureDetection;
+extern const std::string kParamNotifySwitches;
+extern const std::string kParamFailback;
+extern const std::string kParamActiveUplinks;
+extern const std::string kParamStandbyUplinks;
+extern const std::string kParamAllowPromiscuous;
+extern const std::string kParamAllowMacChange;
+extern const std::string kParamAllowForgedTransmits;
+extern const std::string kParamEnabled;
+extern const std::string kParamAvgBandwidth;
+extern const std::string kParamPeakBandwidth;
+extern const std::string kParamBurstSize;
+
+// --- Field names of the policy results.
+extern const std::string kFieldLoadBalancing;
+extern const std::string kFieldFailureDetection;
+extern const std::string kFieldNotifySwitches;
+extern const std::string kFieldFailback;
+extern const std::string kFieldActiveAdapters;
+extern const std::string kFieldStandbyAdapters;
+extern const std::string kFieldUnusedAdapters;
+extern const std::string kFieldAllowPromiscuous;
+extern const std::string kFieldAllowMacChange;
+extern const std::string kFieldAllowForgedTransmits;
+extern const std::string kFieldEnabled;
+extern const std::string kFieldAverageBandwidth;
+extern const std::string kFieldPeakBandwidth;
+extern const std::string kFieldBurstSize;
+
+/// One parameter of a command, as the vswitch families declare them in tables.
+struct ParameterDef {
+  const std::string& name;              ///< Long name.
+  const char* shortName;                ///< Short name.
+  Fabrik::CallSpec::ParameterType type; ///< Value type.
+  bool required;                        ///< Declared required.
+  const char* description;              ///< Description.
+};
+
+/// Appends one parameter per entry of \p table, in order.
+void AddParameterTable(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec,
+                       const std::vector<ParameterDef>& table);
+
+/// Appends load-balancing, failure-detection, notify-switches, failback,
+/// active-uplinks and standby-uplinks.
+void AddFailoverParameters(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec);
+/// Appends allow-promiscuous, allow-mac-change and allow-forged-transmits.
+void AddSecurityParameters(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec);
+/// Appends enabled, avg-bandwidth, peak-bandwidth and burst-size.
+void AddShapingParameters(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec);
+
+/// Edits \p policy from the failover parameters; \p current is the policy in
+/// force (its uplink order and active count), \p connectedUplinks the uplinks
+/// of the switch concerned.
+void SetFailoverPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                       const std::shared_ptr<Fabrik::CallSpec::Output>& output,
+                       HostCtl::Network::NicTeamingPolicy& policy,
+                       const HostCtl::Network::NicTeamingPolicy& current,
+                       const std::vector<std::string>& connectedUplinks);
+/// Edits \p policy from the security parameters.
+void SetSecurityPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                       const std::shared_ptr<Fabrik::CallSpec::Output>& output,
+                       HostCtl::Network::PortSecurityPolicy& policy);
+/// Edits \p policy from the shaping parameters; with \p requireAll every rate
+/// must be given while the policy is enabled.
+void SetShapingPolicy(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                      const std::shared_ptr<Fabrik::CallSpec::Output>& output,
+                      HostCtl::Network::ShapingPolicy& policy, bool requireAll);
+
+/// Splits a comma-separated uplink list; every field is kept as it stands,
+/// except that nothing follows a final comma.
+std::vector<std::string> SplitUplinks(const std::string& text);
+
+/// The failover fields a get command shows.
+struct FailoverValues {
+  std::string loadBalancing;        ///< "iphash", "srcmac", "srcport", "explicit", "unknown".
+  std::string failureDetection;     ///< "beacon" or "link".
+  bool notifySwitches = false;      ///< Notify physical switches.
+  bool failback = false;            ///< Not rolling restoration.
+  std::vector<std::string> active;  ///< Active adapters.
+  std::vector<std::string> standby; ///< Standby adapters.
+  std::vector<std::string> unused;  ///< Uplinks outside the order.
+};
+
+/// The failover fields of \p policy on a switch with \p uplinks.
+FailoverValues DescribeFailover(const HostCtl::Network::NicTeamingPolicy& policy,
+                                const std::vector<std::string>& uplinks);
+
+/// Shaping rates as shown: Kbps and Kib, or -1 each when shaping is off.
+struct ShapingValues {
+  bool enabled = false; ///< Shaping is on.
+  long average = -1;    ///< Average bandwidth, Kbps.
+  long peak = -1;       ///< Peak bandwidth, Kbps.
+  long burst = -1;      ///< Burst size, Kib.
+};
+ShapingValues DescribeShaping(const HostCtl::Network::ShapingPolicy& policy);
+
+} // namespace CorvexCli::NetworkNamespace

@@ -1,0 +1,363 @@
+//===- SwitchPolicy.cpp - Failover, security and shaping of a switch ------===//
+//
+// network vswitch standard policy failover | security | shaping get | set.
+//
+//===----------------------------------------------------------------------===//
+#include "vswitch.h"
+
+#include "HostCtl/Lib.h"
+#include "TvkCtl/Network/Switching.h"
+#include "common/PolicyParams.h"
+
+namespace CorvexCli::NetworkNamespace {
+
+using Fabrik::CallSpec::Input;
+using Fabrik::CallSpec::InputSpec;
+using Fabrik::CallSpec::Output;
+using Fabrik::CallSpec::OutputSpec;
+using Fabrik::MetaObj::MetaBool;
+using Fabrik::MetaObj::MetaInt;
+using Fabrik::MetaObj::MetaList;
+using Fabrik::MetaObj::MetaString;
+using Fabrik::MetaObj::MetaStruct;
+using HostCtl::Lib::HostCtlException;
+using namespace HostCtl::Network;
+
+namespace {
+
+const std::string kParamVswitchName = "vswitch-name";
+
+const std::string kStructFailover = "VirtualSwitchFailoverPolicy";
+const std::string kStructSecurity = "VirtualSwitchSecurityPolicy";
+const std::string kStructShaping = "VirtualSwitchTrafficShapingPolicy";
+
+const std::string kNoLegacySwitch = "Unable to find a legacy virtual switch with the name ";
+
+/// Joins field names with ",".
+std::string JoinFields(std::initializer_list<const std::string*> fields) {
+  std::string joined;
+  for (const std::string* field : fields)
+    joined += (joined.empty() ? "" : ",") + *field;
+  return joined;
+}
+
+std::shared_ptr<InputSpec> SwitchNameSpec(const char* description) {
+  auto spec = InputSpec::New();
+  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
+  return spec;
+}
+
+std::shared_ptr<OutputSpec> BoolResult() {
+  auto spec = OutputSpec::New();
+  spec->SetRootObject(MetaBool::New());
+  return spec;
+}
+
+/// The standard switch the command names, or null with the error added.
+std::unique_ptr<VirtualSwitch> FindLegacySwitch(const std::shared_ptr<Input>& input,
+                                                const std::shared_ptr<Output>& output) {
+  const std::string& name = input->GetParameter(kParamVswitchName);
+  TvkCtl::Network::VirtualSwitchInfoImpl info;
+  std::unique_ptr<VirtualSwitch> vswitch;
+  if (TvkCtl::Network::PortsetImpl::IsValidVirtualSwitch(name))
+    vswitch = info.GetVirtualSwitchByName(name, PortsetGetRegular);
+  if (!vswitch)
+    output->AddErrorMessage(kNoLegacySwitch + name);
+  return vswitch;
+}
+
+} // namespace
+
+// network vswitch standard policy shaping get
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyShapingGet)
+
+VirtualSwitchStandardPolicyShapingGet::VirtualSwitchStandardPolicyShapingGet() {
+  SetDescription("Get the shaping policy settings for the given virtual switch");
+  SetDefaultOutputFormatter("simple");
+  SetDefaultOutputParameter("fields:" + kStructShaping,
+                            JoinFields({&kFieldEnabled, &kFieldAverageBandwidth,
+                                        &kFieldPeakBandwidth, &kFieldBurstSize}));
+  SetDefaultOutputParameter("header:" + kStructShaping, "<NONE>");
+  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldAverageBandwidth, "Kbps");
+  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldPeakBandwidth, "Kbps");
+  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldBurstSize, "Kib");
+}
+
+VirtualSwitchStandardPolicyShapingGet::~VirtualSwitchStandardPolicyShapingGet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyShapingGet::GetInputSpecInternal() {
+  return SwitchNameSpec(
+      "The name of the virtual switch to use when fetching the switch shaping policy.");
+}
+
+std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyShapingGet::GetOutputStructure() {
+  auto structure = MetaStruct::New(kStructShaping);
+  structure->SetField(kFieldEnabled, MetaBool::New());
+  structure->SetField(kFieldAverageBandwidth, MetaInt::New());
+  structure->SetField(kFieldPeakBandwidth, MetaInt::New());
+  structure->SetField(kFieldBurstSize, MetaInt::New());
+  return structure;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpecInternal() {
+  auto spec = OutputSpec::New();
+  spec->SetRootObject(GetOutputStructure());
+  return spec;
+}
+
+void VirtualSwitchStandardPolicyShapingGet::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                                            const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    ShapingValues values = DescribeShaping(vswitch->GetTrafficShapingPolicy());
+    auto result = GetOutputStructure();
+    result->SetField(kFieldEnabled, values.enabled);
+    result->SetField(kFieldAverageBandwidth, values.average);
+    result->SetField(kFieldPeakBandwidth, values.peak);
+    result->SetField(kFieldBurstSize, values.burst);
+    output->SetRootObject(result);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network vswitch standard policy shaping set
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyShapingSet)
+
+VirtualSwitchStandardPolicyShapingSet::VirtualSwitchStandardPolicyShapingSet() {
+  SetDescription("Set the shaping policy settings for the given virtual switch");
+}
+
+VirtualSwitchStandardPolicyShapingSet::~VirtualSwitchStandardPolicyShapingSet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyShapingSet::GetInputSpecInternal() {
+  auto spec = SwitchNameSpec(
+      "The name of the virtual switch to use when setting the switch shaping policy.");
+  AddShapingParameters(spec);
+  return spec;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingSet::GetOutputSpecInternal() {
+  return BoolResult();
+}
+
+void VirtualSwitchStandardPolicyShapingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
+                                                            const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    ShapingPolicy policy = vswitch->GetTrafficShapingPolicy();
+    SetShapingPolicy(input, output, policy, false);
+    if (!output->HasError())
+      vswitch->SetTrafficShapingPolicy(policy);
+    output->SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network vswitch standard policy security get
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicySecurityGet)
+
+VirtualSwitchStandardPolicySecurityGet::VirtualSwitchStandardPolicySecurityGet() {
+  SetDescription("Get the Security Policy governing the given virtual switch.");
+  SetDefaultOutputFormatter("simple");
+  SetDefaultOutputParameter(
+      "fields:" + kStructSecurity,
+      JoinFields({&kFieldAllowPromiscuous, &kFieldAllowMacChange, &kFieldAllowForgedTransmits}));
+  SetDefaultOutputParameter("header:" + kStructSecurity, "<NONE>");
+}
+
+VirtualSwitchStandardPolicySecurityGet::~VirtualSwitchStandardPolicySecurityGet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecurityGet::GetInputSpecInternal() {
+  return SwitchNameSpec(
+      "The name of the virtual switch to use when fetching the network security policy.");
+}
+
+std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicySecurityGet::GetOutputStructure() {
+  auto structure = MetaStruct::New(kStructSecurity);
+  structure->SetField(kFieldAllowPromiscuous, MetaBool::New());
+  structure->SetField(kFieldAllowMacChange, MetaBool::New());
+  structure->SetField(kFieldAllowForgedTransmits, MetaBool::New());
+  return structure;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpecInternal() {
+  auto spec = OutputSpec::New();
+  spec->SetRootObject(GetOutputStructure());
+  return spec;
+}
+
+void VirtualSwitchStandardPolicySecurityGet::ExecuteInternal(
+    const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
+    auto result = GetOutputStructure();
+    result->SetField(kFieldAllowPromiscuous, policy.GetAllowPromiscuous());
+    result->SetField(kFieldAllowMacChange, policy.GetAllowMacAddressChange());
+    result->SetField(kFieldAllowForgedTransmits, policy.GetAllowForgedTransmits());
+    output->SetRootObject(result);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network vswitch standard policy security set
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicySecuritySet)
+
+VirtualSwitchStandardPolicySecuritySet::VirtualSwitchStandardPolicySecuritySet() {
+  SetDescription("Set the security policy for a given virtual switch");
+}
+
+VirtualSwitchStandardPolicySecuritySet::~VirtualSwitchStandardPolicySecuritySet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecuritySet::GetInputSpecInternal() {
+  auto spec = SwitchNameSpec(
+      "The name of the virtual switch to use when setting the switch security policy.");
+  AddParameterTable(
+      spec,
+      {{kParamAllowPromiscuous, "p", Fabrik::CallSpec::Boolean, false,
+        "Allow ports on the virtual switch to enter promiscuous mode."},
+       {kParamAllowMacChange, "m", Fabrik::CallSpec::Boolean, false,
+        "Allow ports on the virtual switch to change their MAC address."},
+       {kParamAllowForgedTransmits, "f", Fabrik::CallSpec::Boolean, false,
+        "Allow ports on the virtual switch to send packets with forged source information."}});
+  return spec;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecuritySet::GetOutputSpecInternal() {
+  return BoolResult();
+}
+
+void VirtualSwitchStandardPolicySecuritySet::ExecuteInternal(
+    const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
+    if (input->HasParameter(kParamAllowPromiscuous))
+      policy.SetAllowPromiscuous(input->GetParameterBool(kParamAllowPromiscuous));
+    if (input->HasParameter(kParamAllowMacChange))
+      policy.SetAllowMacAddressChange(input->GetParameterBool(kParamAllowMacChange));
+    if (input->HasParameter(kParamAllowForgedTransmits))
+      policy.SetAllowForgedTransmits(input->GetParameterBool(kParamAllowForgedTransmits));
+    vswitch->SetPortSecurityPolicy(policy);
+    output->SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network vswitch standard policy failover get
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyFailoverGet)
+
+VirtualSwitchStandardPolicyFailoverGet::VirtualSwitchStandardPolicyFailoverGet() {
+  SetDescription("Get the failover policy settings governing the given virtual switch");
+  SetDefaultOutputFormatter("simple");
+  SetDefaultOutputParameter(
+      "fields:" + kStructFailover,
+      JoinFields({&kFieldLoadBalancing, &kFieldFailureDetection, &kFieldNotifySwitches,
+                  &kFieldFailback, &kFieldActiveAdapters, &kFieldStandbyAdapters,
+                  &kFieldUnusedAdapters}));
+  SetDefaultOutputParameter("header:" + kStructFailover, "<NONE>");
+}
+
+VirtualSwitchStandardPolicyFailoverGet::~VirtualSwitchStandardPolicyFailoverGet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyFailoverGet::GetInputSpecInternal() {
+  return SwitchNameSpec(
+      "The name of the virtual switch to use when fetching the switch failover policy.");
+}
+
+std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyFailoverGet::GetOutputStructure() {
+  auto structure = MetaStruct::New(kStructFailover);
+  structure->SetField(kFieldLoadBalancing, MetaString::New());
+  structure->SetField(kFieldFailureDetection, MetaString::New());
+  structure->SetField(kFieldNotifySwitches, MetaBool::New());
+  structure->SetField(kFieldFailback, MetaBool::New());
+  structure->SetField(kFieldActiveAdapters, MetaList::New(Fabrik::MetaObj::String));
+  structure->SetField(kFieldStandbyAdapters, MetaList::New(Fabrik::MetaObj::String));
+  structure->SetField(kFieldUnusedAdapters, MetaList::New(Fabrik::MetaObj::String));
+  return structure;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpecInternal() {
+  auto spec = OutputSpec::New();
+  spec->SetRootObject(GetOutputStructure());
+  return spec;
+}
+
+void VirtualSwitchStandardPolicyFailoverGet::ExecuteInternal(
+    const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    FailoverValues values = DescribeFailover(vswitch->GetNicTeamingPolicy(), vswitch->GetUplinks());
+    auto result = GetOutputStructure();
+    result->SetField(kFieldLoadBalancing, values.loadBalancing);
+    result->SetField(kFieldFailureDetection, values.failureDetection);
+    result->SetField(kFieldNotifySwitches, values.notifySwitches);
+    result->SetField(kFieldFailback, values.failback);
+    result->SetField(kFieldActiveAdapters, values.active);
+    result->SetField(kFieldStandbyAdapters, values.standby);
+    result->SetField(kFieldUnusedAdapters, values.unused);
+    output->SetRootObject(result);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+// network vswitch standard policy failover set
+
+CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyFailoverSet)
+
+VirtualSwitchStandardPolicyFailoverSet::VirtualSwitchStandardPolicyFailoverSet() {
+  SetDescription("Configure the Failover policy for a virtual switch.");
+}
+
+VirtualSwitchStandardPolicyFailoverSet::~VirtualSwitchStandardPolicyFailoverSet() = default;
+
+std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyFailoverSet::GetInputSpecInternal() {
+  auto spec = SwitchNameSpec(
+      "The name of the virtual switch to use when configuring the switch failover policy.");
+  AddFailoverParameters(spec);
+  return spec;
+}
+
+std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverSet::GetOutputSpecInternal() {
+  return BoolResult();
+}
+
+void VirtualSwitchStandardPolicyFailoverSet::ExecuteInternal(
+    const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
+  try {
+    auto vswitch = FindLegacySwitch(input, output);
+    if (!vswitch)
+      return;
+    NicTeamingPolicy current = vswitch->GetNicTeamingPolicy();
+    NicTeamingPolicy policy = vswitch->GetConfiguredNicTeamingPolicy();
+    std::vector<std::string> uplinks = vswitch->GetUplinks();
+    SetFailoverPolicy(input, output, policy, current, uplinks);
+    if (!output->HasError())
+      vswitch->SetNicTeamingPolicy(policy);
+    output->SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+} // namespace CorvexCli::NetworkNamespace
