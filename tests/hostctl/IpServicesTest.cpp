@@ -14,6 +14,7 @@
 #include "TvkCtl/Resource/ResourceInfoImpl.h"
 #include "model/CoreModel.h"
 #include "model/HostDescription.h"
+#include "model/JsonRead.h"
 #include "model/Store.h"
 
 #include <gtest/gtest.h>
@@ -434,6 +435,113 @@ TEST_F(IpServicesTest, FaultsDeclaredForAnOperationAreThrown) {
                 "routing table unreadable");
   routing.SetNetstackInstanceKey("ops");
   EXPECT_EQ(1u, routing.GetCurrentTarvikRoutes(PortsetGetRegular).size());
+}
+
+/// A host description using every key of the IP services part.
+const char* const kDescription = R"json({
+  "netstacks": [{"key": "defaultTcpipStack"}, {"key": "ops"}],
+  "interfaces": [
+    {"name": "tvk0", "ipv4Type": "static", "ipv4Address": "10.20.0.5", "ipv4Netmask": "255.255.255.0",
+     "ipv6Addresses": [{"address": "2001:db8:20::5", "prefix": 64}]},
+    {"name": "tvk2", "netstack": "ops", "ipv4Type": "static", "ipv4Address": "172.16.0.5",
+     "ipv4Netmask": "255.255.255.0"}
+  ],
+  "routes": [
+    {"netstack": "defaultTcpipStack", "network": "default", "gateway": "10.20.0.1", "interface": "tvk0", "source": "config"},
+    {"netstack": "ops", "network": "10.9.0.0/16", "gateway": "172.16.0.1", "interface": "tvk2", "source": "user"},
+    {"netstack": "defaultTcpipStack", "network": "2001:db8:99::/48", "gateway": "2001:db8:20::1", "interface": "tvk0", "source": "user"}
+  ],
+  "defaultGateways": [{"netstack": "defaultTcpipStack", "ipv4": "10.20.0.1", "ipv6": "2001:db8:20::1"}],
+  "dns": [{"netstack": "ops", "servers": ["172.16.0.53", "2001:db8::53"], "searchDomains": ["ops.example"]}],
+  "hostsEntries": [
+    {"address": "127.0.0.1", "hostname": "localhost", "system": true},
+    {"address": "10.20.0.40", "hostname": "store01", "aliases": ["nas", "s1"], "comment": "storage"}
+  ],
+  "neighbors": [
+    {"interface": "tvk0", "address": "10.20.0.1", "mac": "00:50:56:aa:00:01", "expiry": 60, "type": "Dynamic"},
+    {"interface": "tvk0", "address": "2001:db8:20::1", "mac": "00:50:56:aa:00:01", "expiry": 30, "type": "Router", "state": "Probe"}
+  ],
+  "serviceWorlds": [{"id": 2101, "name": "remote-shell"}],
+  "connections": [
+    {"netstack": "ops", "protocol": "udp", "recvQueue": 1, "sendQueue": 2, "localAddress": "172.16.0.5", "localPort": 53,
+     "foreignAddress": "0.0.0.0", "foreignPort": 0, "worldId": 2101, "state": 0, "ccAlgorithm": ""}
+  ],
+  "ipsecSAs": [
+    {"name": "sa1", "source": "2001:db8:20::5", "destination": "2001:db8:20::9", "spi": 4096, "mode": "tunnel",
+     "encryption": "3des-cbc", "encryptionKey": "abcdefghijklmnopqrstuvwx", "integrity": "hmac-sha1",
+     "integrityKey": "abcdefghijklmnopqrst", "state": "dying", "lifetime": 600}
+  ],
+  "ipsecSPs": [
+    {"name": "sp1", "source": "2001:db8:20::/64", "sourcePort": 0, "destination": "::/0", "destinationPort": 22,
+     "protocol": "tcp", "direction": "in", "action": "ipsec", "mode": "tunnel", "saName": "sa1"},
+    {"name": "sp2", "source": "::/0", "sourcePort": 0, "destination": "::/0", "destinationPort": 0,
+     "protocol": "any", "direction": "out", "action": "none", "mode": "any", "saName": "UNKNOWN"}
+  ]
+})json";
+
+/// The IP services keys of an exported host.
+nlohmann::ordered_json ServiceKeys(const nlohmann::ordered_json& host) {
+  nlohmann::ordered_json keys = nlohmann::ordered_json::object();
+  for (const char* key : {"routes", "defaultGateways", "dns", "hostsEntries", "neighbors",
+                          "serviceWorlds", "connections", "ipsecSAs", "ipsecSPs"})
+    if (host.contains(key))
+      keys[key] = host[key];
+  return keys;
+}
+
+TEST_F(IpServicesTest, ExportThenImportGivesTheSameServices) {
+  Model::Store& store = Model::Store::Host();
+  Model::ImportHost(store, nlohmann::ordered_json::parse(kDescription));
+  nlohmann::ordered_json first = Model::ExportHost(store);
+  EXPECT_EQ(ServiceKeys(nlohmann::ordered_json::parse(kDescription)), ServiceKeys(first));
+  Model::ImportHost(store, first);
+  EXPECT_EQ(ServiceKeys(first), ServiceKeys(Model::ExportHost(store)));
+  std::vector<IpSecSpdParam> sps;
+  IpSecConfigImpl().GetSPDConfigList(sps);
+  ASSERT_EQ(2u, sps.size());
+  EXPECT_EQ("UNKNOWN", sps[1].saName);
+}
+
+TEST_F(IpServicesTest, ImportNamesTheBadFieldAndKeepsTheHost) {
+  struct Case {
+    const char* change; ///< JSON merged into the description.
+    const char* error;  ///< Expected message.
+  };
+  const Case cases[] = {
+      {R"({"routes": [{"network": "10.1.0.0/16", "gateway": "10.99.0.1"}]})",
+       "routes[3].network: The gateway 10.99.0.1 is not reachable through any interface of "
+       "netstack defaultTcpipStack"},
+      {R"({"routes": [{"network": "10.1.0.0/16", "gateway": "10.20.0.1", "source": "bgp"}]})",
+       "routes[3].source: expected one of user, config, dhcp"},
+      {R"({"dns": [{"netstack": "nosuch"}]})",
+       "dns[1].netstack: Netstack instance nosuch does not exist"},
+      {R"({"hostsEntries": [{"address": "10.20.0.40", "hostname": "STORE01"}]})",
+       "hostsEntries[2].address: An entry for 10.20.0.40 STORE01 already exists"},
+      {R"({"neighbors": [{"interface": "tvk0", "address": "10.20.0.2", "mac": "00:50:56:aa:00:02", "state": "Stale"}]})",
+       "neighbors[2].state: only IPv6 neighbours have a state"},
+      {R"({"connections": [{"protocol": "sctp", "localAddress": "::", "foreignAddress": "::"}]})",
+       "connections[1].protocol: expected one of tcp, udp, ip"},
+      {R"({"ipsecSAs": [{"name": "sa2", "source": "2001:db8:20::5", "destination": "2001:db8:20::8", "spi": 4097, "encryption": "aes128-cbc", "encryptionKey": "short", "integrity": "hmac-sha1", "integrityKey": "abcdefghijklmnopqrst"}]})",
+       "ipsecSAs[1].name: The encryption key of aes128-cbc must be 16 ASCII characters or 0x "
+       "followed by 32 hex digits"},
+  };
+  for (const Case& c : cases) {
+    nlohmann::ordered_json host = nlohmann::ordered_json::parse(kDescription);
+    nlohmann::ordered_json change = nlohmann::ordered_json::parse(c.change);
+    for (auto& [key, value] : change.items())
+      for (const auto& element : value)
+        host[key].push_back(element);
+    Model::Store& store = Model::Store::Host();
+    try {
+      Model::ImportHost(store, host);
+      ADD_FAILURE() << "imported: " << c.change;
+    } catch (const Model::ImportError& e) {
+      EXPECT_EQ(std::string(c.error), e.what());
+    }
+    // The host made by the fixture is still there.
+    EXPECT_EQ(
+        2u, RoutingInfoImpl("defaultTcpipStack").GetCurrentTarvikRoutes(PortsetGetRegular).size());
+  }
 }
 
 } // namespace

@@ -60,7 +60,7 @@ bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv6Net
     if (!Ipv6Address::Parse(rows.Text(0), bytes))
       continue;
     int prefix = static_cast<int>(rows.Int(1));
-    const auto& mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
+    const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
     for (int i = 0; i < 16; ++i)
       bytes[i] &= mask[i];
     if (Ipv6Network(Ipv6Address(bytes), prefix) == network)
@@ -239,7 +239,7 @@ void InsertRoute(Store& store, const std::string& netstack, const Ipv6Network& n
                  bool system) {
   RequireNetstack(store, netstack);
   int prefix = network.GetNetmask();
-  const auto& mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
+  const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
   for (int i = 0; i < 16; ++i)
     if ((network.GetAddress().GetBytes()[i] & ~mask[i]) != 0)
       throw HostCtlException("Invalid route network " + network.GetStringAddress() +

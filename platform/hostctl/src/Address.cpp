@@ -375,7 +375,7 @@ std::string Ipv6Network::GetStringAddress() const {
 }
 
 bool Ipv6Network::Contains(const Ipv6Address& address) const {
-  const auto& mask = NetmaskFromNumber(prefixLength_).GetBytes();
+  const auto mask = NetmaskFromNumber(prefixLength_).GetBytes();
   for (int i = 0; i < 16; ++i)
     if ((address.GetBytes()[i] & mask[i]) != (address_.GetBytes()[i] & mask[i]))
       return false;

@@ -242,7 +242,7 @@ std::vector<Ipv6Route> RoutingInfoImpl::GetCurrentIpv6TarvikRoutes(PortsetGetTyp
       if (!Ipv6Address::Parse(nics.Text(1), bytes))
         continue;
       int prefix = static_cast<int>(nics.Int(2));
-      const auto& mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
+      const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
       for (int i = 0; i < 16; ++i)
         bytes[i] &= mask[i];
       routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(0));
