@@ -107,7 +107,6 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
         "SELECT network, prefix, gateway, interface, source FROM ipsvc_route WHERE netstack = ? "
         "AND family = 4 AND system = ? ORDER BY id");
     rows.BindAll(netstack_, system);
-    routes.reserve(routes.size() + 64);
     while (rows.Step()) {
       Ipv4Network network(Ipv4Address(rows.Text(0)),
                           Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));

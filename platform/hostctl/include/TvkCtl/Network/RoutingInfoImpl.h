@@ -8,8 +8,8 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "HostCtl/Network/PortsetGetType.h"
 #include "HostCtl/Network/Routing.h"
-#include "HostCtl/Network/Switching.h"
 
 #include <string>
 #include <unordered_map>
