@@ -13,6 +13,7 @@
 #include "HostCtl/Network/Address.h"
 #include "HostCtl/Network/Lacp.h"
 #include "HostCtl/Network/Policy.h"
+#include "HostCtl/Network/PortsetGetType.h"
 
 #include <cstdint>
 #include <map>
@@ -22,11 +23,6 @@
 
 namespace HostCtl::Network {
 
-/// Object selector of listings: ordinary objects or the host's system objects.
-enum PortsetGetType : int {
-  PortsetGetRegular = 0,
-  PortsetGetSystem = 1,
-};
 
 /// Where a distributed port is: the switch's UUID, the port's key and the
 /// connection id of the client attached to it (0 for none).
