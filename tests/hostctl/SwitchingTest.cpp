@@ -43,7 +43,14 @@ protected:
     }
     Model::Store::SetPath(path_.string());
   }
-  void SetUp() override { Load(Model::Profile("demo")); }
+  /// The demo host without its kernel interfaces (and what refers to them),
+  /// so that port counts and clients are those the tests make.
+  void SetUp() override {
+    nlohmann::ordered_json host = Model::Profile("demo");
+    for (const char* key : {"interfaces", "routes", "neighbors"})
+      host.erase(key);
+    Load(host);
+  }
   void TearDown() override {
     Model::Store::CloseHost();
     Remove();
