@@ -283,7 +283,7 @@ TEST_F(SwitchingTest, SettingsStayInTheHostsRanges) {
 TEST_F(SwitchingTest, DistributedPortsAndLacp) {
   auto dvs = NetworkFactory::GetDVSwitchByName("dvs-west");
   auto ports = dvs->GetDVPorts();
-  ASSERT_EQ(ports.size(), 5u);
+  ASSERT_EQ(ports.size(), 6u);
   std::vector<std::string> clients;
   EXPECT_TRUE(ports[0]->IsInUse(clients));
   EXPECT_EQ(clients, Names{"vmnic2"});
