@@ -40,14 +40,15 @@ struct TreeRow {
   const char* path;        ///< Namespace: its path from "network". Command: its name.
   const char* description; ///< Namespace description; null for a command.
   CommandFactory make;     ///< Command factory; null for a namespace.
+  bool command;            ///< The row registers a command.
 };
 
 constexpr TreeRow Ns(const char* path, const char* description) {
-  return {path, description, nullptr};
+  return {path, description, nullptr, false};
 }
 
 template <class Class> constexpr TreeRow Cmd(const char* name) {
-  return {name, nullptr, &MakeCommand<Class>};
+  return {name, nullptr, &MakeCommand<Class>, true};
 }
 
 /// The whole tree. `network ip interface ipv4 get` and `network ip interface
@@ -423,11 +424,11 @@ constexpr TreeRow Tree[] = {
 constexpr std::size_t CountRows(bool commands) {
   std::size_t count = 0;
   for (const TreeRow& row : Tree)
-    count += (row.make != nullptr) == commands ? 1 : 0;
+    count += row.command == commands ? 1 : 0;
   return count;
 }
 
-static_assert(Tree[0].make == nullptr, "the table starts with the network namespace");
+static_assert(!Tree[0].command, "the table starts with the network namespace");
 static_assert(CountRows(false) == 91, "the network subtree has 91 namespaces");
 static_assert(CountRows(true) == 152, "the network subtree has 152 command registrations");
 
