@@ -1,0 +1,84 @@
+#!/usr/bin/env python3
+"""Every read-only command of the tree, on the demo host, in all six formatters.
+
+Walks the registered tree through the machine-readable help, runs each command
+that needs no option and changes nothing, and checks that the output of each
+formatter parses: xml with xmllint, csv with an RFC 4180 reader, json with a
+JSON parser; simple and table must not fail.
+
+    formats_check.py OSTRACLI OSTRAHOST
+"""
+import csv
+import io
+import json
+import os
+import shutil
+import subprocess
+import sys
+import tempfile
+
+CHANGING = ("add", "remove", "set", "load", "unload", "refresh", "change", "run", "restart")
+
+
+def main():
+    cli, host_tool = sys.argv[1], sys.argv[2]
+    with tempfile.TemporaryDirectory() as tmp:
+        db = os.path.join(tmp, "host.db")
+        subprocess.run([host_tool, "init", db, "--profile", "demo"], check=True)
+        env = dict(os.environ, OSTRACLI_HOST=db)
+
+        def run(args, **kw):
+            return subprocess.run([cli] + args, capture_output=True, env=env, **kw)
+
+        def help_of(path):
+            return json.loads(run(["--formatter", "json"] + path + ["--help"]).stdout)
+
+        commands = []
+
+        def walk(path):
+            for child in help_of(path)["children"]:
+                sub = path + [child["name"]]
+                if child["kind"] == "namespace":
+                    walk(sub)
+                elif not any(p["required"] for p in help_of(sub)["parameters"]) and \
+                        not any(word in sub[-1] for word in CHANGING):
+                    commands.append(sub)
+
+        walk(["network"])
+        passed = failed = 0
+        xmllint = shutil.which("xmllint")
+        for path in commands:
+            for fmt in ("simple", "table", "json", "xml", "csv", "keyvalue"):
+                done = run(["--formatter", fmt] + path)
+                problem = None
+                if done.returncode not in (0, 1):
+                    problem = f"exit status {done.returncode}"
+                elif fmt == "json" and done.stdout:
+                    try:
+                        json.loads(done.stdout)
+                    except ValueError as error:
+                        problem = f"not JSON: {error}"
+                elif fmt == "xml" and done.stdout and xmllint:
+                    lint = subprocess.run([xmllint, "--noout", "-"], input=done.stdout,
+                                          capture_output=True)
+                    if lint.returncode:
+                        problem = "not well-formed: " + lint.stderr.decode()[:200]
+                elif fmt == "csv" and done.stdout:
+                    try:
+                        rows = list(csv.reader(io.StringIO(done.stdout.decode(), newline=""),
+                                               strict=True))
+                        if len({len(row) for row in rows}) > 1:
+                            problem = "rows of different lengths"
+                    except csv.Error as error:
+                        problem = f"not CSV: {error}"
+                if problem:
+                    failed += 1
+                    print(f"{' '.join(path)} --formatter {fmt}: {problem}")
+                else:
+                    passed += 1
+        print(f"{len(commands)} commands; {passed} passed, {failed} failed")
+        return 1 if failed or not commands else 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
