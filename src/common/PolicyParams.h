@@ -11,7 +11,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "HostCtl/Network/Policy.h"
 
 #include <cstdint>

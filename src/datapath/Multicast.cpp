@@ -6,7 +6,7 @@
 //===----------------------------------------------------------------------===//
 #include "datapath.h"
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 #include "HostCtl/Host.h"
 #include "HostCtl/Lib.h"

@@ -7,7 +7,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 
 #include <initializer_list>

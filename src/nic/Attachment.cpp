@@ -6,7 +6,7 @@
 //===----------------------------------------------------------------------===//
 #include "nic.h"
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"

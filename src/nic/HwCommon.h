@@ -9,7 +9,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 #include "HostCtl/Network/NetworkInfo.h"
 

@@ -8,7 +8,7 @@
 //===----------------------------------------------------------------------===//
 #include "ip.h"
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 #include "HostCtl/Network/TvkNic.h"
 #include "TvkCtl/Network/NetstackInstanceImpl.h"
 

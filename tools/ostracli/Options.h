@@ -1,7 +1,7 @@
 //===- Options.h - Command options against an input specification --------===//
 #pragma once
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 
 #include <string>
 #include <vector>

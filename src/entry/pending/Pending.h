@@ -10,7 +10,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 
 #include <memory>
 

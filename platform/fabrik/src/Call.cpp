@@ -1,10 +1,10 @@
-//===- CallSpec.cpp - Parameter and result descriptions ---------------------===//
+//===- Call.cpp - Parameter and result descriptions ---------------------===//
 //
 // Constraint checks and their help texts, parameter look-up and the reading
 // of validated parameter values.
 //
 //===----------------------------------------------------------------------===//
-#include "Fabrik/CallSpec.h"
+#include "Fabrik/Call.h"
 
 #include <cctype>
 #include <cerrno>

@@ -1,5 +1,5 @@
-//===- CallSpecTest.cpp - Constraints, parameter specs and input ------------===//
-#include "Fabrik/CallSpec.h"
+//===- CallTest.cpp - Constraints, parameter specs and input ----------------===//
+#include "Fabrik/Call.h"
 
 #include <gtest/gtest.h>
 

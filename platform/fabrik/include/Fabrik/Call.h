@@ -1,4 +1,4 @@
-//===- Fabrik/CallSpec.h - Parameter and result descriptions --------------===//
+//===- Fabrik/Call.h - Parameter and result descriptions --------------===//
 //
 // What a command takes (InputSpec of ParameterSpecs, each with an optional
 // ParameterConstraint) and what it gives (OutputSpec with a result template),
