@@ -3,9 +3,10 @@
 
 #include "TvkCtl/Network/PnicImpl.h"
 
-#include <boost/regex.hpp>
+#include "HostCtl/Lib.h"
 
 #include <algorithm>
+#include <dlfcn.h>
 #include <limits>
 
 namespace CorvexCli::NetworkNamespace {
@@ -258,12 +259,42 @@ void AddShapingParameters(const std::shared_ptr<InputSpec>& spec) {
   }
 }
 
+namespace {
+
+using SplitFunction = void (*)(const char*, std::size_t, void (*)(void*, const char*, std::size_t),
+                               void*);
+
+/// The splitter of the uplink module: already in the process (unit tests link
+/// it in), else loaded from network-uplinks.so beside the plug-in directory.
+SplitFunction Splitter() {
+  static const SplitFunction function = []() -> SplitFunction {
+    if (void* found = ::dlsym(RTLD_DEFAULT, "OstraSplitUplinks"))
+      return reinterpret_cast<SplitFunction>(found);
+    Dl_info info{};
+    if (!::dladdr(reinterpret_cast<void*>(&Splitter), &info) || !info.dli_fname)
+      return nullptr;
+    std::string path = info.dli_fname;
+    path = path.substr(0, path.find_last_of('/') + 1) + "../network-uplinks.so";
+    void* module = ::dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
+    return module ? reinterpret_cast<SplitFunction>(::dlsym(module, "OstraSplitUplinks")) : nullptr;
+  }();
+  return function;
+}
+
+} // namespace
+
 std::vector<std::string> SplitUplinks(const std::string& text) {
-  static const boost::regex separator(",", boost::regex::perl);
+  SplitFunction split = Splitter();
+  if (!split)
+    throw HostCtl::Lib::HostCtlException(
+        "Uplink lists cannot be read: the module network-uplinks.so is not installed");
   std::vector<std::string> names;
-  boost::sregex_token_iterator it(text.begin(), text.end(), separator, -1);
-  for (boost::sregex_token_iterator end; it != end; ++it)
-    names.push_back(it->str());
+  split(
+      text.data(), text.size(),
+      [](void* context, const char* token, std::size_t size) {
+        static_cast<std::vector<std::string>*>(context)->emplace_back(token, size);
+      },
+      &names);
   return names;
 }
 
