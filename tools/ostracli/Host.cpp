@@ -13,6 +13,7 @@
 #include "Fabrik/Format.h"
 #include "Help.h"
 #include "HostCtl/Lib.h"
+#include "HostCtl/Session.h"
 #include "Options.h"
 
 #include <algorithm>
@@ -57,14 +58,7 @@ std::string ExecutableDirectory() {
 std::string HostStateText() {
   if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
     return std::string(env) + " (from OSTRACLI_HOST)";
-  std::string base;
-  if (const char* xdg = std::getenv("XDG_STATE_HOME"); xdg && *xdg)
-    base = xdg;
-  else if (const char* home = std::getenv("HOME"); home && *home)
-    base = std::string(home) + "/.local/state";
-  else
-    base = "/tmp";
-  return base + "/ostracli/host.db (created from the demo profile on first use)";
+  return HostCtl::Session::DefaultHostPath() + " (created from the demo profile on first use)";
 }
 
 } // namespace

@@ -5,6 +5,10 @@
 
 namespace HostCtl::Session {
 
+std::string DefaultHostPath() {
+  return Model::Store::DefaultPath();
+}
+
 void SetHostPath(const std::string& path) {
   Model::Store::SetPath(path);
 }

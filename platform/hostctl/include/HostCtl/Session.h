@@ -10,6 +10,10 @@
 
 namespace HostCtl::Session {
 
+/// The host state used when neither --host nor $OSTRACLI_HOST names one:
+/// ${XDG_STATE_HOME:-$HOME/.local/state}/ostracli/host.db.
+std::string DefaultHostPath();
+
 /// Works on the host state at \p path (before the first host operation).
 void SetHostPath(const std::string& path);
 
