@@ -111,6 +111,10 @@ void Statement::Run() {
   }
 }
 
+void Statement::Reset() {
+  sqlite3_reset(stmt_);
+}
+
 int64_t Statement::Int(int column) const {
   return sqlite3_column_int64(stmt_, column);
 }
