@@ -330,7 +330,7 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
             for suffix in ("", "-wal", "-shm"):
                 if os.path.exists(fresh + suffix):
                     os.remove(fresh + suffix)
-            shutil.copyfile(demo, fresh)
+            check([ostrahost, "init", fresh, "--profile", "demo"])
             subprocess.run(namespace.cmd("route", "flush", "root", "11.0.0.0/8"), check=False)
 
         a, b = median_pair(lambda: timed(cli(fresh, "--batch", ours_file)),

@@ -103,6 +103,8 @@ void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) 
   std::unique_ptr<Model::Store> store = Model::Store::Create(path);
   try {
     Model::GenerateHost(*store, sizes);
+    // The whole host in the database file itself, so that it can be copied.
+    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
   } catch (...) {
     store.reset();
     for (const char* suffix : {"", "-wal", "-shm"})
@@ -154,6 +156,8 @@ int main(int argc, char** argv) {
       positional.push_back(arg);
     }
   }
+  if (sized && command != "generate")
+    return Usage("only generate takes sizes");
   try {
     if (command == "init") {
       if (positional.size() != 1)
@@ -163,8 +167,6 @@ int main(int argc, char** argv) {
       WriteHost(positional[0], Model::Profile(profile));
       return 0;
     }
-    if (sized && command != "generate")
-      return Usage("only generate takes sizes");
     if (command == "generate") {
       if (positional.size() != 1)
         return Usage("generate takes one PATH");
