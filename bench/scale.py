@@ -145,12 +145,17 @@ class Report:
 
 
 class Namespace:
-    """A network namespace with a dummy interface, deleted by close()."""
+    """A network namespace with one interface for the routes, deleted by close().
+
+    The interface is a dummy one; where the kernel lacks dummy interfaces (some
+    containers), one end of a veth pair inside the namespace, else loopback.
+    """
 
     def __init__(self, ip):
         self.ip = ip
         self.name = f"ostra-scale-{os.getpid()}"
         self.made = False
+        self.dev = "lo"
 
     def open(self):
         done = subprocess.run([self.ip, "netns", "add", self.name], capture_output=True,
@@ -158,11 +163,16 @@ class Namespace:
         if done.returncode != 0:
             return done.stderr.strip() or "ip netns add failed"
         self.made = True
-        for args in (["link", "add", "dummy0", "type", "dummy"],
-                     ["addr", "add", "10.99.0.2/16", "dev", "dummy0"],
-                     ["link", "set", "dummy0", "up"],
-                     ["link", "set", "lo", "up"]):
-            check([self.ip, "-n", self.name] + args)
+        for kind in (["dummy"], ["veth", "peer", "name", "bench1"]):
+            made = subprocess.run(self.cmd("link", "add", "bench0", "type", *kind),
+                                  capture_output=True, check=False)
+            if made.returncode == 0:
+                self.dev = "bench0"
+                break
+        for args in (["link", "set", "lo", "up"],
+                     ["addr", "add", "10.99.0.2/16", "dev", self.dev],
+                     ["link", "set", self.dev, "up"]):
+            check(self.cmd(*args))
         return None
 
     def close(self):
@@ -279,7 +289,7 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
     if "list" in parts and namespace:
         routes = os.path.join(tmp, "routes.batch")
         with open(routes, "w") as f:
-            f.write(route_lines(size, 172, "10.99.0.1", "dummy0"))
+            f.write(route_lines(size, 172, "10.99.0.1", namespace.dev))
         check(namespace.cmd("-batch", routes))
         kernel = json.loads(check(namespace.cmd("-json", "route", "show")))
         if len(kernel) < size:
@@ -323,7 +333,7 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
             f.write(batch_lines(count))
         peer_file = os.path.join(tmp, "add.ip")
         with open(peer_file, "w") as f:
-            f.write(route_lines(count, 11, "10.99.0.1", "dummy0"))
+            f.write(route_lines(count, 11, "10.99.0.1", namespace.dev))
         fresh = os.path.join(tmp, "batch.db")
 
         def prepare():

@@ -19,6 +19,7 @@ using Fabrik::CallSpec::Output;
 using Fabrik::CallSpec::OutputSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaList;
+using Fabrik::MetaObj::MetaString;
 using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using TvkCtl::Network::RoutingInfoImpl;
@@ -273,13 +274,16 @@ void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
     auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
     list->Reserve(routes.size());
     for (const HostCtl::Network::Ipv4Route& route : routes) {
-      auto row = GetOutputStructure();
-      row->SetField(kNetmask, route.GetNetwork().GetNetmask().GetStringAddress());
-      row->SetField(kInterface, route.GetInterfaceName());
-      row->SetField(kNetwork, NetworkText<Ipv4Family>(route.GetNetwork()));
-      row->SetField(kGateway, route.GetGateway().GetStringAddress());
-      row->SetField(kSource, routing.GetDefaultGatewaySource(route.GetNetwork()));
-      list->Add(row);
+      // Every field is set, so the row is built in the structure's field order
+      // directly instead of filling a fresh template (a listing may hold
+      // hundreds of thousands of rows).
+      auto row = MetaStruct::New("Ipv4Route");
+      row->SetField(kNetwork, MetaString::New(NetworkText<Ipv4Family>(route.GetNetwork())));
+      row->SetField(kNetmask, MetaString::New(route.GetNetwork().GetNetmask().GetStringAddress()));
+      row->SetField(kGateway, MetaString::New(route.GetGateway().GetStringAddress()));
+      row->SetField(kInterface, MetaString::New(route.GetInterfaceName()));
+      row->SetField(kSource, MetaString::New(routing.GetDefaultGatewaySource(route.GetNetwork())));
+      list->Add(std::move(row));
     }
     output->SetRootObject(list);
   } catch (const HostCtlException& e) {
