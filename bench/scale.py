@@ -39,15 +39,24 @@ import json
 MIB = 1024 * 1024
 
 
+class Sample(float):
+    """A wall time in ms that also carries the CPU time (user + system) in ms."""
+
+    def __new__(cls, wall, cpu):
+        value = super().__new__(cls, wall)
+        value.cpu = cpu
+        return value
+
+
 def run_timed(argv, env=None, stdin=None):
-    """Runs argv with its output discarded; returns (wall ms, peak RSS bytes, status)."""
+    """Runs argv with its output discarded; returns (Sample, status)."""
     start = time.perf_counter_ns()
     proc = subprocess.Popen(argv, env=env, stdin=stdin, stdout=subprocess.DEVNULL,
                             stderr=subprocess.DEVNULL)
     _, status, usage = os.wait4(proc.pid, 0)
     elapsed = (time.perf_counter_ns() - start) / 1e6
     proc.returncode = os.waitstatus_to_exitcode(status)
-    return elapsed, usage.ru_maxrss * 1024, proc.returncode
+    return Sample(elapsed, (usage.ru_utime + usage.ru_stime) * 1000), proc.returncode
 
 
 class PeakMemory:
@@ -116,15 +125,20 @@ def check(argv, env=None, what=None):
     return done.stdout
 
 
+def median(samples):
+    """The median wall time, carrying the median CPU time."""
+    return Sample(statistics.median(samples), statistics.median(s.cpu for s in samples))
+
+
 def median_pair(ours, peer, runs, prepare=None):
-    """Alternates ours and peer `runs` times; returns their median wall times."""
+    """Alternates ours and peer `runs` times; returns their median Samples."""
     a, b = [], []
     for _ in range(runs):
         if prepare:
             prepare()
         a.append(ours())
         b.append(peer())
-    return statistics.median(a), statistics.median(b)
+    return median(a), median(b)
 
 
 class Report:
@@ -132,16 +146,27 @@ class Report:
         self.rows = []
         self.missed = 0
 
-    def add(self, what, ours, peer, ratio, target, met):
+    def add(self, what, ours, peer, ratio, target, met, cpu="-"):
         self.rows.append((what, ours, peer, ratio, target, met))
         if met is False:
             self.missed += 1
         mark = "" if met is None else ("met" if met else "MISSED")
-        print(f"{what:52} {ours:>12} {peer:>12} {ratio:>7} {target:>8} {mark}", flush=True)
+        print(f"{what:48} {ours:>11} {peer:>11} {ratio:>7} {cpu:>7} {target:>8} {mark}",
+              flush=True)
+
+    def timing(self, what, a, b, target, limit, smoke):
+        """Adds a ratio of wall times (and of CPU times) against its limit."""
+        ratio = a / b
+        cpu = a.cpu / b.cpu if b.cpu > 0 else float("inf")
+        self.add(what, f"{a:.2f} ms", f"{b:.2f} ms", f"{ratio:.2f}", target,
+                 None if smoke or limit is None else ratio <= limit, f"{cpu:.2f}")
 
     @staticmethod
     def header():
-        print(f"{'what':52} {'ours':>12} {'peer':>12} {'ratio':>7} {'target':>8}", flush=True)
+        print(f"{'what':48} {'ours':>11} {'peer':>11} {'ratio':>7} {'cpu':>7} {'target':>8}",
+              flush=True)
+        print(f"{'':48} {'(median wall time; ratio of wall times, cpu: of CPU times)':>49}",
+              flush=True)
 
 
 class Namespace:
@@ -261,10 +286,10 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
         return [ostracli, "--host", path] + list(words)
 
     def timed(argv):
-        elapsed, _, status = run_timed(argv)
+        sample, status = run_timed(argv)
         if status != 0:
             sys.exit(f"failed ({status}): {' '.join(argv)}")
-        return elapsed
+        return sample
 
     demo = host("demo")
     big = host("big", "--routes", str(size), *(["--portgroups", "40", "--vms", "10"]
@@ -297,20 +322,19 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
         ours_argv = cli(big, *listing)
         peer_argv = namespace.cmd("-json", "route", "show")
         a, b = median_pair(lambda: timed(ours_argv), lambda: timed(peer_argv), runs)
-        ratio = a / b
-        report.add(f"route list, JSON, {size} routes", f"{a:.2f} ms", f"{b:.2f} ms",
-                   f"{ratio:.2f}", "<= 1.0", None if smoke else ratio <= 1.0)
+        report.timing(f"route list, JSON, {size} routes", a, b, "<= 1.0", 1.0, smoke)
 
     if "growth" in parts:
-        base = statistics.median(timed(cli(demo, *listing)) for _ in range(runs))
+        base = median([timed(cli(demo, *listing)) for _ in range(runs)])
         demo_rows = len(json.loads(check(cli(demo, *listing))))
         for n in growth_sizes:
             path = host(f"routes{n}", "--routes", str(n), "--portgroups", "0", "--vms", "0")
-            t = statistics.median(timed(cli(path, *listing)) for _ in range(runs))
+            t = median([timed(cli(path, *listing)) for _ in range(runs)])
             per_row = (t - base) * 1000 / n
+            per_row_cpu = (t.cpu - base.cpu) * 1000 / n
             report.add(f"route list, JSON, {n + demo_rows} rows", f"{t:.2f} ms",
-                       f"{base:.2f} ms", f"{per_row:.3f}", "flat", None)
-        print(f"{'':52} (peer: the demo host's listing; ratio column: µs per added row)")
+                       f"{base:.2f} ms", f"{per_row:.3f}", "flat", None, f"{per_row_cpu:.3f}")
+        print(f"{'':48} (peer: the demo host's listing; ratio and cpu: µs per added row)")
 
     if "lookup" in parts:
         lookups = [
@@ -322,9 +346,7 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
             check(cli(big, *words))
             a, b = median_pair(lambda: timed(cli(big, *words)), lambda: timed(cli(demo, *words)),
                                runs)
-            ratio = a / b
-            report.add(f"{what}: generated / demo host", f"{a:.2f} ms", f"{b:.2f} ms",
-                       f"{ratio:.2f}", "<= 1.1", None if smoke else ratio <= 1.1)
+            report.timing(f"{what}: generated / demo host", a, b, "<= 1.1", 1.1, smoke)
 
     if "batch" in parts and namespace:
         count = size
@@ -349,10 +371,9 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
         added = json.loads(check(cli(fresh, *listing)))
         if len(added) < count:
             sys.exit(f"the batch left {len(added)} routes, expected at least {count}")
-        ratio = a / b
-        report.add(f"batch of {count} route additions", f"{a:.1f} ms", f"{b:.1f} ms",
-                   f"{ratio:.2f}", "<= 1.5", None if smoke else ratio <= 1.5)
+        report.timing(f"batch of {count} route additions", a, b, "<= 1.5", 1.5, smoke)
 
+    ip = shutil.which("ip")
     if "mutate" in parts and ip:
         path = host("mutate")
         peer_argv = [ip, "-json", "link", "show"]
@@ -364,12 +385,10 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
             removes.append(timed(cli(path, "network", "ip", "dns", "server", "remove", "-s",
                                      "10.20.9.9")))
             peers.append(timed(peer_argv))
-        b = statistics.median(peers)
+        b = median(peers)
         for verb, values in (("add", adds), ("remove", removes)):
-            a = statistics.median(values)
-            ratio = a / b
-            report.add(f"dns server {verb} (durable)", f"{a:.2f} ms", f"{b:.2f} ms",
-                       f"{ratio:.2f}", "<= 2.5", None if smoke else ratio <= 2.5)
+            report.timing(f"dns server {verb} (durable)", median(values), b, "<= 2.5", 2.5,
+                          smoke)
 
     if "memory" in parts:
         meter = PeakMemory()
