@@ -273,11 +273,12 @@ void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
     std::vector<HostCtl::Network::Ipv4Route> routes = routing.GetCurrentTarvikRoutes(selector);
     auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
     list->Reserve(routes.size());
+    // Every field of a row is set, so a row starts as a shallow copy of one
+    // structure (its fields in order, in one allocation) rather than as a
+    // fresh template: a listing may hold hundreds of thousands of rows.
+    const std::shared_ptr<MetaStruct> shape = GetOutputStructure();
     for (const HostCtl::Network::Ipv4Route& route : routes) {
-      // Every field is set, so the row is built in the structure's field order
-      // directly instead of filling a fresh template (a listing may hold
-      // hundreds of thousands of rows).
-      auto row = MetaStruct::New("Ipv4Route");
+      auto row = std::make_shared<MetaStruct>(*shape);
       row->SetField(kNetwork, MetaString::New(NetworkText<Ipv4Family>(route.GetNetwork())));
       row->SetField(kNetmask, MetaString::New(route.GetNetwork().GetNetmask().GetStringAddress()));
       row->SetField(kGateway, MetaString::New(route.GetGateway().GetStringAddress()));

@@ -26,6 +26,8 @@ namespace {
 
 /// Blanks of indent per nesting level.
 constexpr std::size_t IndentStep = 2;
+/// Bytes of text the writer keeps before passing them on to its sink.
+constexpr std::size_t FlushSize = 64 * 1024;
 
 /// True for a byte that a JSON string holds as it is.
 inline bool IsPlain(unsigned char c) {
@@ -70,8 +72,18 @@ void WriteString(std::string& out, const std::string& text) {
 /// compact (one line, no blanks) into a text buffer.
 class JsonWriter {
 public:
-  JsonWriter(std::string& out, const Parameters& params, bool pretty)
-      : out_(out), params_(params), pretty_(pretty) {}
+  /// Writes into \p out; with a \p sink, the text written so far is passed
+  /// on to it in pieces, so that a long listing is not held twice.
+  JsonWriter(std::string& out, const Parameters& params, bool pretty, std::ostream* sink = nullptr)
+      : out_(out), params_(params), pretty_(pretty), sink_(sink) {}
+
+  /// Passes the text written so far on to the sink.
+  void Flush() {
+    if (sink_ && !out_.empty()) {
+      sink_->write(out_.data(), static_cast<std::streamsize>(out_.size()));
+      out_.clear();
+    }
+  }
 
   /// Writes \p value; the caller has written the indent of its first line.
   void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
@@ -109,7 +121,7 @@ private:
   /// list share it, so the formatter parameters are read once per list.
   struct Selection {
     std::string name;                 ///< Structure name.
-    bool atRoot;                      ///< Chosen for the root level.
+    bool atRoot = false;              ///< Chosen for the root level.
     std::vector<std::string> layout;  ///< Field names of the structure, in order.
     std::vector<std::size_t> indices; ///< Indices of the chosen fields, in order.
     /// What precedes each chosen field's value at indent prefixIndent: the
@@ -133,7 +145,9 @@ private:
       if (selection.atRoot == atRoot && selection.name == value.GetName() &&
           SameLayout(selection, value))
         return selection;
-    Selection selection{value.GetName(), atRoot, {}, {}};
+    Selection selection;
+    selection.name = value.GetName();
+    selection.atRoot = atRoot;
     const std::vector<MetaStruct::Field>& fields = value.GetFields();
     for (const MetaStruct::Field& field : fields)
       selection.layout.push_back(field.name);
@@ -189,6 +203,8 @@ private:
       Separate(first, indent + IndentStep);
       first = false;
       Value(item, indent + IndentStep, atRoot);
+      if (out_.size() >= FlushSize)
+        Flush();
     }
     if (first)
       out_ += ']';
@@ -222,6 +238,7 @@ private:
   std::string& out_;                 ///< Destination.
   const Parameters& params_;         ///< Formatter parameters.
   bool pretty_;                      ///< One item or member per line, indented.
+  std::ostream* sink_;               ///< Where Flush passes the text on, if anywhere.
   std::deque<Selection> selections_; ///< Fields chosen so far, by structure.
 };
 
@@ -232,10 +249,10 @@ public:
     if (!root)
       return;
     std::string text;
-    JsonWriter writer(text, params, /*pretty=*/true);
+    JsonWriter writer(text, params, /*pretty=*/true, &out);
     writer.Value(root, 0, /*atRoot=*/true);
     text += '\n';
-    out.write(text.data(), static_cast<std::streamsize>(text.size()));
+    writer.Flush();
   }
   bool IsMachineFormat() const override { return true; }
 };
