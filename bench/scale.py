@@ -309,6 +309,8 @@ def run(args, parts, ostracli, ostrahost, runs, size, growth_sizes, batch_runs, 
     if problem:
         print(f"namespace benchmarks skipped: {problem}", flush=True)
         namespace = None
+    else:
+        print(f"namespace {namespace.name}: kernel routes on {namespace.dev}", flush=True)
 
     Report.header()
     if "list" in parts and namespace:
