@@ -71,16 +71,20 @@ std::string HostPath(const std::string& given) {
   return Model::Store::DefaultPath();
 }
 
-/// Creates \p path from \p host, or replaces the host it holds.
+/// Creates \p path from \p host, or replaces the host it holds. The host
+/// ends up in the database file itself, not only in its write-ahead log, so
+/// that copying the file alone copies the host.
 void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
   if (Exists(path)) {
     Model::Store store(path);
     Model::ImportHost(store, host);
+    store.Exec("PRAGMA wal_checkpoint(TRUNCATE)");
     return;
   }
   std::unique_ptr<Model::Store> store = Model::Store::Create(path);
   try {
     Model::ImportHost(*store, host);
+    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
   } catch (...) {
     store.reset();
     for (const char* suffix : {"", "-wal", "-shm"})
