@@ -123,13 +123,6 @@ template <std::size_t N> std::string FieldText(const char (&field)[N]) {
   return std::string(field, strnlen(field, N));
 }
 
-std::string JoinFields(const std::vector<std::string>& fields) {
-  std::string joined;
-  for (const std::string& field : fields)
-    joined += (joined.empty() ? "" : ",") + field;
-  return joined;
-}
-
 std::shared_ptr<InputSpec> DvsSpec() {
   auto spec = InputSpec::New();
   AddParameterTable(spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,

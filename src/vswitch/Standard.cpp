@@ -60,12 +60,6 @@ const std::string kCdpStatus[] = {"down", "listen", "advertise", "both"};
 
 const std::string kNoSwitchNamed = "Unable to find a virtual switch with name ";
 
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 /// Names of the host's physical NICs, in order.
 std::vector<std::string> PhysicalNicNames() {
   TvkCtl::Network::NetworkInfoImpl info;

@@ -33,23 +33,9 @@ const std::string kStructShaping = "VirtualSwitchTrafficShapingPolicy";
 
 const std::string kNoLegacySwitch = "Unable to find a legacy virtual switch with the name ";
 
-/// Joins field names with ",".
-std::string JoinFields(std::initializer_list<const std::string*> fields) {
-  std::string joined;
-  for (const std::string* field : fields)
-    joined += (joined.empty() ? "" : ",") + *field;
-  return joined;
-}
-
 std::shared_ptr<InputSpec> SwitchNameSpec(const char* description) {
   auto spec = InputSpec::New();
   AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
-  return spec;
-}
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
   return spec;
 }
 
@@ -74,14 +60,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyShapingGet)
 
 VirtualSwitchStandardPolicyShapingGet::VirtualSwitchStandardPolicyShapingGet() {
   SetDescription("Get the shaping policy settings for the given virtual switch");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter("fields:" + kStructShaping,
-                            JoinFields({&kFieldEnabled, &kFieldAverageBandwidth,
-                                        &kFieldPeakBandwidth, &kFieldBurstSize}));
-  SetDefaultOutputParameter("header:" + kStructShaping, "<NONE>");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldAverageBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldPeakBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldBurstSize, "Kib");
+  SetPolicyGetOutput(*this, kStructShaping, ShapingFieldNames(), true);
 }
 
 VirtualSwitchStandardPolicyShapingGet::~VirtualSwitchStandardPolicyShapingGet() = default;
@@ -92,12 +71,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyShapingGet::GetInputSpecIn
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyShapingGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructShaping);
-  structure->SetField(kFieldEnabled, MetaBool::New());
-  structure->SetField(kFieldAverageBandwidth, MetaInt::New());
-  structure->SetField(kFieldPeakBandwidth, MetaInt::New());
-  structure->SetField(kFieldBurstSize, MetaInt::New());
-  return structure;
+  return NewShapingStructure(kStructShaping);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpecInternal() {
@@ -112,12 +86,8 @@ void VirtualSwitchStandardPolicyShapingGet::ExecuteInternal(const std::shared_pt
     auto vswitch = FindLegacySwitch(input, output);
     if (!vswitch)
       return;
-    ShapingValues values = DescribeShaping(vswitch->GetTrafficShapingPolicy());
     auto result = GetOutputStructure();
-    result->SetField(kFieldEnabled, values.enabled);
-    result->SetField(kFieldAverageBandwidth, values.average);
-    result->SetField(kFieldPeakBandwidth, values.peak);
-    result->SetField(kFieldBurstSize, values.burst);
+    SetShapingFields(*result, DescribeShaping(vswitch->GetTrafficShapingPolicy()));
     output->SetRootObject(result);
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(e.what());
@@ -167,11 +137,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicySecurityGet)
 
 VirtualSwitchStandardPolicySecurityGet::VirtualSwitchStandardPolicySecurityGet() {
   SetDescription("Get the Security Policy governing the given virtual switch.");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructSecurity,
-      JoinFields({&kFieldAllowPromiscuous, &kFieldAllowMacChange, &kFieldAllowForgedTransmits}));
-  SetDefaultOutputParameter("header:" + kStructSecurity, "<NONE>");
+  SetPolicyGetOutput(*this, kStructSecurity, SecurityFieldNames(), false);
 }
 
 VirtualSwitchStandardPolicySecurityGet::~VirtualSwitchStandardPolicySecurityGet() = default;
@@ -182,11 +148,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecurityGet::GetInputSpecI
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicySecurityGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructSecurity);
-  structure->SetField(kFieldAllowPromiscuous, MetaBool::New());
-  structure->SetField(kFieldAllowMacChange, MetaBool::New());
-  structure->SetField(kFieldAllowForgedTransmits, MetaBool::New());
-  return structure;
+  return NewSecurityStructure(kStructSecurity);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpecInternal() {
@@ -201,11 +163,8 @@ void VirtualSwitchStandardPolicySecurityGet::ExecuteInternal(
     auto vswitch = FindLegacySwitch(input, output);
     if (!vswitch)
       return;
-    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
     auto result = GetOutputStructure();
-    result->SetField(kFieldAllowPromiscuous, policy.GetAllowPromiscuous());
-    result->SetField(kFieldAllowMacChange, policy.GetAllowMacAddressChange());
-    result->SetField(kFieldAllowForgedTransmits, policy.GetAllowForgedTransmits());
+    SetSecurityFields(*result, vswitch->GetPortSecurityPolicy());
     output->SetRootObject(result);
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(e.what());
@@ -247,12 +206,7 @@ void VirtualSwitchStandardPolicySecuritySet::ExecuteInternal(
     if (!vswitch)
       return;
     PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
-    if (input->HasParameter(kParamAllowPromiscuous))
-      policy.SetAllowPromiscuous(input->GetParameterBool(kParamAllowPromiscuous));
-    if (input->HasParameter(kParamAllowMacChange))
-      policy.SetAllowMacAddressChange(input->GetParameterBool(kParamAllowMacChange));
-    if (input->HasParameter(kParamAllowForgedTransmits))
-      policy.SetAllowForgedTransmits(input->GetParameterBool(kParamAllowForgedTransmits));
+    SetSecurityPolicy(input, output, policy);
     vswitch->SetPortSecurityPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
   } catch (const HostCtlException& e) {
@@ -266,13 +220,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyFailoverGet)
 
 VirtualSwitchStandardPolicyFailoverGet::VirtualSwitchStandardPolicyFailoverGet() {
   SetDescription("Get the failover policy settings governing the given virtual switch");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructFailover,
-      JoinFields({&kFieldLoadBalancing, &kFieldFailureDetection, &kFieldNotifySwitches,
-                  &kFieldFailback, &kFieldActiveAdapters, &kFieldStandbyAdapters,
-                  &kFieldUnusedAdapters}));
-  SetDefaultOutputParameter("header:" + kStructFailover, "<NONE>");
+  SetPolicyGetOutput(*this, kStructFailover, FailoverFieldNames(), false);
 }
 
 VirtualSwitchStandardPolicyFailoverGet::~VirtualSwitchStandardPolicyFailoverGet() = default;
@@ -283,15 +231,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyFailoverGet::GetInputSpecI
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyFailoverGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructFailover);
-  structure->SetField(kFieldLoadBalancing, MetaString::New());
-  structure->SetField(kFieldFailureDetection, MetaString::New());
-  structure->SetField(kFieldNotifySwitches, MetaBool::New());
-  structure->SetField(kFieldFailback, MetaBool::New());
-  structure->SetField(kFieldActiveAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldStandbyAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldUnusedAdapters, MetaList::New(Fabrik::MetaObj::String));
-  return structure;
+  return NewFailoverStructure(kStructFailover);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpecInternal() {
@@ -306,15 +246,9 @@ void VirtualSwitchStandardPolicyFailoverGet::ExecuteInternal(
     auto vswitch = FindLegacySwitch(input, output);
     if (!vswitch)
       return;
-    FailoverValues values = DescribeFailover(vswitch->GetNicTeamingPolicy(), vswitch->GetUplinks());
     auto result = GetOutputStructure();
-    result->SetField(kFieldLoadBalancing, values.loadBalancing);
-    result->SetField(kFieldFailureDetection, values.failureDetection);
-    result->SetField(kFieldNotifySwitches, values.notifySwitches);
-    result->SetField(kFieldFailback, values.failback);
-    result->SetField(kFieldActiveAdapters, values.active);
-    result->SetField(kFieldStandbyAdapters, values.standby);
-    result->SetField(kFieldUnusedAdapters, values.unused);
+    SetFailoverFields(*result,
+                      DescribeFailover(vswitch->GetNicTeamingPolicy(), vswitch->GetUplinks()));
     output->SetRootObject(result);
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(e.what());
