@@ -127,6 +127,19 @@ std::unique_ptr<PortGroup> FindPortGroup(const std::shared_ptr<Input>& input,
   return group;
 }
 
+/// Runs \p body on the port group the command names. Adds the error when
+/// there is none, and the message of a host failure.
+template <typename Body>
+void WithPortGroup(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
+                   Body body) {
+  try {
+    if (std::unique_ptr<PortGroup> group = FindPortGroup(input, output))
+      body(*group);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
 /// The value fields of a policy result followed by their override flags.
 template <std::size_t N>
 std::vector<std::string> WithOverrides(const std::vector<std::string>& values,
@@ -369,18 +382,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingGet::GetOutputSpe
 
 void VirtualSwitchPortGroupPolicyShapingGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    uint32_t mask = group->GetConfiguredTrafficShapingPolicy().GetSetMask();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    uint32_t mask = group.GetConfiguredTrafficShapingPolicy().GetSetMask();
     auto result = GetOutputStructure();
-    SetShapingFields(*result, DescribeShaping(group->GetTrafficShapingPolicy()));
+    SetShapingFields(*result, DescribeShaping(group.GetTrafficShapingPolicy()));
     SetOverrides(*result, mask, kShapingOverrides);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy shaping set
@@ -406,26 +414,21 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetOutputSpe
 
 void VirtualSwitchPortGroupPolicyShapingSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    ShapingPolicy policy = group->GetConfiguredTrafficShapingPolicy();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    ShapingPolicy policy = group.GetConfiguredTrafficShapingPolicy();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetShapingPolicy(input, output, policy, false);
     if (policy.IsSet(ShapingPolicy::MASK_ENABLED) && policy.IsEnabled()) {
-      ShapingPolicy inForce = group->GetTrafficShapingPolicy();
+      ShapingPolicy inForce = group.GetTrafficShapingPolicy();
       for (const RequiredRate& rate : kRequiredRates)
         if (!policy.IsSet(rate.bit) && !inForce.IsSet(rate.bit))
           output->AddErrorMessage(rate.message);
     }
     if (!output->HasError())
-      group->SetTrafficShapingPolicy(policy);
+      group.SetTrafficShapingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy failover get
@@ -461,21 +464,16 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicyFailoverGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    NicTeamingPolicy inForce = group->GetNicTeamingPolicy();
-    uint32_t mask = group->GetConfiguredNicTeamingPolicy().GetSetMask();
-    std::vector<std::string> uplinks = group->GetVirtualSwitch()->GetUplinks();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    NicTeamingPolicy inForce = group.GetNicTeamingPolicy();
+    uint32_t mask = group.GetConfiguredNicTeamingPolicy().GetSetMask();
+    std::vector<std::string> uplinks = group.GetVirtualSwitch()->GetUplinks();
     auto result = GetOutputStructure();
     SetFailoverFields(*result, DescribeFailover(inForce, uplinks));
     SetOverrides(*result, mask, kFailoverOverrides);
     result->SetField(kFieldOverrideUplinks, (mask & NicTeamingPolicy::MASK_UPLINK_ORDER) != 0);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy failover set
@@ -502,22 +500,17 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicyFailoverSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    NicTeamingPolicy current = group->GetNicTeamingPolicy();
-    NicTeamingPolicy policy = group->GetConfiguredNicTeamingPolicy();
-    std::vector<std::string> uplinks = group->GetVirtualSwitch()->GetUplinks();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    NicTeamingPolicy current = group.GetNicTeamingPolicy();
+    NicTeamingPolicy policy = group.GetConfiguredNicTeamingPolicy();
+    std::vector<std::string> uplinks = group.GetVirtualSwitch()->GetUplinks();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetFailoverPolicy(input, output, policy, current, uplinks);
     if (!output->HasError())
-      group->SetNicTeamingPolicy(policy);
+      group.SetNicTeamingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy security get
@@ -550,18 +543,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicySecurityGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    uint32_t mask = group->GetConfiguredPortSecurityPolicy().GetSetMask();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    uint32_t mask = group.GetConfiguredPortSecurityPolicy().GetSetMask();
     auto result = GetOutputStructure();
-    SetSecurityFields(*result, group->GetPortSecurityPolicy());
+    SetSecurityFields(*result, group.GetPortSecurityPolicy());
     SetOverrides(*result, mask, kSecurityOverrides);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy security set
@@ -587,20 +575,15 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicySecuritySet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    PortSecurityPolicy policy = group->GetConfiguredPortSecurityPolicy();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    PortSecurityPolicy policy = group.GetConfiguredPortSecurityPolicy();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetSecurityPolicy(input, output, policy);
     if (!output->HasError())
-      group->SetPortSecurityPolicy(policy);
+      group.SetPortSecurityPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -52,6 +52,19 @@ std::unique_ptr<VirtualSwitch> FindLegacySwitch(const std::shared_ptr<Input>& in
   return vswitch;
 }
 
+/// Runs \p body on the standard switch the command names. Adds the error when
+/// there is none, and the message of a host failure.
+template <typename Body>
+void WithLegacySwitch(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
+                      Body body) {
+  try {
+    if (std::unique_ptr<VirtualSwitch> vswitch = FindLegacySwitch(input, output))
+      body(*vswitch);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
 } // namespace
 
 // network vswitch standard policy shaping get
@@ -82,16 +95,11 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpec
 
 void VirtualSwitchStandardPolicyShapingGet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                                             const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
-    SetShapingFields(*result, DescribeShaping(vswitch->GetTrafficShapingPolicy()));
+    SetShapingFields(*result, DescribeShaping(vswitch.GetTrafficShapingPolicy()));
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy shaping set
@@ -117,18 +125,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingSet::GetOutputSpec
 
 void VirtualSwitchStandardPolicyShapingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                                             const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    ShapingPolicy policy = vswitch->GetTrafficShapingPolicy();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    ShapingPolicy policy = vswitch.GetTrafficShapingPolicy();
     SetShapingPolicy(input, output, policy, false);
     if (!output->HasError())
-      vswitch->SetTrafficShapingPolicy(policy);
+      vswitch.SetTrafficShapingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy security get
@@ -159,16 +162,11 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpe
 
 void VirtualSwitchStandardPolicySecurityGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
-    SetSecurityFields(*result, vswitch->GetPortSecurityPolicy());
+    SetSecurityFields(*result, vswitch.GetPortSecurityPolicy());
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy security set
@@ -201,17 +199,12 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecuritySet::GetOutputSpe
 
 void VirtualSwitchStandardPolicySecuritySet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    PortSecurityPolicy policy = vswitch.GetPortSecurityPolicy();
     SetSecurityPolicy(input, output, policy);
-    vswitch->SetPortSecurityPolicy(policy);
+    vswitch.SetPortSecurityPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy failover get
@@ -242,17 +235,12 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpe
 
 void VirtualSwitchStandardPolicyFailoverGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
     SetFailoverFields(*result,
-                      DescribeFailover(vswitch->GetNicTeamingPolicy(), vswitch->GetUplinks()));
+                      DescribeFailover(vswitch.GetNicTeamingPolicy(), vswitch.GetUplinks()));
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy failover set
@@ -278,20 +266,15 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverSet::GetOutputSpe
 
 void VirtualSwitchStandardPolicyFailoverSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    NicTeamingPolicy current = vswitch->GetNicTeamingPolicy();
-    NicTeamingPolicy policy = vswitch->GetConfiguredNicTeamingPolicy();
-    std::vector<std::string> uplinks = vswitch->GetUplinks();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    NicTeamingPolicy current = vswitch.GetNicTeamingPolicy();
+    NicTeamingPolicy policy = vswitch.GetConfiguredNicTeamingPolicy();
+    std::vector<std::string> uplinks = vswitch.GetUplinks();
     SetFailoverPolicy(input, output, policy, current, uplinks);
     if (!output->HasError())
-      vswitch->SetNicTeamingPolicy(policy);
+      vswitch.SetNicTeamingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 } // namespace CorvexCli::NetworkNamespace
