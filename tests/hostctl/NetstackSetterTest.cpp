@@ -6,15 +6,13 @@
 // The host has a plain instance and one on which every setter has a fault.
 //
 //===----------------------------------------------------------------------===//
+#include "../support/ScratchHost.h"
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/NetstackInstanceImpl.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
-#include "model/HostDescription.h"
-#include "model/Store.h"
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <functional>
 #include <string>
 
@@ -68,25 +66,6 @@ const std::vector<Setter>& Setters() {
 
 class NetstackSetterTest : public ::testing::Test {
 protected:
-  void SetUp() override {
-    path_ = ::testing::TempDir() + "netstack-setter-" +
-            ::testing::UnitTest::GetInstance()->current_test_info()->name() + ".db";
-    Remove();
-    {
-      std::unique_ptr<Model::Store> store = Model::Store::Create(path_);
-      Model::ImportHost(*store, nlohmann::ordered_json::parse(kHost));
-    }
-    Model::Store::SetPath(path_);
-  }
-  void TearDown() override {
-    Model::Store::CloseHost();
-    Remove();
-  }
-  void Remove() {
-    for (const char* suffix : {"", "-wal", "-shm"})
-      std::remove((path_ + suffix).c_str());
-  }
-
   /// Instance \p key as the host has it now.
   std::unique_ptr<NetstackInstance> Lookup(const std::string& key) {
     auto instance = info_.LookupNetstackInstanceByKey(key);
@@ -101,8 +80,8 @@ protected:
     return value == key ? "" : value;
   }
 
-  std::string path_;     ///< Store file of the test.
-  NetworkInfoImpl info_; ///< Netstack service.
+  TestSupport::ScratchHost host_{"netstack-setter-test", kHost}; ///< The test host.
+  NetworkInfoImpl info_;                                         ///< Netstack service.
 };
 
 TEST_F(NetstackSetterTest, PersistedValuesReachTheHostAndOthersOnlyTheObject) {

@@ -7,16 +7,14 @@
 // overrides one field of each policy; "faulty" has a fault on every read.
 //
 //===----------------------------------------------------------------------===//
+#include "../support/ScratchHost.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/Switching.h"
-#include "model/HostDescription.h"
-#include "model/Store.h"
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <functional>
 #include <string>
 
@@ -111,25 +109,6 @@ const std::vector<Read>& Reads() {
 
 class PortGroupPolicyReadTest : public ::testing::Test {
 protected:
-  void SetUp() override {
-    path_ = ::testing::TempDir() + "portgroup-policy-read-" +
-            ::testing::UnitTest::GetInstance()->current_test_info()->name() + ".db";
-    Remove();
-    {
-      std::unique_ptr<Model::Store> store = Model::Store::Create(path_);
-      Model::ImportHost(*store, nlohmann::ordered_json::parse(kHost));
-    }
-    Model::Store::SetPath(path_);
-  }
-  void TearDown() override {
-    Model::Store::CloseHost();
-    Remove();
-  }
-  void Remove() {
-    for (const char* suffix : {"", "-wal", "-shm"})
-      std::remove((path_ + suffix).c_str());
-  }
-
   /// The message \p read throws on port group \p group, or "" when it does not.
   static std::string Refusal(const Read& read, PortGroup& group) {
     try {
@@ -140,7 +119,7 @@ protected:
     return "";
   }
 
-  std::string path_; ///< Store file of the test.
+  TestSupport::ScratchHost host_{"portgroup-policy-read-test", kHost}; ///< The test host.
 };
 
 TEST_F(PortGroupPolicyReadTest, InForceAndConfiguredReadsMergeTheSwitchDifferently) {

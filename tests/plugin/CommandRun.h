@@ -1,10 +1,9 @@
 //===- CommandRun.h - Commands run in-process against a scratch host ------===//
 //
-// ScratchHost imports a host description into a temporary store and makes
-// it the host the library opens; RunCommand executes a command object with the
-// given parameters and gives back its errors and its result in the JSON form
-// the json formatter prints, so that a test compares values and field order
-// without reading the meta objects by hand.
+// On a ScratchHost (support/ScratchHost.h), RunCommand executes a command
+// object with the given parameters and gives back its errors and its result
+// in the JSON form the json formatter prints, so that a test compares values
+// and field order without reading the meta objects by hand.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
@@ -13,49 +12,18 @@
 #include "Fabrik/Call.h"
 #include "Fabrik/Format.h"
 
-#include "model/HostDescription.h"
-#include "model/Store.h"
+#include "../support/ScratchHost.h"
 
 #include <nlohmann/json.hpp>
 
-#include <filesystem>
 #include <sstream>
 #include <string>
-#include <unistd.h>
 #include <variant>
 #include <vector>
 
 namespace PluginTest {
 
-/// A host imported from a JSON description, current while the object lives.
-class ScratchHost {
-public:
-  ScratchHost(const std::string& tag, const std::string& description) {
-    path_ =
-        std::filesystem::temp_directory_path() / (tag + "-" + std::to_string(::getpid()) + ".db");
-    Remove();
-    {
-      auto store = Model::Store::Create(path_.string());
-      Model::ImportHost(*store, nlohmann::ordered_json::parse(description));
-    }
-    Model::Store::CloseHost();
-    Model::Store::SetPath(path_.string());
-  }
-  ~ScratchHost() {
-    Model::Store::CloseHost();
-    Remove();
-  }
-  ScratchHost(const ScratchHost&) = delete;
-  ScratchHost& operator=(const ScratchHost&) = delete;
-
-private:
-  void Remove() {
-    for (const char* suffix : {"", "-wal", "-shm"})
-      std::filesystem::remove(path_.string() + suffix);
-  }
-
-  std::filesystem::path path_; ///< Store file.
-};
+using TestSupport::ScratchHost;
 
 /// One parameter of a run: a string, an integer, a boolean, or a flag.
 struct Flag {};
