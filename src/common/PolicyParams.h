@@ -13,6 +13,7 @@
 
 #include "Fabrik/AutoCli.h"
 #include "Fabrik/Call.h"
+#include "HostCtl/Lib.h"
 #include "HostCtl/Network/Policy.h"
 #include "common/ParameterTable.h"
 
@@ -143,6 +144,21 @@ void SetShapingFields(Fabrik::MetaObj::MetaStruct& result, const ShapingValues& 
 /// also the units of its three rates.
 void SetPolicyGetOutput(Fabrik::AutoCli::CommandSpec& command, const std::string& name,
                         const std::vector<std::string>& fields, bool rateUnits);
+
+/// Runs \p body on the switch or port group \p find gives for the command,
+/// which is null when \p find has added the error; a host failure adds its
+/// message. The policy commands of switches and port groups run in it.
+template <typename Find, typename Body>
+void WithPolicyHolder(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                      const std::shared_ptr<Fabrik::CallSpec::Output>& output, Find find,
+                      Body body) {
+  try {
+    if (auto holder = find(input, output))
+      body(*holder);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
 
 /// Joins field names with ",".
 std::string JoinFields(const std::vector<std::string>& fields);

@@ -127,17 +127,11 @@ std::unique_ptr<PortGroup> FindPortGroup(const std::shared_ptr<Input>& input,
   return group;
 }
 
-/// Runs \p body on the port group the command names. Adds the error when
-/// there is none, and the message of a host failure.
+/// Runs \p body on the port group the command names (WithPolicyHolder).
 template <typename Body>
 void WithPortGroup(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
                    Body body) {
-  try {
-    if (std::unique_ptr<PortGroup> group = FindPortGroup(input, output))
-      body(*group);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  WithPolicyHolder(input, output, FindPortGroup, body);
 }
 
 /// The value fields of a policy result followed by their override flags.

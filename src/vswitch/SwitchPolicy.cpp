@@ -52,17 +52,11 @@ std::unique_ptr<VirtualSwitch> FindLegacySwitch(const std::shared_ptr<Input>& in
   return vswitch;
 }
 
-/// Runs \p body on the standard switch the command names. Adds the error when
-/// there is none, and the message of a host failure.
+/// Runs \p body on the standard switch the command names (WithPolicyHolder).
 template <typename Body>
 void WithLegacySwitch(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
                       Body body) {
-  try {
-    if (std::unique_ptr<VirtualSwitch> vswitch = FindLegacySwitch(input, output))
-      body(*vswitch);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  WithPolicyHolder(input, output, FindLegacySwitch, body);
 }
 
 } // namespace
