@@ -19,16 +19,6 @@ class SystemInfo;
 
 namespace CorvexCli::NetworkNamespace {
 
-/// The rulesets a firewall list command works on: all of them, or the one
-/// named by its optional "ruleset-id" parameter. Adds "Ruleset Not Found: " or
-/// "Failed to check loaded status: " followed by the id and answers false when
-/// the named ruleset cannot be selected; other host failures pass as
-/// HostCtlException.
-bool SelectFirewallRulesets(
-    HostCtl::System::SystemInfo& system, const Fabrik::CallSpec::Input& input,
-    Fabrik::CallSpec::Output& output,
-    std::vector<std::unique_ptr<HostCtl::System::FirewallRuleset>>& selection);
-
 // Firewall state (Firewall.cpp).
 
 /// network firewall get

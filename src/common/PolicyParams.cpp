@@ -12,8 +12,14 @@
 namespace CorvexCli::NetworkNamespace {
 
 using Fabrik::CallSpec::InputSpec;
+using Fabrik::CallSpec::OutputSpec;
 using Fabrik::CallSpec::ParameterConstraint;
 using Fabrik::CallSpec::ParameterSpec;
+using Fabrik::MetaObj::MetaBool;
+using Fabrik::MetaObj::MetaInt;
+using Fabrik::MetaObj::MetaList;
+using Fabrik::MetaObj::MetaString;
+using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Network::LinkCriteriaSelectionPolicy;
 using HostCtl::Network::NicTeamingPolicy;
 using HostCtl::Network::PortSecurityPolicy;
@@ -464,6 +470,101 @@ ShapingValues DescribeShaping(const ShapingPolicy& policy) {
     values.burst = static_cast<long>(policy.GetBurstSize() / 128);
   }
   return values;
+}
+
+const std::vector<std::string>& FailoverFieldNames() {
+  static const std::vector<std::string> names = {
+      kFieldLoadBalancing,  kFieldFailureDetection, kFieldNotifySwitches, kFieldFailback,
+      kFieldActiveAdapters, kFieldStandbyAdapters,  kFieldUnusedAdapters};
+  return names;
+}
+
+const std::vector<std::string>& SecurityFieldNames() {
+  static const std::vector<std::string> names = {kFieldAllowPromiscuous, kFieldAllowMacChange,
+                                                 kFieldAllowForgedTransmits};
+  return names;
+}
+
+const std::vector<std::string>& ShapingFieldNames() {
+  static const std::vector<std::string> names = {kFieldEnabled, kFieldAverageBandwidth,
+                                                 kFieldPeakBandwidth, kFieldBurstSize};
+  return names;
+}
+
+std::shared_ptr<MetaStruct> NewFailoverStructure(const std::string& name) {
+  auto structure = MetaStruct::New(name);
+  structure->SetField(kFieldLoadBalancing, MetaString::New());
+  structure->SetField(kFieldFailureDetection, MetaString::New());
+  structure->SetField(kFieldNotifySwitches, MetaBool::New());
+  structure->SetField(kFieldFailback, MetaBool::New());
+  structure->SetField(kFieldActiveAdapters, MetaList::New(Fabrik::MetaObj::String));
+  structure->SetField(kFieldStandbyAdapters, MetaList::New(Fabrik::MetaObj::String));
+  structure->SetField(kFieldUnusedAdapters, MetaList::New(Fabrik::MetaObj::String));
+  return structure;
+}
+
+std::shared_ptr<MetaStruct> NewSecurityStructure(const std::string& name) {
+  auto structure = MetaStruct::New(name);
+  for (const std::string& field : SecurityFieldNames())
+    structure->SetField(field, MetaBool::New());
+  return structure;
+}
+
+std::shared_ptr<MetaStruct> NewShapingStructure(const std::string& name) {
+  auto structure = MetaStruct::New(name);
+  structure->SetField(kFieldEnabled, MetaBool::New());
+  structure->SetField(kFieldAverageBandwidth, MetaInt::New());
+  structure->SetField(kFieldPeakBandwidth, MetaInt::New());
+  structure->SetField(kFieldBurstSize, MetaInt::New());
+  return structure;
+}
+
+void SetFailoverFields(MetaStruct& result, const FailoverValues& values) {
+  result.SetField(kFieldLoadBalancing, values.loadBalancing);
+  result.SetField(kFieldFailureDetection, values.failureDetection);
+  result.SetField(kFieldNotifySwitches, values.notifySwitches);
+  result.SetField(kFieldFailback, values.failback);
+  result.SetField(kFieldActiveAdapters, values.active);
+  result.SetField(kFieldStandbyAdapters, values.standby);
+  result.SetField(kFieldUnusedAdapters, values.unused);
+}
+
+void SetSecurityFields(MetaStruct& result, const PortSecurityPolicy& policy) {
+  result.SetField(kFieldAllowPromiscuous, policy.GetAllowPromiscuous());
+  result.SetField(kFieldAllowMacChange, policy.GetAllowMacAddressChange());
+  result.SetField(kFieldAllowForgedTransmits, policy.GetAllowForgedTransmits());
+}
+
+void SetShapingFields(MetaStruct& result, const ShapingValues& values) {
+  result.SetField(kFieldEnabled, values.enabled);
+  result.SetField(kFieldAverageBandwidth, values.average);
+  result.SetField(kFieldPeakBandwidth, values.peak);
+  result.SetField(kFieldBurstSize, values.burst);
+}
+
+void SetPolicyGetOutput(Fabrik::AutoCli::CommandSpec& command, const std::string& name,
+                        const std::vector<std::string>& fields, bool rateUnits) {
+  command.SetDefaultOutputFormatter("simple");
+  command.SetDefaultOutputParameter("fields:" + name, JoinFields(fields));
+  command.SetDefaultOutputParameter("header:" + name, "<NONE>");
+  if (!rateUnits)
+    return;
+  command.SetDefaultOutputParameter("units:" + name + "." + kFieldAverageBandwidth, "Kbps");
+  command.SetDefaultOutputParameter("units:" + name + "." + kFieldPeakBandwidth, "Kbps");
+  command.SetDefaultOutputParameter("units:" + name + "." + kFieldBurstSize, "Kib");
+}
+
+std::string JoinFields(const std::vector<std::string>& fields) {
+  std::string joined;
+  for (const std::string& field : fields)
+    joined += (joined.empty() ? "" : ",") + field;
+  return joined;
+}
+
+std::shared_ptr<OutputSpec> BoolResult() {
+  auto spec = OutputSpec::New();
+  spec->SetRootObject(MetaBool::New());
+  return spec;
 }
 
 } // namespace CorvexCli::NetworkNamespace

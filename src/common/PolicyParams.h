@@ -11,8 +11,11 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "Fabrik/AutoCli.h"
 #include "Fabrik/Call.h"
+#include "HostCtl/Lib.h"
 #include "HostCtl/Network/Policy.h"
+#include "common/ParameterTable.h"
 
 #include <cstdint>
 #include <memory>
@@ -51,15 +54,6 @@ extern const std::string kFieldEnabled;
 extern const std::string kFieldAverageBandwidth;
 extern const std::string kFieldPeakBandwidth;
 extern const std::string kFieldBurstSize;
-
-/// One parameter of a command, as the vswitch families declare them in tables.
-struct ParameterDef {
-  const std::string& name;              ///< Long name.
-  const char* shortName;                ///< Short name.
-  Fabrik::CallSpec::ParameterType type; ///< Value type.
-  bool required;                        ///< Declared required.
-  const char* description;              ///< Description.
-};
 
 /// Appends one parameter per entry of \p table, in order.
 void AddParameterTable(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec,
@@ -118,5 +112,58 @@ struct ShapingValues {
   long burst = -1;      ///< Burst size, Kib.
 };
 ShapingValues DescribeShaping(const HostCtl::Network::ShapingPolicy& policy);
+
+// --- Results of the policy get commands. A switch and a port group show the
+// same value fields under their own structure names; a port group adds one
+// override flag per field after them.
+
+/// The failover value fields, in the order shown.
+const std::vector<std::string>& FailoverFieldNames();
+/// The security value fields, in the order shown.
+const std::vector<std::string>& SecurityFieldNames();
+/// The shaping value fields, in the order shown.
+const std::vector<std::string>& ShapingFieldNames();
+
+/// A structure named \p name holding the failover value fields, unset.
+std::shared_ptr<Fabrik::MetaObj::MetaStruct> NewFailoverStructure(const std::string& name);
+/// A structure named \p name holding the security value fields, unset.
+std::shared_ptr<Fabrik::MetaObj::MetaStruct> NewSecurityStructure(const std::string& name);
+/// A structure named \p name holding the shaping value fields, unset.
+std::shared_ptr<Fabrik::MetaObj::MetaStruct> NewShapingStructure(const std::string& name);
+
+/// Sets the failover value fields of \p result.
+void SetFailoverFields(Fabrik::MetaObj::MetaStruct& result, const FailoverValues& values);
+/// Sets the security value fields of \p result from \p policy.
+void SetSecurityFields(Fabrik::MetaObj::MetaStruct& result,
+                       const HostCtl::Network::PortSecurityPolicy& policy);
+/// Sets the shaping value fields of \p result.
+void SetShapingFields(Fabrik::MetaObj::MetaStruct& result, const ShapingValues& values);
+
+/// The default output of a policy get: the simple formatter, \p fields of
+/// structure \p name, and no header; for a shaping structure (\p rateUnits)
+/// also the units of its three rates.
+void SetPolicyGetOutput(Fabrik::AutoCli::CommandSpec& command, const std::string& name,
+                        const std::vector<std::string>& fields, bool rateUnits);
+
+/// Runs \p body on the switch or port group \p find gives for the command,
+/// which is null when \p find has added the error; a host failure adds its
+/// message. The policy commands of switches and port groups run in it.
+template <typename Find, typename Body>
+void WithPolicyHolder(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
+                      const std::shared_ptr<Fabrik::CallSpec::Output>& output, Find find,
+                      Body body) {
+  try {
+    if (auto holder = find(input, output))
+      body(*holder);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
+}
+
+/// Joins field names with ",".
+std::string JoinFields(const std::vector<std::string>& fields);
+
+/// The output specification of a command whose result is one boolean.
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolResult();
 
 } // namespace CorvexCli::NetworkNamespace

@@ -10,6 +10,7 @@
 #include "HostCtl/System/Host.h"
 #include "TvkCtl/System/SystemInfoImpl.h"
 #include "common/ParameterTable.h"
+#include "firewall/FirewallCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -130,43 +131,32 @@ std::shared_ptr<MetaStruct> FirewallRulesetAllowedipList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetAllowedipList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListSpec(GetOutputStructure());
 }
 
 void FirewallRulesetAllowedipList::ExecuteInternal(const std::shared_ptr<Input>& input,
                                                    const std::shared_ptr<Output>& output) {
-  try {
-    SystemInfoImpl system;
-    auto result = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    std::vector<std::unique_ptr<FirewallRuleset>> rulesets;
-    if (!SelectFirewallRulesets(system, *input, *output, rulesets))
-      return;
-    for (const auto& ruleset : rulesets) {
-      auto row = GetOutputStructure();
-      row->SetField(kRulesetField, ruleset->GetRulesetId());
-      auto addresses = MetaList::New(Fabrik::MetaObj::String);
-      if (ruleset->IsAllowedAll()) {
-        addresses->Add(std::string("All"));
-      } else {
-        std::unique_ptr<HostCtl::System::FirewallAllowedIps> ips = ruleset->GetAllowedIps();
-        for (const auto& address : ips->ipv4Addresses)
-          addresses->Add(address.GetStringAddress());
-        for (const auto& address : ips->ipv6Addresses)
-          addresses->Add(address.GetStringAddress());
-        for (const auto& network : ips->ipv4Networks)
-          addresses->Add(network.GetStringAddress());
-        for (const auto& network : ips->ipv6Networks)
-          addresses->Add(network.GetStringAddress());
-      }
-      row->SetField(kAllowedIpsField, addresses);
-      result->Add(row);
-    }
-    output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListRulesets(
+      *input, *output, GetOutputStructure(), [&](MetaList& list, FirewallRuleset& ruleset) {
+        auto row = GetOutputStructure();
+        row->SetField(kRulesetField, ruleset.GetRulesetId());
+        auto addresses = MetaList::New(Fabrik::MetaObj::String);
+        if (ruleset.IsAllowedAll()) {
+          addresses->Add(std::string("All"));
+        } else {
+          std::unique_ptr<HostCtl::System::FirewallAllowedIps> ips = ruleset.GetAllowedIps();
+          for (const auto& address : ips->ipv4Addresses)
+            addresses->Add(address.GetStringAddress());
+          for (const auto& address : ips->ipv6Addresses)
+            addresses->Add(address.GetStringAddress());
+          for (const auto& network : ips->ipv4Networks)
+            addresses->Add(network.GetStringAddress());
+          for (const auto& network : ips->ipv6Networks)
+            addresses->Add(network.GetStringAddress());
+        }
+        row->SetField(kAllowedIpsField, addresses);
+        list.Add(row);
+      });
 }
 
 // network firewall ruleset allowedip add

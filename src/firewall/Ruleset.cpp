@@ -10,6 +10,7 @@
 #include "HostCtl/Misc.h"
 #include "TvkCtl/System/SystemInfoImpl.h"
 #include "common/ParameterTable.h"
+#include "firewall/FirewallCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -116,31 +117,20 @@ std::shared_ptr<MetaStruct> FirewallRulesetList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListSpec(GetOutputStructure());
 }
 
 void FirewallRulesetList::ExecuteInternal(const std::shared_ptr<Input>& input,
                                           const std::shared_ptr<Output>& output) {
-  try {
-    SystemInfoImpl system;
-    auto result = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    std::vector<std::unique_ptr<FirewallRuleset>> rulesets;
-    if (!SelectFirewallRulesets(system, *input, *output, rulesets))
-      return;
-    for (const auto& ruleset : rulesets) {
-      auto row = GetOutputStructure();
-      row->SetField(kNameField, ruleset->GetRulesetId());
-      row->SetField(kEnabledField, ruleset->IsEnabled());
-      row->SetField(kEnableConfigurableField, !ruleset->IsEnableDisableFixed());
-      row->SetField(kAllowedIpConfigurableField, !ruleset->IsAllowedIpFixed());
-      result->Add(row);
-    }
-    output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListRulesets(*input, *output, GetOutputStructure(),
+               [&](MetaList& list, FirewallRuleset& ruleset) {
+                 auto row = GetOutputStructure();
+                 row->SetField(kNameField, ruleset.GetRulesetId());
+                 row->SetField(kEnabledField, ruleset.IsEnabled());
+                 row->SetField(kEnableConfigurableField, !ruleset.IsEnableDisableFixed());
+                 row->SetField(kAllowedIpConfigurableField, !ruleset.IsAllowedIpFixed());
+                 list.Add(row);
+               });
 }
 
 // network firewall ruleset set
@@ -237,36 +227,25 @@ std::shared_ptr<MetaStruct> FirewallRulesetRuleList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetRuleList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListSpec(GetOutputStructure());
 }
 
 void FirewallRulesetRuleList::ExecuteInternal(const std::shared_ptr<Input>& input,
                                               const std::shared_ptr<Output>& output) {
-  try {
-    SystemInfoImpl system;
-    auto result = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    std::vector<std::unique_ptr<FirewallRuleset>> rulesets;
-    if (!SelectFirewallRulesets(system, *input, *output, rulesets))
-      return;
-    for (const auto& ruleset : rulesets) {
-      std::string id = ruleset->GetRulesetId();
-      for (const auto& rule : ruleset->GetRules()) {
-        auto row = GetOutputStructure();
-        row->SetField(kRuleRulesetField, id);
-        row->SetField(kPortTypeField, rule->portType == 1 ? "Dst" : "Src");
-        row->SetField(kPortBeginField, static_cast<long>(rule->portBegin));
-        row->SetField(kPortEndField, static_cast<long>(rule->portEnd));
-        row->SetField(kDirectionField, rule->direction == 0 ? "Inbound" : "Outbound");
-        row->SetField(kProtocolField, rule->protocol == 0 ? "TCP" : "UDP");
-        result->Add(row);
-      }
-    }
-    output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListRulesets(*input, *output, GetOutputStructure(),
+               [&](MetaList& list, FirewallRuleset& ruleset) {
+                 std::string id = ruleset.GetRulesetId();
+                 for (const auto& rule : ruleset.GetRules()) {
+                   auto row = GetOutputStructure();
+                   row->SetField(kRuleRulesetField, id);
+                   row->SetField(kPortTypeField, rule->portType == 1 ? "Dst" : "Src");
+                   row->SetField(kPortBeginField, static_cast<long>(rule->portBegin));
+                   row->SetField(kPortEndField, static_cast<long>(rule->portEnd));
+                   row->SetField(kDirectionField, rule->direction == 0 ? "Inbound" : "Outbound");
+                   row->SetField(kProtocolField, rule->protocol == 0 ? "TCP" : "UDP");
+                   list.Add(row);
+                 }
+               });
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -300,39 +300,19 @@ std::shared_ptr<CallSpec::OutputSpec> IpInterfaceList::GetOutputSpecInternal() {
 void IpInterfaceList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
                                       const std::shared_ptr<CallSpec::Output>& output) {
   try {
-    auto list = MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure());
-    std::string netstack = input->HasParameter(kNetstack) ? input->GetParameter(kNetstack) : "";
-    int selector = 0;
-    if (input->HasParameter("type")) {
-      if (input->GetParameter("type") != "system") {
-        output->AddErrorMessage("Invalid type value, should be 'system'.");
-        return;
-      }
-      if (!netstack.empty() && netstack != kDefaultNetstack) {
-        output->AddErrorMessage("Invalid netstack value, should be 'defaultTcpipStack'.");
-        return;
-      }
-      selector = 1;
-    }
     TvkCtl::Network::TvKernelNicInfoImpl service;
-    auto nics = netstack.empty() ? service.GetTvKernelNics(selector)
-                                 : service.GetTvKernelNicsByInstanceKey(netstack, selector);
-    for (const auto& nic : nics) {
-      if (!nic)
-        continue;
-      auto row = GetOutputStructure();
-      row->SetField(kName, nic->GetInterfaceName());
-      row->SetField(kMacAddress, nic->GetMacAddress().GetStringAddress());
-      SetConnectionFields(*nic, *row, *output);
-      row->SetField(kMtu, static_cast<long>(nic->GetMtu()));
-      row->SetField(kTsoMss, static_cast<long>(nic->GetTsoMss()));
-      row->SetField(kRxDispQueueSize, static_cast<long>(nic->GetNumRxQueue()));
-      row->SetField(kEnabled, nic->IsEnabled());
-      if (auto port = nic->GetPort())
-        row->SetField(kPortId, static_cast<long>(port->GetId()));
-      list->Add(row);
-    }
-    output->SetRootObject(list);
+    ListTvkNics(
+        service, *input, *output, [this] { return GetOutputStructure(); },
+        [&](MetaObj::MetaStruct& row, HostCtl::Network::TvkNic& nic) {
+          row.SetField(kMacAddress, nic.GetMacAddress().GetStringAddress());
+          SetConnectionFields(nic, row, *output);
+          row.SetField(kMtu, static_cast<long>(nic.GetMtu()));
+          row.SetField(kTsoMss, static_cast<long>(nic.GetTsoMss()));
+          row.SetField(kRxDispQueueSize, static_cast<long>(nic.GetNumRxQueue()));
+          row.SetField(kEnabled, nic.IsEnabled());
+          if (auto port = nic.GetPort())
+            row.SetField(kPortId, static_cast<long>(port->GetId()));
+        });
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(e.what());
   }

@@ -9,6 +9,7 @@
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "ip/IpCommon.h"
 
 #include <initializer_list>
 #include <memory>
@@ -100,6 +101,28 @@ namespace CorvexCli::NetworkNamespace {
 bool SelectTvkNics(HostCtl::Network::TvKernelNicInfo& service, const Fabrik::CallSpec::Input& input,
                    Fabrik::CallSpec::Output& output,
                    std::vector<std::unique_ptr<HostCtl::Network::TvkNic>>& nics);
+
+/// The listing of the interfaces SelectTvkNics chooses: one row from
+/// \p newRow per interface, its "Name" field holding the interface name and
+/// its other fields set by \p fill(row, nic). Failures of the host reach the
+/// caller.
+template <typename NewRow, typename Fill>
+void ListTvkNics(HostCtl::Network::TvKernelNicInfo& service, const Fabrik::CallSpec::Input& input,
+                 Fabrik::CallSpec::Output& output, NewRow newRow, Fill fill) {
+  std::vector<std::unique_ptr<HostCtl::Network::TvkNic>> nics;
+  if (!SelectTvkNics(service, input, output, nics))
+    return;
+  auto list = Fabrik::MetaObj::MetaList::New(Fabrik::MetaObj::Struct, newRow());
+  for (const auto& nic : nics) {
+    if (!nic)
+      continue;
+    auto row = newRow();
+    row->SetField("Name", nic->GetInterfaceName());
+    fill(*row, *nic);
+    list->Add(row);
+  }
+  output.SetRootObject(list);
+}
 
 /// Message of a look-up by interface name that found nothing.
 inline const std::string kNoTarvikInterface = "Unable to find a Tarvik interface with the name ";

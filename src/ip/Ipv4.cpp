@@ -81,39 +81,31 @@ void IpInterfaceIpv4Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>&
                                          const std::shared_ptr<CallSpec::Output>& output) {
   try {
     TvkCtl::Network::RoutingInfoImpl routing(kDefaultNetstack);
-    auto list = MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure());
     TvkCtl::Network::TvKernelNicInfoImpl service;
-    std::vector<std::unique_ptr<TvkNic>> nics;
-    if (!SelectTvkNics(service, *input, *output, nics))
-      return;
-    for (const auto& nic : nics) {
-      if (!nic)
-        continue;
-      IpConfig config = nic->GetIpConfig();
-      auto row = GetOutputStructure();
-      row->SetField(kName, nic->GetInterfaceName());
-      row->SetField(kIpv4Address, config.GetIpv4Address().GetStringAddress());
-      row->SetField(kIpv4Netmask, config.GetIpv4Netmask().GetStringAddress());
-      row->SetField(kIpv4Broadcast, config.GetIpv4Broadcast().GetStringAddress());
-      Ipv4Address gateway = config.GetIpv4Gateway();
-      bool dhcpDns = false;
-      const char* type = "STATIC";
-      if (config.GetUseDhcp()) {
-        type = "DHCP";
-        dhcpDns = nic->GetConfiguredIpConfig().GetDhcpDns();
-      } else if (config.GetIpv4UseNone()) {
-        type = "NONE";
-      } else if (gateway == Ipv4Address(kAnyAddress)) {
-        routing.SetNetstackInstanceKey(nic->GetNetstackInstanceName());
-        routing.Refresh();
-        gateway = routing.GetTvKernelDefaultGateway();
-      }
-      row->SetField(kAddressType, type);
-      row->SetField(kGateway, gateway.GetStringAddress());
-      row->SetField(kDhcpDns, dhcpDns);
-      list->Add(row);
-    }
-    output->SetRootObject(list);
+    ListTvkNics(
+        service, *input, *output, [this] { return GetOutputStructure(); },
+        [&](MetaObj::MetaStruct& row, TvkNic& nic) {
+          IpConfig config = nic.GetIpConfig();
+          row.SetField(kIpv4Address, config.GetIpv4Address().GetStringAddress());
+          row.SetField(kIpv4Netmask, config.GetIpv4Netmask().GetStringAddress());
+          row.SetField(kIpv4Broadcast, config.GetIpv4Broadcast().GetStringAddress());
+          Ipv4Address gateway = config.GetIpv4Gateway();
+          bool dhcpDns = false;
+          const char* type = "STATIC";
+          if (config.GetUseDhcp()) {
+            type = "DHCP";
+            dhcpDns = nic.GetConfiguredIpConfig().GetDhcpDns();
+          } else if (config.GetIpv4UseNone()) {
+            type = "NONE";
+          } else if (gateway == Ipv4Address(kAnyAddress)) {
+            routing.SetNetstackInstanceKey(nic.GetNetstackInstanceName());
+            routing.Refresh();
+            gateway = routing.GetTvKernelDefaultGateway();
+          }
+          row.SetField(kAddressType, type);
+          row.SetField(kGateway, gateway.GetStringAddress());
+          row.SetField(kDhcpDns, dhcpDns);
+        });
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(std::string("Error getting IPv4 configuration. ") +
                             ". Error was : " + e.what());

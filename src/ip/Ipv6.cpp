@@ -39,13 +39,8 @@ const std::string kStatus = "Status";
 
 const std::string kInterfaceName = "interface-name";
 const std::string kNetstackParam = "netstack";
-const std::string kTypeParam = "type";
 const std::string kIpv6Param = "ipv6";
-const std::string kSystem = "system";
-const std::string kDefaultNetstack = "defaultTcpipStack";
 
-const std::string kInvalidType = "Invalid type value, should be 'system'.";
-const std::string kInvalidNetstack = "Invalid netstack value, should be 'defaultTcpipStack'.";
 const std::string kErrorWas = ". Error was : ";
 const std::string kBadIpv6Format = "Invalid format for IPv6 address. Address must be in the format "
                                    "<ipv6-address>/<prefix-length>   Example: 1:2:3:4::/64";
@@ -124,18 +119,9 @@ bool SelectTvkNics(HostCtl::Network::TvKernelNicInfo& service, const CallSpec::I
   std::string name = input.HasParameter(kInterfaceName) ? input.GetParameter(kInterfaceName) : "";
   std::string netstack =
       input.HasParameter(kNetstackParam) ? input.GetParameter(kNetstackParam) : "";
-  int selector = 0;
-  if (input.HasParameter(kTypeParam)) {
-    if (input.GetParameter(kTypeParam) != kSystem) {
-      output.AddErrorMessage(kInvalidType);
-      return false;
-    }
-    if (!netstack.empty() && netstack != kDefaultNetstack) {
-      output.AddErrorMessage(kInvalidNetstack);
-      return false;
-    }
-    selector = 1;
-  }
+  HostCtl::Network::PortsetGetType selector;
+  if (!ReadListType(input, output, selector))
+    return false;
   nics.clear();
   if (!name.empty()) {
     auto nic = service.GetTvKernelNicByInterface(name, false, selector);
@@ -194,25 +180,17 @@ void IpInterfaceIpv6Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>&
                                          const std::shared_ptr<CallSpec::Output>& output) {
   try {
     TvkCtl::Network::TvKernelNicInfoImpl service;
-    std::vector<std::unique_ptr<TvkNic>> nics;
-    if (!SelectTvkNics(service, *input, *output, nics))
-      return;
-    auto list = MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure());
-    for (const auto& nic : nics) {
-      if (!nic)
-        continue;
-      IpConfig config = nic->GetIpConfig();
-      auto row = GetOutputStructure();
-      row->SetField(kName, nic->GetInterfaceName());
-      row->SetField(kIpv6Enabled, config.GetUseIpv6());
-      row->SetField(kDhcpv6Enabled, config.GetUseIpv6Dhcp());
-      row->SetField(kRouterAdvEnabled, config.GetUseIpv6RouterAdvertised());
-      row->SetField(kGateway, config.GetIpv6Gateway().GetStringAddress());
-      row->SetField(kDhcpDns,
-                    LearnsIpv6(config) ? nic->GetConfiguredIpConfig().GetIpv6DhcpDns() : false);
-      list->Add(row);
-    }
-    output->SetRootObject(list);
+    ListTvkNics(
+        service, *input, *output, [this] { return GetOutputStructure(); },
+        [](MetaObj::MetaStruct& row, TvkNic& nic) {
+          IpConfig config = nic.GetIpConfig();
+          row.SetField(kIpv6Enabled, config.GetUseIpv6());
+          row.SetField(kDhcpv6Enabled, config.GetUseIpv6Dhcp());
+          row.SetField(kRouterAdvEnabled, config.GetUseIpv6RouterAdvertised());
+          row.SetField(kGateway, config.GetIpv6Gateway().GetStringAddress());
+          row.SetField(kDhcpDns,
+                       LearnsIpv6(config) ? nic.GetConfiguredIpConfig().GetIpv6DhcpDns() : false);
+        });
   } catch (const HostCtlException& e) {
     output->AddErrorMessage(std::string("Error getting IPv6 configuration. ") + kErrorWas +
                             e.what());
@@ -342,14 +320,10 @@ std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressList::GetOutputSpecI
 void IpInterfaceIpv6AddressList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
                                                  const std::shared_ptr<CallSpec::Output>& output) {
   try {
-    int selector = 0;
-    if (input->HasParameter(kTypeParam)) {
-      if (input->GetParameter(kTypeParam) != kSystem) {
-        output->AddErrorMessage(kInvalidType);
-        return;
-      }
-      selector = 1;
-    }
+    // This listing has no netstack parameter.
+    HostCtl::Network::PortsetGetType selector;
+    if (!ReadListType(*input, *output, selector, false))
+      return;
     TvkCtl::Network::TvKernelNicInfoImpl service;
     std::vector<std::unique_ptr<TvkNic>> nics;
     if (input->HasParameter(kInterfaceName)) {

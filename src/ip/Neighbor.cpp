@@ -145,18 +145,9 @@ void IpNeighborList::ExecuteInternal(const std::shared_ptr<Input>& input,
   std::string version = input->HasParameter("version") ? input->GetParameter("version") : "all";
   RoutingInfoImpl routing(kDefaultNetstack);
   routing.SetNetstackInstanceKey(NetstackParameter(*input));
-  HostCtl::Network::PortsetGetType selector = HostCtl::Network::PortsetGetRegular;
-  if (input->HasParameter("type")) {
-    if (input->GetParameter("type") != "system") {
-      output->AddErrorMessage("Invalid type value, should be 'system'.");
-      return;
-    }
-    if (routing.GetNetstackInstanceKey() != kDefaultNetstack) {
-      output->AddErrorMessage("Invalid netstack value, should be 'defaultTcpipStack'.");
-      return;
-    }
-    selector = HostCtl::Network::PortsetGetSystem;
-  }
+  HostCtl::Network::PortsetGetType selector;
+  if (!ReadListType(*input, *output, selector))
+    return;
   std::string interfaceName =
       input->HasParameter("interface-name") ? input->GetParameter("interface-name") : "";
   if (!interfaceName.empty()) {

@@ -9,6 +9,7 @@
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "ip/IpCommon.h"
 
 #include <memory>
 #include <string>
@@ -82,14 +83,6 @@ MakeOutputSpec(Fabrik::MetaObj::MetaObjectPtr root) {
   auto spec = Fabrik::CallSpec::OutputSpec::New();
   spec->SetRootObject(std::move(root));
   return spec;
-}
-
-/// The netstack a command works on: the "netstack" parameter when it is given
-/// and not empty, else the default instance.
-inline std::string NetstackParameter(const Fabrik::CallSpec::Input& input) {
-  if (input.HasParameter("netstack") && !input.GetParameter("netstack").empty())
-    return input.GetParameter("netstack");
-  return "defaultTcpipStack";
 }
 
 /// The description of the "netstack" parameter.

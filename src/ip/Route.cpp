@@ -54,6 +54,19 @@ struct Ipv4Family {
   static void ClearDefaultGateway(RoutingInfoImpl& routing) {
     routing.SetTvKernelDefaultGateway(Address("0.0.0.0"), false);
   }
+  using Route = HostCtl::Network::Ipv4Route;
+  static std::vector<Route> Routes(RoutingInfoImpl& routing,
+                                   HostCtl::Network::PortsetGetType selector) {
+    return routing.GetCurrentTarvikRoutes(selector);
+  }
+  /// "Network" and "Netmask" of a route, and the "Source" the IPv4 list adds.
+  static void SetRouteFields(MetaStruct& row, const Route& route, RoutingInfoImpl& routing) {
+    const Network& network = route.GetNetwork();
+    row.SetField(kNetwork, network == DefaultNetwork() ? kDefaultNetwork
+                                                       : network.GetNetwork().GetStringAddress());
+    row.SetField(kNetmask, network.GetNetmask().GetStringAddress());
+    row.SetField(kSource, routing.GetDefaultGatewaySource(network));
+  }
 };
 
 struct Ipv6Family {
@@ -76,6 +89,18 @@ struct Ipv6Family {
   }
   static void ClearDefaultGateway(RoutingInfoImpl& routing) {
     routing.SetIpv6TvKernelDefaultGateway(Address());
+  }
+  using Route = HostCtl::Network::Ipv6Route;
+  static std::vector<Route> Routes(RoutingInfoImpl& routing,
+                                   HostCtl::Network::PortsetGetType selector) {
+    return routing.GetCurrentIpv6TarvikRoutes(selector);
+  }
+  /// "Network" and "Netmask" of a route; the netmask is shown as an address.
+  static void SetRouteFields(MetaStruct& row, const Route& route, RoutingInfoImpl& /*routing*/) {
+    const Network& network = route.GetNetwork();
+    row.SetField(kNetwork, network == DefaultNetwork() ? kDefaultNetwork
+                                                       : network.GetAddress().GetStringAddress());
+    row.SetField(kNetmask, Network::NetmaskFromNumber(network.GetNetmask()).GetStringAddress());
   }
 };
 
@@ -155,34 +180,33 @@ template <typename Family> void ExecuteRemove(const Input& input, Output& output
   }
 }
 
-/// Checks the "type" parameter of a listing and gives the selector; false
-/// (with the error added) when the listing must stop.
-bool ListSelector(const Input& input, const RoutingInfoImpl& routing, Output& output,
-                  HostCtl::Network::PortsetGetType& selector) {
-  selector = HostCtl::Network::PortsetGetRegular;
-  if (!input.HasParameter("type"))
-    return true;
-  if (input.GetParameter("type") != "system") {
-    output.AddErrorMessage("Invalid type value, should be 'system'.");
-    return false;
+/// Lists the routes of the command's netstack, one row of \p command's
+/// structure each.
+template <typename Family, typename Command>
+void ExecuteList(Command& command, const Input& input, Output& output) {
+  try {
+    RoutingInfoImpl routing = OpenRouting(input);
+    HostCtl::Network::PortsetGetType selector;
+    if (!ReadListType(input, output, selector))
+      return;
+    std::vector<typename Family::Route> routes = Family::Routes(routing, selector);
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, command.GetOutputStructure());
+    list->Reserve(routes.size());
+    // Every field of a row is set, so a row starts as a shallow copy of one
+    // structure (its fields in order, in one allocation) rather than as a
+    // fresh template: a listing may hold hundreds of thousands of rows.
+    const std::shared_ptr<MetaStruct> shape = command.GetOutputStructure();
+    for (const typename Family::Route& route : routes) {
+      auto row = std::make_shared<MetaStruct>(*shape);
+      Family::SetRouteFields(*row, route, routing);
+      row->SetField(kGateway, route.GetGateway().GetStringAddress());
+      row->SetField(kInterface, route.GetInterfaceName());
+      list->Add(std::move(row));
+    }
+    output.SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
   }
-  if (routing.GetNetstackInstanceKey() != kDefaultNetstack) {
-    output.AddErrorMessage("Invalid netstack value, should be 'defaultTcpipStack'.");
-    return false;
-  }
-  selector = HostCtl::Network::PortsetGetSystem;
-  return true;
-}
-
-/// The "Network" text of a route.
-template <typename Family> std::string NetworkText(const typename Family::Network& network);
-template <> std::string NetworkText<Ipv4Family>(const Ipv4Family::Network& network) {
-  return network == Ipv4Family::DefaultNetwork() ? kDefaultNetwork
-                                                 : network.GetNetwork().GetStringAddress();
-}
-template <> std::string NetworkText<Ipv6Family>(const Ipv6Family::Network& network) {
-  return network == Ipv6Family::DefaultNetwork() ? kDefaultNetwork
-                                                 : network.GetAddress().GetStringAddress();
 }
 
 } // namespace
@@ -265,31 +289,7 @@ std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
 
 void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
                                       const std::shared_ptr<Output>& output) {
-  try {
-    RoutingInfoImpl routing = OpenRouting(*input);
-    HostCtl::Network::PortsetGetType selector;
-    if (!ListSelector(*input, routing, *output, selector))
-      return;
-    std::vector<HostCtl::Network::Ipv4Route> routes = routing.GetCurrentTarvikRoutes(selector);
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    list->Reserve(routes.size());
-    // Every field of a row is set, so a row starts as a shallow copy of one
-    // structure (its fields in order, in one allocation) rather than as a
-    // fresh template: a listing may hold hundreds of thousands of rows.
-    const std::shared_ptr<MetaStruct> shape = GetOutputStructure();
-    for (const HostCtl::Network::Ipv4Route& route : routes) {
-      auto row = std::make_shared<MetaStruct>(*shape);
-      row->SetField(kNetwork, MetaString::New(NetworkText<Ipv4Family>(route.GetNetwork())));
-      row->SetField(kNetmask, MetaString::New(route.GetNetwork().GetNetmask().GetStringAddress()));
-      row->SetField(kGateway, MetaString::New(route.GetGateway().GetStringAddress()));
-      row->SetField(kInterface, MetaString::New(route.GetInterfaceName()));
-      row->SetField(kSource, MetaString::New(routing.GetDefaultGatewaySource(route.GetNetwork())));
-      list->Add(std::move(row));
-    }
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ExecuteList<Ipv4Family>(*this, *input, *output);
 }
 
 // network ip route ipv6 add
@@ -369,28 +369,7 @@ std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {
 
 void IpRouteIpv6List::ExecuteInternal(const std::shared_ptr<Input>& input,
                                       const std::shared_ptr<Output>& output) {
-  try {
-    RoutingInfoImpl routing = OpenRouting(*input);
-    HostCtl::Network::PortsetGetType selector;
-    if (!ListSelector(*input, routing, *output, selector))
-      return;
-    std::vector<HostCtl::Network::Ipv6Route> routes = routing.GetCurrentIpv6TarvikRoutes(selector);
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    list->Reserve(routes.size());
-    for (const HostCtl::Network::Ipv6Route& route : routes) {
-      auto row = GetOutputStructure();
-      row->SetField(kNetmask, HostCtl::Network::Ipv6Network::NetmaskFromNumber(
-                                  route.GetNetwork().GetNetmask())
-                                  .GetStringAddress());
-      row->SetField(kInterface, route.GetInterfaceName());
-      row->SetField(kNetwork, NetworkText<Ipv6Family>(route.GetNetwork()));
-      row->SetField(kGateway, route.GetGateway().GetStringAddress());
-      list->Add(row);
-    }
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ExecuteList<Ipv6Family>(*this, *input, *output);
 }
 
 } // namespace CorvexCli::NetworkNamespace

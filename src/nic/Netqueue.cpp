@@ -14,6 +14,7 @@
 #include "nic/HwCommon.h"
 
 #include <algorithm>
+#include <functional>
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -223,6 +224,63 @@ template <typename AddRow> void ForEachNetqueueQuietly(NetworkInfo& info, AddRow
   }
 }
 
+/// Runs a list of the count, plugin or state kind: a list of \p rowShape
+/// holding the rows \p addRows adds for each NIC that ForEachNetqueue visits,
+/// or no result when that fails.
+template <typename AddRows>
+void ListNetqueues(const Input& input, Output& output, NicHw::NotFoundText notFound,
+                   const std::shared_ptr<MetaStruct>& rowShape, AddRows addRows) {
+  try {
+    std::unique_ptr<NetworkInfo> info = Root();
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, rowShape);
+    if (ForEachNetqueue(
+            *info, input, notFound, output,
+            [&](Pnic& nic, const PnicNetqueueInfo& record) { addRows(*list, nic, record); }))
+      output.SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
+  }
+}
+
+/// Runs a list over every NIC that leaves unreadable NICs out: one row from
+/// \p newRow per readable NIC, holding its name and the values \p fillRow sets.
+template <typename FillRow>
+void ListEveryNetqueue(Output& output, const std::function<std::shared_ptr<MetaStruct>()>& newRow,
+                       FillRow fillRow) {
+  try {
+    std::unique_ptr<NetworkInfo> info = Root();
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, newRow());
+    ForEachNetqueueQuietly(*info, [&](Pnic& nic, const PnicNetqueueInfo& record) {
+      auto row = newRow();
+      row->SetField(kNic, nic.GetName());
+      fillRow(*row, record);
+      list->Add(row);
+    });
+    output.SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
+  }
+}
+
+/// Runs a set: \p fill writes the selections into a zeroed record, which is
+/// sent to the NIC `vmnic` names unless \p fill gives false (nothing
+/// selected); the result is true either way.
+template <typename Fill>
+void SetNetqueue(const Input& input, Output& output, NicHw::NotFoundText notFound, Fill fill) {
+  try {
+    std::unique_ptr<NetworkInfo> info = Root();
+    std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, input, kVmnic, notFound, output);
+    if (!nic)
+      return;
+    PnicNetqueueInfo record{};
+    if (fill(record))
+      nic->SetNetqueueInfo(record);
+    output.SetRootObject(MetaBool::New(true));
+  } catch (const HostCtlException& e) {
+    output.AddErrorMessage(e.what());
+  }
+}
+
 } // namespace
 
 /// The two-letter cell of load-balancer setting \p index.
@@ -261,22 +319,14 @@ std::shared_ptr<OutputSpec> NicQueueCountGet::GetOutputSpecInternal() {
 
 void NicQueueCountGet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                        const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    bool ok = ForEachNetqueue(*info, *input, NicHw::PnicNotFound, *output,
-                              [&](Pnic& nic, const PnicNetqueueInfo& record) {
-                                auto row = GetOutputStructure();
-                                row->SetField(kNic, nic.GetName());
-                                row->SetField(kTxCount, static_cast<long>(record.txQueueCount));
-                                row->SetField(kRxCount, static_cast<long>(record.rxQueueCount));
-                                list->Add(row);
-                              });
-    if (ok)
-      output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListNetqueues(*input, *output, NicHw::PnicNotFound, GetOutputStructure(),
+                [&](MetaList& list, Pnic& nic, const PnicNetqueueInfo& record) {
+                  auto row = GetOutputStructure();
+                  row->SetField(kNic, nic.GetName());
+                  row->SetField(kTxCount, static_cast<long>(record.txQueueCount));
+                  row->SetField(kRxCount, static_cast<long>(record.rxQueueCount));
+                  list.Add(row);
+                });
 }
 
 // network nic queue count set
@@ -299,12 +349,7 @@ std::shared_ptr<OutputSpec> NicQueueCountSet::GetOutputSpecInternal() {
 
 void NicQueueCountSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                        const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, *input, kVmnic, NicHw::PnicNotFound, *output);
-    if (!nic)
-      return;
-    PnicNetqueueInfo record{};
+  SetNetqueue(*input, *output, NicHw::PnicNotFound, [&](PnicNetqueueInfo& record) {
     uint32_t count = static_cast<uint32_t>(input->GetParameterInt(kNum));
     if (input->HasParameter(kTx)) {
       record.txQueueCount = count;
@@ -314,12 +359,8 @@ void NicQueueCountSet::ExecuteInternal(const std::shared_ptr<Input>& input,
       record.rxQueueCount = count;
       record.rxCountSelected = true;
     }
-    if (record.txCountSelected || record.rxCountSelected)
-      nic->SetNetqueueInfo(record);
-    output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+    return record.txCountSelected || record.rxCountSelected;
+  });
 }
 
 // network nic queue filterclass list
@@ -354,20 +395,12 @@ std::shared_ptr<OutputSpec> NicQueueFilterClassList::GetOutputSpecInternal() {
 
 void NicQueueFilterClassList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
                                               const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    ForEachNetqueueQuietly(*info, [&](Pnic& nic, const PnicNetqueueInfo& record) {
-      auto row = GetOutputStructure();
-      row->SetField(kNic, nic.GetName());
-      for (std::size_t i = 0; i < kNetqueueFilterClassCount; ++i)
-        row->SetField(*kFilterClassFields[i], record.filterClasses[i]);
-      list->Add(row);
-    });
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListEveryNetqueue(
+      *output, [this] { return GetOutputStructure(); },
+      [](MetaStruct& row, const PnicNetqueueInfo& record) {
+        for (std::size_t i = 0; i < kNetqueueFilterClassCount; ++i)
+          row.SetField(*kFilterClassFields[i], record.filterClasses[i]);
+      });
 }
 
 // network nic queue loadbalancer list
@@ -404,21 +437,13 @@ std::shared_ptr<OutputSpec> NicQueueLbSettingList::GetOutputSpecInternal() {
 
 void NicQueueLbSettingList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
                                             const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    ForEachNetqueueQuietly(*info, [&](Pnic& nic, const PnicNetqueueInfo& record) {
-      auto row = GetOutputStructure();
-      row->SetField(kNic, nic.GetName());
-      for (std::size_t i = 0; i < kNetqueueSettingCount; ++i)
-        row->SetField(kLbSettings[i].column, NetqueueLbSettingCell(i, record.settingSupported[i],
-                                                                   record.settingAllowed[i]));
-      list->Add(row);
-    });
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListEveryNetqueue(
+      *output, [this] { return GetOutputStructure(); },
+      [](MetaStruct& row, const PnicNetqueueInfo& record) {
+        for (std::size_t i = 0; i < kNetqueueSettingCount; ++i)
+          row.SetField(kLbSettings[i].column, NetqueueLbSettingCell(i, record.settingSupported[i],
+                                                                    record.settingAllowed[i]));
+      });
 }
 
 // network nic queue loadbalancer set
@@ -444,12 +469,7 @@ std::shared_ptr<OutputSpec> NicQueueLbSettingSet::GetOutputSpecInternal() {
 
 void NicQueueLbSettingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                            const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, *input, kVmnic, NicHw::PnicNotFound, *output);
-    if (!nic)
-      return;
-    PnicNetqueueInfo record{};
+  SetNetqueue(*input, *output, NicHw::PnicNotFound, [&](PnicNetqueueInfo& record) {
     for (std::size_t i = 0; i < kNetqueueSettingCount; ++i) {
       const std::string& param = kLbSettings[i].param.name;
       if (!input->HasParameter(param))
@@ -457,12 +477,8 @@ void NicQueueLbSettingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
       record.settingAllowed[i] = input->GetParameterBool(param);
       record.settingMask |= 1u << i;
     }
-    if (record.settingMask != 0)
-      nic->SetNetqueueInfo(record);
-    output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+    return record.settingMask != 0;
+  });
 }
 
 // network nic queue loadbalancer state list
@@ -495,21 +511,13 @@ std::shared_ptr<OutputSpec> NicQueueLbStateList::GetOutputSpecInternal() {
 
 void NicQueueLbStateList::ExecuteInternal(const std::shared_ptr<Input>& input,
                                           const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    bool ok = ForEachNetqueue(*info, *input, InvalidPnic, *output,
-                              [&](Pnic& nic, const PnicNetqueueInfo& record) {
-                                auto row = GetOutputStructure();
-                                row->SetField(kNic, nic.GetName());
-                                row->SetField(kEnabled, record.balancerEnabled);
-                                list->Add(row);
-                              });
-    if (ok)
-      output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListNetqueues(*input, *output, InvalidPnic, GetOutputStructure(),
+                [&](MetaList& list, Pnic& nic, const PnicNetqueueInfo& record) {
+                  auto row = GetOutputStructure();
+                  row->SetField(kNic, nic.GetName());
+                  row->SetField(kEnabled, record.balancerEnabled);
+                  list.Add(row);
+                });
 }
 
 // network nic queue loadbalancer state set
@@ -532,19 +540,11 @@ std::shared_ptr<OutputSpec> NicQueueLbStateSet::GetOutputSpecInternal() {
 
 void NicQueueLbStateSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                          const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, *input, kVmnic, InvalidPnic, *output);
-    if (!nic)
-      return;
-    PnicNetqueueInfo record{};
+  SetNetqueue(*input, *output, InvalidPnic, [&](PnicNetqueueInfo& record) {
     record.balancerEnabled = input->GetParameterBool(kEnable);
     record.balancerStateSelected = true;
-    nic->SetNetqueueInfo(record);
-    output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+    return true;
+  });
 }
 
 // network nic queue loadbalancer plugin list
@@ -583,31 +583,24 @@ std::shared_ptr<OutputSpec> NicQueueLbPluginList::GetOutputSpecInternal() {
 
 void NicQueueLbPluginList::ExecuteInternal(const std::shared_ptr<Input>& input,
                                            const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    bool ok = ForEachNetqueue(
-        *info, *input, InvalidPnic, *output, [&](Pnic& nic, const PnicNetqueueInfo& record) {
-          for (const PnicNetqueuePluginInfo& plugin : record.plugins) {
-            bool enabled = std::any_of(record.changedPlugins.begin(), record.changedPlugins.end(),
-                                       [&](const PnicNetqueuePluginInfo& on) {
-                                         return on.moduleName == plugin.moduleName &&
-                                                on.pluginName == plugin.pluginName;
-                                       });
-            auto row = GetOutputStructure();
-            row->SetField(kNic, nic.GetName());
-            row->SetField(kModuleName, plugin.moduleName);
-            row->SetField(kPluginName, plugin.pluginName);
-            row->SetField(kEnabled, enabled);
-            row->SetField(kDescription, plugin.description);
-            list->Add(row);
-          }
-        });
-    if (ok)
-      output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListNetqueues(*input, *output, InvalidPnic, GetOutputStructure(),
+                [&](MetaList& list, Pnic& nic, const PnicNetqueueInfo& record) {
+                  for (const PnicNetqueuePluginInfo& plugin : record.plugins) {
+                    bool enabled =
+                        std::any_of(record.changedPlugins.begin(), record.changedPlugins.end(),
+                                    [&](const PnicNetqueuePluginInfo& on) {
+                                      return on.moduleName == plugin.moduleName &&
+                                             on.pluginName == plugin.pluginName;
+                                    });
+                    auto row = GetOutputStructure();
+                    row->SetField(kNic, nic.GetName());
+                    row->SetField(kModuleName, plugin.moduleName);
+                    row->SetField(kPluginName, plugin.pluginName);
+                    row->SetField(kEnabled, enabled);
+                    row->SetField(kDescription, plugin.description);
+                    list.Add(row);
+                  }
+                });
 }
 
 // network nic queue loadbalancer plugin set
@@ -630,21 +623,13 @@ std::shared_ptr<OutputSpec> NicQueueLbPluginSet::GetOutputSpecInternal() {
 
 void NicQueueLbPluginSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                           const std::shared_ptr<Output>& output) {
-  try {
-    std::unique_ptr<NetworkInfo> info = Root();
-    std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, *input, kVmnic, InvalidPnic, *output);
-    if (!nic)
-      return;
-    PnicNetqueueInfo record{};
+  SetNetqueue(*input, *output, InvalidPnic, [&](PnicNetqueueInfo& record) {
     record.changedPlugins.push_back(
         {input->GetParameter(kModule), input->GetParameter(kPlugin), std::string()});
     record.pluginStateSelected = true;
     record.pluginEnabled = input->GetParameterBool(kEnable);
-    nic->SetNetqueueInfo(record);
-    output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+    return true;
+  });
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -123,13 +123,6 @@ template <std::size_t N> std::string FieldText(const char (&field)[N]) {
   return std::string(field, strnlen(field, N));
 }
 
-std::string JoinFields(const std::vector<std::string>& fields) {
-  std::string joined;
-  for (const std::string& field : fields)
-    joined += (joined.empty() ? "" : ",") + field;
-  return joined;
-}
-
 std::shared_ptr<InputSpec> DvsSpec() {
   auto spec = InputSpec::New();
   AddParameterTable(spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,
@@ -160,6 +153,30 @@ bool SelectSwitches(const std::shared_ptr<Input>& input, const std::shared_ptr<O
     return false;
   }
   return true;
+}
+
+/// Runs a LACP list over the switches SelectSwitches picks: \p addRows(list,
+/// dvs) adds the rows of each switch, then \p refusal(list) gives the error
+/// that stands instead of the result, or "" for none.
+template <typename AddRows, typename Refusal>
+void ListLacp(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
+              const std::shared_ptr<MetaStruct>& rowShape, AddRows addRows, Refusal refusal) {
+  try {
+    std::vector<std::unique_ptr<DVSwitch>> switches;
+    if (!SelectSwitches(input, output, switches))
+      return;
+    auto list = MetaList::New(Fabrik::MetaObj::Struct, rowShape);
+    for (const auto& dvs : switches)
+      addRows(*list, *dvs);
+    std::string message = refusal(*list);
+    if (!message.empty()) {
+      output->AddErrorMessage(message);
+      return;
+    }
+    output->SetRootObject(list);
+  } catch (const HostCtlException& e) {
+    output->AddErrorMessage(e.what());
+  }
 }
 
 std::shared_ptr<MetaStruct> LocalInfoStructure() {
@@ -280,68 +297,60 @@ std::shared_ptr<OutputSpec> LacpGetConfig::GetOutputSpecInternal() {
 
 void LacpGetConfig::ExecuteInternal(const std::shared_ptr<Input>& input,
                                     const std::shared_ptr<Output>& output) {
-  try {
-    std::vector<std::unique_ptr<DVSwitch>> switches;
-    if (!SelectSwitches(input, output, switches))
-      return;
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    for (const auto& dvs : switches) {
-      std::string displayName = dvs->GetDisplayName();
-      std::map<std::string, DVPortParam> uplinkMap = dvs->GetUplinkPortMap();
-      if (uplinkMap.empty()) {
-        // LACP may be set on the uplink port group: one row per group key.
-        std::map<std::string, DVUplinkPortLacp> byGroup;
-        for (const DVUplinkPortLacp& port : dvs->GetUplinkPortLacp())
-          if (port.lacpEnabled)
-            byGroup.emplace(port.uplinkPortgroupKey, port);
-        for (const auto& [key, port] : byGroup) {
+  ListLacp(
+      input, output, GetOutputStructure(),
+      [&](MetaList& list, DVSwitch& dvs) {
+        std::string displayName = dvs.GetDisplayName();
+        std::map<std::string, DVPortParam> uplinkMap = dvs.GetUplinkPortMap();
+        if (uplinkMap.empty()) {
+          // LACP may be set on the uplink port group: one row per group key.
+          std::map<std::string, DVUplinkPortLacp> byGroup;
+          for (const DVUplinkPortLacp& port : dvs.GetUplinkPortLacp())
+            if (port.lacpEnabled)
+              byGroup.emplace(port.uplinkPortgroupKey, port);
+          for (const auto& [key, port] : byGroup) {
+            auto row = GetOutputStructure();
+            row->SetField(kFieldDvsName, displayName);
+            row->SetField(kFieldLagName, kDefaultLagName);
+            row->SetField(kFieldLagId, "0");
+            row->SetField(kFieldEnabled, port.lacpEnabled);
+            row->SetField(kFieldMode, port.lacpEnabled ? ModeName(port.mode) : std::string());
+            row->SetField(kFieldLoadBalance, "---");
+            list.Add(row);
+          }
+          return;
+        }
+        // The name of each uplink's port, in NIC-name order.
+        std::vector<std::pair<std::string, std::string>> portNames;
+        for (const auto& [nic, param] : uplinkMap) {
+          std::unique_ptr<DVPort> port = NetworkFactory::GetDVPort(param);
+          portNames.emplace_back(nic, port ? port->GetName() : std::string());
+        }
+        for (const LagConfig& lag : dvs.GetLagConfigs()) {
+          std::string lagName = FieldText(lag.lagName);
+          std::string nics;
+          for (uint32_t i = 0; i < lag.uplinkCount; ++i) {
+            std::string portName = lagName + "-" + std::to_string(i);
+            for (const auto& [nic, name] : portNames)
+              if (name == portName) {
+                nics += (nics.empty() ? "" : ",") + nic;
+                break;
+              }
+          }
           auto row = GetOutputStructure();
           row->SetField(kFieldDvsName, displayName);
-          row->SetField(kFieldLagName, kDefaultLagName);
-          row->SetField(kFieldLagId, "0");
-          row->SetField(kFieldEnabled, port.lacpEnabled);
-          row->SetField(kFieldMode, port.lacpEnabled ? ModeName(port.mode) : std::string());
-          row->SetField(kFieldLoadBalance, "---");
-          list->Add(row);
+          row->SetField(kFieldLagName, lagName);
+          row->SetField(kFieldLagId, FieldText(lag.lagId));
+          row->SetField(kFieldNics, nics);
+          row->SetField(kFieldEnabled, true);
+          row->SetField(kFieldMode, ModeName(lag.mode));
+          row->SetField(kFieldLoadBalance, LacpLoadBalanceToString(lag.loadBalancing));
+          list.Add(row);
         }
-        continue;
-      }
-      // The name of each uplink's port, in NIC-name order.
-      std::vector<std::pair<std::string, std::string>> portNames;
-      for (const auto& [nic, param] : uplinkMap) {
-        std::unique_ptr<DVPort> port = NetworkFactory::GetDVPort(param);
-        portNames.emplace_back(nic, port ? port->GetName() : std::string());
-      }
-      for (const LagConfig& lag : dvs->GetLagConfigs()) {
-        std::string lagName = FieldText(lag.lagName);
-        std::string nics;
-        for (uint32_t i = 0; i < lag.uplinkCount; ++i) {
-          std::string portName = lagName + "-" + std::to_string(i);
-          for (const auto& [nic, name] : portNames)
-            if (name == portName) {
-              nics += (nics.empty() ? "" : ",") + nic;
-              break;
-            }
-        }
-        auto row = GetOutputStructure();
-        row->SetField(kFieldDvsName, displayName);
-        row->SetField(kFieldLagName, lagName);
-        row->SetField(kFieldLagId, FieldText(lag.lagId));
-        row->SetField(kFieldNics, nics);
-        row->SetField(kFieldEnabled, true);
-        row->SetField(kFieldMode, ModeName(lag.mode));
-        row->SetField(kFieldLoadBalance, LacpLoadBalanceToString(lag.loadBalancing));
-        list->Add(row);
-      }
-    }
-    if (list->GetCount() == 0) {
-      output->AddErrorMessage("LACP is disabled on DVSwitch.");
-      return;
-    }
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+      },
+      [](const MetaList& list) {
+        return list.GetCount() == 0 ? std::string("LACP is disabled on DVSwitch.") : std::string();
+      });
 }
 
 // network vswitch dvs corvex lacp status get
@@ -393,40 +402,30 @@ std::shared_ptr<OutputSpec> LacpGetStatus::GetOutputSpecInternal() {
 
 void LacpGetStatus::ExecuteInternal(const std::shared_ptr<Input>& input,
                                     const std::shared_ptr<Output>& output) {
-  try {
-    std::vector<std::unique_ptr<DVSwitch>> switches;
-    if (!SelectSwitches(input, output, switches))
-      return;
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    for (const auto& dvs : switches) {
-      std::vector<LacpLagInfo> lags;
-      dvs->GetLacpInfo(lags);
-      if (lags.empty())
-        continue;
-      std::string displayName = dvs->GetDisplayName();
-      bool onDpu = dvs->IsLacpOnDpu();
-      for (const LacpLagInfo& lag : lags) {
-        auto row = GetOutputStructure();
-        row->SetField(kFieldDVSwitch, displayName);
-        row->SetField(kFieldLagId, static_cast<long>(lag.lagId));
-        row->SetField(kFieldMode, lag.mode == 2 ? "Passive" : "Active");
-        row->SetField(kFieldFlags, kFlagLegend);
-        auto nics = MetaList::New(Fabrik::MetaObj::Struct, NicStatusStructure());
-        for (const auto& nic : lag.nics)
-          if (nic)
-            nics->Add(NicStatusOf(*nic, onDpu));
-        row->SetField(kFieldNicList, nics);
-        list->Add(row);
-      }
-    }
-    if (list->GetCount() == 0) {
-      output->AddErrorMessage(kNoRunningLag);
-      return;
-    }
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  ListLacp(
+      input, output, GetOutputStructure(),
+      [&](MetaList& list, DVSwitch& dvs) {
+        std::vector<LacpLagInfo> lags;
+        dvs.GetLacpInfo(lags);
+        if (lags.empty())
+          return;
+        std::string displayName = dvs.GetDisplayName();
+        bool onDpu = dvs.IsLacpOnDpu();
+        for (const LacpLagInfo& lag : lags) {
+          auto row = GetOutputStructure();
+          row->SetField(kFieldDVSwitch, displayName);
+          row->SetField(kFieldLagId, static_cast<long>(lag.lagId));
+          row->SetField(kFieldMode, lag.mode == 2 ? "Passive" : "Active");
+          row->SetField(kFieldFlags, kFlagLegend);
+          auto nics = MetaList::New(Fabrik::MetaObj::Struct, NicStatusStructure());
+          for (const auto& nic : lag.nics)
+            if (nic)
+              nics->Add(NicStatusOf(*nic, onDpu));
+          row->SetField(kFieldNicList, nics);
+          list.Add(row);
+        }
+      },
+      [](const MetaList& list) { return list.GetCount() == 0 ? kNoRunningLag : std::string(); });
 }
 
 // network vswitch dvs corvex lacp stats get
@@ -466,44 +465,35 @@ std::shared_ptr<OutputSpec> LacpGetStats::GetOutputSpecInternal() {
 
 void LacpGetStats::ExecuteInternal(const std::shared_ptr<Input>& input,
                                    const std::shared_ptr<Output>& output) {
-  try {
-    std::vector<std::unique_ptr<DVSwitch>> switches;
-    if (!SelectSwitches(input, output, switches))
-      return;
-    auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
-    std::size_t lagCount = 0;
-    for (const auto& dvs : switches) {
-      std::vector<LacpLagInfo> lags;
-      dvs->GetLacpInfo(lags);
-      lagCount += lags.size();
-      std::string displayName = lags.empty() ? std::string() : dvs->GetDisplayName();
-      for (const LacpLagInfo& lag : lags)
-        for (const auto& nic : lag.nics) {
-          if (!nic)
-            continue;
-          auto row = GetOutputStructure();
-          row->SetField(kFieldDVSwitch, displayName);
-          row->SetField(kFieldNic, FieldText(nic->nicName));
-          row->SetField(kFieldLagId, static_cast<long>(lag.lagId));
-          row->SetField(kFieldTxLacpdus, static_cast<long>(nic->txLacpdus));
-          row->SetField(kFieldTxErrors, static_cast<long>(nic->txErrors));
-          row->SetField(kFieldRxLacpdus, static_cast<long>(nic->rxLacpdus));
-          row->SetField(kFieldRxErrors, static_cast<long>(nic->rxErrors));
-          list->Add(row);
-        }
-    }
-    if (lagCount == 0) {
-      output->AddErrorMessage(kNoRunningLag);
-      return;
-    }
-    if (list->GetCount() == 0) {
-      output->AddErrorMessage("No pnic is connected to DVSwitch.");
-      return;
-    }
-    output->SetRootObject(list);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  std::size_t lagCount = 0;
+  ListLacp(
+      input, output, GetOutputStructure(),
+      [&](MetaList& list, DVSwitch& dvs) {
+        std::vector<LacpLagInfo> lags;
+        dvs.GetLacpInfo(lags);
+        lagCount += lags.size();
+        std::string displayName = lags.empty() ? std::string() : dvs.GetDisplayName();
+        for (const LacpLagInfo& lag : lags)
+          for (const auto& nic : lag.nics) {
+            if (!nic)
+              continue;
+            auto row = GetOutputStructure();
+            row->SetField(kFieldDVSwitch, displayName);
+            row->SetField(kFieldNic, FieldText(nic->nicName));
+            row->SetField(kFieldLagId, static_cast<long>(lag.lagId));
+            row->SetField(kFieldTxLacpdus, static_cast<long>(nic->txLacpdus));
+            row->SetField(kFieldTxErrors, static_cast<long>(nic->txErrors));
+            row->SetField(kFieldRxLacpdus, static_cast<long>(nic->rxLacpdus));
+            row->SetField(kFieldRxErrors, static_cast<long>(nic->rxErrors));
+            list.Add(row);
+          }
+      },
+      [&](const MetaList& list) {
+        if (lagCount == 0)
+          return kNoRunningLag;
+        return list.GetCount() == 0 ? std::string("No pnic is connected to DVSwitch.")
+                                    : std::string();
+      });
 }
 
 // network vswitch dvs corvex lacp timeout set

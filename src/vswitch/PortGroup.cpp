@@ -103,19 +103,6 @@ const RequiredRate kRequiredRates[] = {
                                 "either this port group or on the parent virtual switch."},
 };
 
-std::string JoinFields(const std::vector<std::string>& fields) {
-  std::string joined;
-  for (const std::string& field : fields)
-    joined += (joined.empty() ? "" : ",") + field;
-  return joined;
-}
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 std::shared_ptr<InputSpec> NameSpec(const char* description) {
   auto spec = InputSpec::New();
   AddParameterTable(spec,
@@ -140,10 +127,35 @@ std::unique_ptr<PortGroup> FindPortGroup(const std::shared_ptr<Input>& input,
   return group;
 }
 
-void SetOverrides(const std::shared_ptr<MetaStruct>& result, uint32_t mask,
-                  const OverrideField* begin, const OverrideField* end) {
-  for (const OverrideField* it = begin; it != end; ++it)
-    result->SetField(kOverride + it->field, (mask & it->bit) != 0);
+/// Runs \p body on the port group the command names (WithPolicyHolder).
+template <typename Body>
+void WithPortGroup(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
+                   Body body) {
+  WithPolicyHolder(input, output, FindPortGroup, body);
+}
+
+/// The value fields of a policy result followed by their override flags.
+template <std::size_t N>
+std::vector<std::string> WithOverrides(const std::vector<std::string>& values,
+                                       const OverrideField (&overrides)[N]) {
+  std::vector<std::string> fields = values;
+  for (const OverrideField& entry : overrides)
+    fields.push_back(kOverride + entry.field);
+  return fields;
+}
+
+/// Declares one boolean override flag per entry of \p overrides.
+template <std::size_t N>
+void AddOverrideFields(MetaStruct& structure, const OverrideField (&overrides)[N]) {
+  for (const OverrideField& entry : overrides)
+    structure.SetField(kOverride + entry.field, MetaBool::New());
+}
+
+/// Sets each override flag from the configured policy's set mask.
+template <std::size_t N>
+void SetOverrides(MetaStruct& result, uint32_t mask, const OverrideField (&overrides)[N]) {
+  for (const OverrideField& entry : overrides)
+    result.SetField(kOverride + entry.field, (mask & entry.bit) != 0);
 }
 
 /// Runs portgroup add or remove on the named switch.
@@ -340,16 +352,8 @@ CORVEX_DEFINE_NEW(VirtualSwitchPortGroupPolicyShapingGet)
 
 VirtualSwitchPortGroupPolicyShapingGet::VirtualSwitchPortGroupPolicyShapingGet() {
   SetDescription("Get the network shaping policy settings governing the given port group");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructShaping,
-      JoinFields({kFieldEnabled, kFieldAverageBandwidth, kFieldPeakBandwidth, kFieldBurstSize,
-                  kOverride + kFieldEnabled, kOverride + kFieldAverageBandwidth,
-                  kOverride + kFieldPeakBandwidth, kOverride + kFieldBurstSize}));
-  SetDefaultOutputParameter("header:" + kStructShaping, "<NONE>");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldAverageBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldPeakBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldBurstSize, "Kib");
+  SetPolicyGetOutput(*this, kStructShaping, WithOverrides(ShapingFieldNames(), kShapingOverrides),
+                     true);
 }
 
 VirtualSwitchPortGroupPolicyShapingGet::~VirtualSwitchPortGroupPolicyShapingGet() = default;
@@ -359,13 +363,8 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyShapingGet::GetInputSpecI
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyShapingGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructShaping);
-  structure->SetField(kFieldEnabled, MetaBool::New());
-  structure->SetField(kFieldAverageBandwidth, MetaInt::New());
-  structure->SetField(kFieldPeakBandwidth, MetaInt::New());
-  structure->SetField(kFieldBurstSize, MetaInt::New());
-  for (const OverrideField& entry : kShapingOverrides)
-    structure->SetField(kOverride + entry.field, MetaBool::New());
+  auto structure = NewShapingStructure(kStructShaping);
+  AddOverrideFields(*structure, kShapingOverrides);
   return structure;
 }
 
@@ -377,22 +376,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingGet::GetOutputSpe
 
 void VirtualSwitchPortGroupPolicyShapingGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    ShapingValues values = DescribeShaping(group->GetTrafficShapingPolicy());
-    uint32_t mask = group->GetConfiguredTrafficShapingPolicy().GetSetMask();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    uint32_t mask = group.GetConfiguredTrafficShapingPolicy().GetSetMask();
     auto result = GetOutputStructure();
-    result->SetField(kFieldEnabled, values.enabled);
-    result->SetField(kFieldAverageBandwidth, values.average);
-    result->SetField(kFieldPeakBandwidth, values.peak);
-    result->SetField(kFieldBurstSize, values.burst);
-    SetOverrides(result, mask, std::begin(kShapingOverrides), std::end(kShapingOverrides));
+    SetShapingFields(*result, DescribeShaping(group.GetTrafficShapingPolicy()));
+    SetOverrides(*result, mask, kShapingOverrides);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy shaping set
@@ -418,26 +408,21 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetOutputSpe
 
 void VirtualSwitchPortGroupPolicyShapingSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    ShapingPolicy policy = group->GetConfiguredTrafficShapingPolicy();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    ShapingPolicy policy = group.GetConfiguredTrafficShapingPolicy();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetShapingPolicy(input, output, policy, false);
     if (policy.IsSet(ShapingPolicy::MASK_ENABLED) && policy.IsEnabled()) {
-      ShapingPolicy inForce = group->GetTrafficShapingPolicy();
+      ShapingPolicy inForce = group.GetTrafficShapingPolicy();
       for (const RequiredRate& rate : kRequiredRates)
         if (!policy.IsSet(rate.bit) && !inForce.IsSet(rate.bit))
           output->AddErrorMessage(rate.message);
     }
     if (!output->HasError())
-      group->SetTrafficShapingPolicy(policy);
+      group.SetTrafficShapingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy failover get
@@ -446,15 +431,9 @@ CORVEX_DEFINE_NEW(VirtualSwitchPortGroupPolicyFailoverGet)
 
 VirtualSwitchPortGroupPolicyFailoverGet::VirtualSwitchPortGroupPolicyFailoverGet() {
   SetDescription("Get the network failover policy settings governing the given port group");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructFailover,
-      JoinFields({kFieldLoadBalancing, kFieldFailureDetection, kFieldNotifySwitches, kFieldFailback,
-                  kFieldActiveAdapters, kFieldStandbyAdapters, kFieldUnusedAdapters,
-                  kOverride + kFieldLoadBalancing, kOverride + kFieldFailureDetection,
-                  kOverride + kFieldNotifySwitches, kOverride + kFieldFailback,
-                  kFieldOverrideUplinks}));
-  SetDefaultOutputParameter("header:" + kStructFailover, "<NONE>");
+  std::vector<std::string> fields = WithOverrides(FailoverFieldNames(), kFailoverOverrides);
+  fields.push_back(kFieldOverrideUplinks);
+  SetPolicyGetOutput(*this, kStructFailover, fields, false);
 }
 
 VirtualSwitchPortGroupPolicyFailoverGet::~VirtualSwitchPortGroupPolicyFailoverGet() = default;
@@ -465,16 +444,8 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyFailoverGet::GetInputSpec
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructFailover);
-  structure->SetField(kFieldLoadBalancing, MetaString::New());
-  structure->SetField(kFieldFailureDetection, MetaString::New());
-  structure->SetField(kFieldNotifySwitches, MetaBool::New());
-  structure->SetField(kFieldFailback, MetaBool::New());
-  structure->SetField(kFieldActiveAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldStandbyAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldUnusedAdapters, MetaList::New(Fabrik::MetaObj::String));
-  for (const OverrideField& entry : kFailoverOverrides)
-    structure->SetField(kOverride + entry.field, MetaBool::New());
+  auto structure = NewFailoverStructure(kStructFailover);
+  AddOverrideFields(*structure, kFailoverOverrides);
   structure->SetField(kFieldOverrideUplinks, MetaBool::New());
   return structure;
 }
@@ -487,28 +458,16 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicyFailoverGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    NicTeamingPolicy inForce = group->GetNicTeamingPolicy();
-    uint32_t mask = group->GetConfiguredNicTeamingPolicy().GetSetMask();
-    std::vector<std::string> uplinks = group->GetVirtualSwitch()->GetUplinks();
-    FailoverValues values = DescribeFailover(inForce, uplinks);
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    NicTeamingPolicy inForce = group.GetNicTeamingPolicy();
+    uint32_t mask = group.GetConfiguredNicTeamingPolicy().GetSetMask();
+    std::vector<std::string> uplinks = group.GetVirtualSwitch()->GetUplinks();
     auto result = GetOutputStructure();
-    result->SetField(kFieldLoadBalancing, values.loadBalancing);
-    result->SetField(kFieldFailureDetection, values.failureDetection);
-    result->SetField(kFieldNotifySwitches, values.notifySwitches);
-    result->SetField(kFieldFailback, values.failback);
-    result->SetField(kFieldActiveAdapters, values.active);
-    result->SetField(kFieldStandbyAdapters, values.standby);
-    result->SetField(kFieldUnusedAdapters, values.unused);
-    SetOverrides(result, mask, std::begin(kFailoverOverrides), std::end(kFailoverOverrides));
+    SetFailoverFields(*result, DescribeFailover(inForce, uplinks));
+    SetOverrides(*result, mask, kFailoverOverrides);
     result->SetField(kFieldOverrideUplinks, (mask & NicTeamingPolicy::MASK_UPLINK_ORDER) != 0);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy failover set
@@ -535,22 +494,17 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicyFailoverSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    NicTeamingPolicy current = group->GetNicTeamingPolicy();
-    NicTeamingPolicy policy = group->GetConfiguredNicTeamingPolicy();
-    std::vector<std::string> uplinks = group->GetVirtualSwitch()->GetUplinks();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    NicTeamingPolicy current = group.GetNicTeamingPolicy();
+    NicTeamingPolicy policy = group.GetConfiguredNicTeamingPolicy();
+    std::vector<std::string> uplinks = group.GetVirtualSwitch()->GetUplinks();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetFailoverPolicy(input, output, policy, current, uplinks);
     if (!output->HasError())
-      group->SetNicTeamingPolicy(policy);
+      group.SetNicTeamingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy security get
@@ -559,13 +513,8 @@ CORVEX_DEFINE_NEW(VirtualSwitchPortGroupPolicySecurityGet)
 
 VirtualSwitchPortGroupPolicySecurityGet::VirtualSwitchPortGroupPolicySecurityGet() {
   SetDescription("Get the Security Policy governing the given port group. ");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructSecurity,
-      JoinFields({kFieldAllowPromiscuous, kFieldAllowMacChange, kFieldAllowForgedTransmits,
-                  kOverride + kFieldAllowPromiscuous, kOverride + kFieldAllowMacChange,
-                  kOverride + kFieldAllowForgedTransmits}));
-  SetDefaultOutputParameter("header:" + kStructSecurity, "<NONE>");
+  SetPolicyGetOutput(*this, kStructSecurity,
+                     WithOverrides(SecurityFieldNames(), kSecurityOverrides), false);
 }
 
 VirtualSwitchPortGroupPolicySecurityGet::~VirtualSwitchPortGroupPolicySecurityGet() = default;
@@ -575,12 +524,8 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicySecurityGet::GetInputSpec
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicySecurityGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructSecurity);
-  structure->SetField(kFieldAllowPromiscuous, MetaBool::New());
-  structure->SetField(kFieldAllowMacChange, MetaBool::New());
-  structure->SetField(kFieldAllowForgedTransmits, MetaBool::New());
-  for (const OverrideField& entry : kSecurityOverrides)
-    structure->SetField(kOverride + entry.field, MetaBool::New());
+  auto structure = NewSecurityStructure(kStructSecurity);
+  AddOverrideFields(*structure, kSecurityOverrides);
   return structure;
 }
 
@@ -592,21 +537,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicySecurityGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    PortSecurityPolicy policy = group->GetPortSecurityPolicy();
-    uint32_t mask = group->GetConfiguredPortSecurityPolicy().GetSetMask();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    uint32_t mask = group.GetConfiguredPortSecurityPolicy().GetSetMask();
     auto result = GetOutputStructure();
-    result->SetField(kFieldAllowPromiscuous, policy.GetAllowPromiscuous());
-    result->SetField(kFieldAllowMacChange, policy.GetAllowMacAddressChange());
-    result->SetField(kFieldAllowForgedTransmits, policy.GetAllowForgedTransmits());
-    SetOverrides(result, mask, std::begin(kSecurityOverrides), std::end(kSecurityOverrides));
+    SetSecurityFields(*result, group.GetPortSecurityPolicy());
+    SetOverrides(*result, mask, kSecurityOverrides);
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard portgroup policy security set
@@ -632,20 +569,15 @@ std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetOutputSp
 
 void VirtualSwitchPortGroupPolicySecuritySet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto group = FindPortGroup(input, output);
-    if (!group)
-      return;
-    PortSecurityPolicy policy = group->GetConfiguredPortSecurityPolicy();
+  WithPortGroup(input, output, [&](PortGroup& group) {
+    PortSecurityPolicy policy = group.GetConfiguredPortSecurityPolicy();
     if (input->IsFlagSet(kParamUseVswitch))
       policy.UnsetAll();
     SetSecurityPolicy(input, output, policy);
     if (!output->HasError())
-      group->SetPortSecurityPolicy(policy);
+      group.SetPortSecurityPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -12,6 +12,7 @@
 #include "common/PolicyParams.h"
 
 #include <algorithm>
+#include <cstdint>
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -59,12 +60,6 @@ const std::string kSystemType = "system";
 const std::string kCdpStatus[] = {"down", "listen", "advertise", "both"};
 
 const std::string kNoSwitchNamed = "Unable to find a virtual switch with name ";
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
 
 /// Names of the host's physical NICs, in order.
 std::vector<std::string> PhysicalNicNames() {
@@ -215,12 +210,16 @@ void VirtualSwitchStandardSet::ExecuteInternal(const std::shared_ptr<Input>& inp
       return;
     }
     if (input->HasParameter(kParamMtu)) {
-      auto mtu = static_cast<int32_t>(input->GetParameterInt(kParamMtu));
-      if (mtu < 0) {
+      // The value is read as a signed 32-bit one. A value beyond 32 bits is
+      // not wrapped into a small valid MTU: a negative one is refused here,
+      // a larger one passed as the largest, which the host refuses.
+      long mtu = input->GetParameterInt(kParamMtu);
+      if (mtu < 0 || (mtu <= static_cast<long>(UINT32_MAX) && static_cast<int32_t>(mtu) < 0)) {
         output->AddErrorMessage("MTU size should be a positive value");
         return;
       }
-      vswitch->SetMtu(static_cast<uint32_t>(mtu));
+      vswitch->SetMtu(mtu > static_cast<long>(UINT32_MAX) ? UINT32_MAX
+                                                          : static_cast<uint32_t>(mtu));
     }
     if (input->HasParameter(kParamCdpStatus)) {
       const std::string& status = input->GetParameter(kParamCdpStatus);

@@ -33,23 +33,9 @@ const std::string kStructShaping = "VirtualSwitchTrafficShapingPolicy";
 
 const std::string kNoLegacySwitch = "Unable to find a legacy virtual switch with the name ";
 
-/// Joins field names with ",".
-std::string JoinFields(std::initializer_list<const std::string*> fields) {
-  std::string joined;
-  for (const std::string* field : fields)
-    joined += (joined.empty() ? "" : ",") + *field;
-  return joined;
-}
-
 std::shared_ptr<InputSpec> SwitchNameSpec(const char* description) {
   auto spec = InputSpec::New();
   AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
-  return spec;
-}
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
   return spec;
 }
 
@@ -66,6 +52,13 @@ std::unique_ptr<VirtualSwitch> FindLegacySwitch(const std::shared_ptr<Input>& in
   return vswitch;
 }
 
+/// Runs \p body on the standard switch the command names (WithPolicyHolder).
+template <typename Body>
+void WithLegacySwitch(const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output,
+                      Body body) {
+  WithPolicyHolder(input, output, FindLegacySwitch, body);
+}
+
 } // namespace
 
 // network vswitch standard policy shaping get
@@ -74,14 +67,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyShapingGet)
 
 VirtualSwitchStandardPolicyShapingGet::VirtualSwitchStandardPolicyShapingGet() {
   SetDescription("Get the shaping policy settings for the given virtual switch");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter("fields:" + kStructShaping,
-                            JoinFields({&kFieldEnabled, &kFieldAverageBandwidth,
-                                        &kFieldPeakBandwidth, &kFieldBurstSize}));
-  SetDefaultOutputParameter("header:" + kStructShaping, "<NONE>");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldAverageBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldPeakBandwidth, "Kbps");
-  SetDefaultOutputParameter("units:" + kStructShaping + "." + kFieldBurstSize, "Kib");
+  SetPolicyGetOutput(*this, kStructShaping, ShapingFieldNames(), true);
 }
 
 VirtualSwitchStandardPolicyShapingGet::~VirtualSwitchStandardPolicyShapingGet() = default;
@@ -92,12 +78,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyShapingGet::GetInputSpecIn
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyShapingGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructShaping);
-  structure->SetField(kFieldEnabled, MetaBool::New());
-  structure->SetField(kFieldAverageBandwidth, MetaInt::New());
-  structure->SetField(kFieldPeakBandwidth, MetaInt::New());
-  structure->SetField(kFieldBurstSize, MetaInt::New());
-  return structure;
+  return NewShapingStructure(kStructShaping);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpecInternal() {
@@ -108,20 +89,11 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpec
 
 void VirtualSwitchStandardPolicyShapingGet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                                             const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    ShapingValues values = DescribeShaping(vswitch->GetTrafficShapingPolicy());
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
-    result->SetField(kFieldEnabled, values.enabled);
-    result->SetField(kFieldAverageBandwidth, values.average);
-    result->SetField(kFieldPeakBandwidth, values.peak);
-    result->SetField(kFieldBurstSize, values.burst);
+    SetShapingFields(*result, DescribeShaping(vswitch.GetTrafficShapingPolicy()));
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy shaping set
@@ -147,18 +119,13 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingSet::GetOutputSpec
 
 void VirtualSwitchStandardPolicyShapingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                                             const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    ShapingPolicy policy = vswitch->GetTrafficShapingPolicy();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    ShapingPolicy policy = vswitch.GetTrafficShapingPolicy();
     SetShapingPolicy(input, output, policy, false);
     if (!output->HasError())
-      vswitch->SetTrafficShapingPolicy(policy);
+      vswitch.SetTrafficShapingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy security get
@@ -167,11 +134,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicySecurityGet)
 
 VirtualSwitchStandardPolicySecurityGet::VirtualSwitchStandardPolicySecurityGet() {
   SetDescription("Get the Security Policy governing the given virtual switch.");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructSecurity,
-      JoinFields({&kFieldAllowPromiscuous, &kFieldAllowMacChange, &kFieldAllowForgedTransmits}));
-  SetDefaultOutputParameter("header:" + kStructSecurity, "<NONE>");
+  SetPolicyGetOutput(*this, kStructSecurity, SecurityFieldNames(), false);
 }
 
 VirtualSwitchStandardPolicySecurityGet::~VirtualSwitchStandardPolicySecurityGet() = default;
@@ -182,11 +145,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecurityGet::GetInputSpecI
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicySecurityGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructSecurity);
-  structure->SetField(kFieldAllowPromiscuous, MetaBool::New());
-  structure->SetField(kFieldAllowMacChange, MetaBool::New());
-  structure->SetField(kFieldAllowForgedTransmits, MetaBool::New());
-  return structure;
+  return NewSecurityStructure(kStructSecurity);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpecInternal() {
@@ -197,19 +156,11 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpe
 
 void VirtualSwitchStandardPolicySecurityGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
-    result->SetField(kFieldAllowPromiscuous, policy.GetAllowPromiscuous());
-    result->SetField(kFieldAllowMacChange, policy.GetAllowMacAddressChange());
-    result->SetField(kFieldAllowForgedTransmits, policy.GetAllowForgedTransmits());
+    SetSecurityFields(*result, vswitch.GetPortSecurityPolicy());
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy security set
@@ -242,22 +193,12 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecuritySet::GetOutputSpe
 
 void VirtualSwitchStandardPolicySecuritySet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    PortSecurityPolicy policy = vswitch->GetPortSecurityPolicy();
-    if (input->HasParameter(kParamAllowPromiscuous))
-      policy.SetAllowPromiscuous(input->GetParameterBool(kParamAllowPromiscuous));
-    if (input->HasParameter(kParamAllowMacChange))
-      policy.SetAllowMacAddressChange(input->GetParameterBool(kParamAllowMacChange));
-    if (input->HasParameter(kParamAllowForgedTransmits))
-      policy.SetAllowForgedTransmits(input->GetParameterBool(kParamAllowForgedTransmits));
-    vswitch->SetPortSecurityPolicy(policy);
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    PortSecurityPolicy policy = vswitch.GetPortSecurityPolicy();
+    SetSecurityPolicy(input, output, policy);
+    vswitch.SetPortSecurityPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy failover get
@@ -266,13 +207,7 @@ CORVEX_DEFINE_NEW(VirtualSwitchStandardPolicyFailoverGet)
 
 VirtualSwitchStandardPolicyFailoverGet::VirtualSwitchStandardPolicyFailoverGet() {
   SetDescription("Get the failover policy settings governing the given virtual switch");
-  SetDefaultOutputFormatter("simple");
-  SetDefaultOutputParameter(
-      "fields:" + kStructFailover,
-      JoinFields({&kFieldLoadBalancing, &kFieldFailureDetection, &kFieldNotifySwitches,
-                  &kFieldFailback, &kFieldActiveAdapters, &kFieldStandbyAdapters,
-                  &kFieldUnusedAdapters}));
-  SetDefaultOutputParameter("header:" + kStructFailover, "<NONE>");
+  SetPolicyGetOutput(*this, kStructFailover, FailoverFieldNames(), false);
 }
 
 VirtualSwitchStandardPolicyFailoverGet::~VirtualSwitchStandardPolicyFailoverGet() = default;
@@ -283,15 +218,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyFailoverGet::GetInputSpecI
 }
 
 std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyFailoverGet::GetOutputStructure() {
-  auto structure = MetaStruct::New(kStructFailover);
-  structure->SetField(kFieldLoadBalancing, MetaString::New());
-  structure->SetField(kFieldFailureDetection, MetaString::New());
-  structure->SetField(kFieldNotifySwitches, MetaBool::New());
-  structure->SetField(kFieldFailback, MetaBool::New());
-  structure->SetField(kFieldActiveAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldStandbyAdapters, MetaList::New(Fabrik::MetaObj::String));
-  structure->SetField(kFieldUnusedAdapters, MetaList::New(Fabrik::MetaObj::String));
-  return structure;
+  return NewFailoverStructure(kStructFailover);
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpecInternal() {
@@ -302,23 +229,12 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpe
 
 void VirtualSwitchStandardPolicyFailoverGet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    FailoverValues values = DescribeFailover(vswitch->GetNicTeamingPolicy(), vswitch->GetUplinks());
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
     auto result = GetOutputStructure();
-    result->SetField(kFieldLoadBalancing, values.loadBalancing);
-    result->SetField(kFieldFailureDetection, values.failureDetection);
-    result->SetField(kFieldNotifySwitches, values.notifySwitches);
-    result->SetField(kFieldFailback, values.failback);
-    result->SetField(kFieldActiveAdapters, values.active);
-    result->SetField(kFieldStandbyAdapters, values.standby);
-    result->SetField(kFieldUnusedAdapters, values.unused);
+    SetFailoverFields(*result,
+                      DescribeFailover(vswitch.GetNicTeamingPolicy(), vswitch.GetUplinks()));
     output->SetRootObject(result);
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 // network vswitch standard policy failover set
@@ -344,20 +260,15 @@ std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverSet::GetOutputSpe
 
 void VirtualSwitchStandardPolicyFailoverSet::ExecuteInternal(
     const std::shared_ptr<Input>& input, const std::shared_ptr<Output>& output) {
-  try {
-    auto vswitch = FindLegacySwitch(input, output);
-    if (!vswitch)
-      return;
-    NicTeamingPolicy current = vswitch->GetNicTeamingPolicy();
-    NicTeamingPolicy policy = vswitch->GetConfiguredNicTeamingPolicy();
-    std::vector<std::string> uplinks = vswitch->GetUplinks();
+  WithLegacySwitch(input, output, [&](VirtualSwitch& vswitch) {
+    NicTeamingPolicy current = vswitch.GetNicTeamingPolicy();
+    NicTeamingPolicy policy = vswitch.GetConfiguredNicTeamingPolicy();
+    std::vector<std::string> uplinks = vswitch.GetUplinks();
     SetFailoverPolicy(input, output, policy, current, uplinks);
     if (!output->HasError())
-      vswitch->SetNicTeamingPolicy(policy);
+      vswitch.SetNicTeamingPolicy(policy);
     output->SetRootObject(MetaBool::New(true));
-  } catch (const HostCtlException& e) {
-    output->AddErrorMessage(e.what());
-  }
+  });
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -162,17 +162,30 @@ NETSTACK_GETTER(std::string, GetEcnStatus, ecn)
 
 #undef NETSTACK_GETTER
 
+namespace {
+
+/// Runs \p sql, an UPDATE of one column of netstack \p key whose parameters
+/// are \p value and the key, as host operation \p operation: its declared
+/// fault first, then one write transaction that requires the instance.
+template <typename Value>
+void UpdateNetstack(const char* operation, const std::string& key, const char* sql,
+                    const Value& value) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, key);
+  store.Write([&] {
+    RequireNetstack(store, key);
+    store.Prepare(sql).BindAll(value, key).Run();
+  });
+}
+
+} // namespace
+
 void NetstackInstanceImpl::SetInstanceName(const std::string& name, bool persist) {
   if (name.empty() || name.size() > 64)
     throw HostCtlException("A netstack instance name must have 1 to 64 characters");
-  if (persist && onHost_) {
-    Store& store = Store::Host();
-    store.CheckFault("SetInstanceName", data_.key);
-    store.Write([&] {
-      RequireNetstack(store, data_.key);
-      store.Prepare("UPDATE netstack SET name = ? WHERE key = ?").BindAll(name, data_.key).Run();
-    });
-  }
+  if (persist && onHost_)
+    UpdateNetstack("SetInstanceName", data_.key, "UPDATE netstack SET name = ? WHERE key = ?",
+                   name);
   data_.name = name;
 }
 
@@ -215,54 +228,31 @@ void NetstackInstanceImpl::Disable() {
 
 void NetstackInstanceImpl::SetMaxConnections(uint32_t value, bool persist) {
   CheckMaxConnections(value);
-  if (persist && onHost_) {
-    Store& store = Store::Host();
-    store.CheckFault("SetMaxConnections", data_.key);
-    store.Write([&] {
-      RequireNetstack(store, data_.key);
-      store.Prepare("UPDATE netstack SET max_conn = ? WHERE key = ?")
-          .BindAll(value, data_.key)
-          .Run();
-    });
-  }
+  if (persist && onHost_)
+    UpdateNetstack("SetMaxConnections", data_.key, "UPDATE netstack SET max_conn = ? WHERE key = ?",
+                   value);
   data_.maxConnections = value;
 }
 
 void NetstackInstanceImpl::SetCongestionControlAlgorithm(const std::string& name, bool persist) {
   CheckCongestionControl(name);
-  if (persist && onHost_) {
-    Store& store = Store::Host();
-    store.CheckFault("SetCongestionControlAlgorithm", data_.key);
-    store.Write([&] {
-      RequireNetstack(store, data_.key);
-      store.Prepare("UPDATE netstack SET ccalgo = ? WHERE key = ?").BindAll(name, data_.key).Run();
-    });
-  }
+  if (persist && onHost_)
+    UpdateNetstack("SetCongestionControlAlgorithm", data_.key,
+                   "UPDATE netstack SET ccalgo = ? WHERE key = ?", name);
   data_.ccAlgorithm = name;
 }
 
 void NetstackInstanceImpl::SetIpv6Enabled(bool enabled, bool persist) {
-  if (persist && onHost_) {
-    Store& store = Store::Host();
-    store.CheckFault("SetIpv6Enabled", data_.key);
-    store.Write([&] {
-      RequireNetstack(store, data_.key);
-      store.Prepare("UPDATE netstack SET ipv6 = ? WHERE key = ?").BindAll(enabled, data_.key).Run();
-    });
-  }
+  if (persist && onHost_)
+    UpdateNetstack("SetIpv6Enabled", data_.key, "UPDATE netstack SET ipv6 = ? WHERE key = ?",
+                   enabled);
   data_.ipv6 = enabled;
 }
 
 void NetstackInstanceImpl::SetEcnStatus(const std::string& status) {
   CheckEcn(status);
-  if (onHost_) {
-    Store& store = Store::Host();
-    store.CheckFault("SetEcnStatus", data_.key);
-    store.Write([&] {
-      RequireNetstack(store, data_.key);
-      store.Prepare("UPDATE netstack SET ecn = ? WHERE key = ?").BindAll(status, data_.key).Run();
-    });
-  }
+  if (onHost_)
+    UpdateNetstack("SetEcnStatus", data_.key, "UPDATE netstack SET ecn = ? WHERE key = ?", status);
   data_.ecn = status;
 }
 

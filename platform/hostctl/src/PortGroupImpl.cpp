@@ -81,24 +81,32 @@ template <typename Policy> Policy WithParentValues(const Policy& configured, con
   return filled;
 }
 
-void StorePolicy(Store& store, int64_t id, const char* column, const std::string& text) {
+/// A policy of port group \p name, read as host operation \p operation in one
+/// read transaction: in force (\p inForce: its own fields over its switch's)
+/// or as configured (WithParentValues). \p configured reads the port group's
+/// own fields, \p ofSwitch those of its switch.
+template <typename Policy>
+Policy ReadGroupPolicy(const char* operation, const std::string& name, bool inForce,
+                       Policy (*configured)(Store&, int64_t), Policy (*ofSwitch)(Store&, int64_t)) {
+  Store& store = Store::Host();
+  store.CheckFault(operation, name);
+  return store.Read([&] {
+    GroupRow group = RequireGroup(store, name);
+    Policy own = configured(store, group.id);
+    Policy parent = ofSwitch(store, group.portsetId);
+    return inForce ? own.MergedOver(parent) : WithParentValues(own, parent);
+  });
+}
+
+/// Stores the JSON \p text of one policy of port group \p id with \p updateSql,
+/// an UPDATE of its column whose parameters are the text and the id.
+void StorePolicy(Store& store, int64_t id, const char* updateSql, const std::string& text) {
   store
       .Prepare("INSERT INTO portgroup_policy(portgroup_id) VALUES(?) "
                "ON CONFLICT(portgroup_id) DO NOTHING")
       .Bind(1, id)
       .Run();
-  if (std::string(column) == "teaming")
-    store.Prepare("UPDATE portgroup_policy SET teaming = ? WHERE portgroup_id = ?")
-        .BindAll(text, id)
-        .Run();
-  else if (std::string(column) == "security")
-    store.Prepare("UPDATE portgroup_policy SET security = ? WHERE portgroup_id = ?")
-        .BindAll(text, id)
-        .Run();
-  else
-    store.Prepare("UPDATE portgroup_policy SET shaping = ? WHERE portgroup_id = ?")
-        .BindAll(text, id)
-        .Run();
+  store.Prepare(updateSql).BindAll(text, id).Run();
 }
 
 } // namespace
@@ -194,22 +202,12 @@ std::unique_ptr<VirtualSwitch> PortGroupImpl::GetVirtualSwitch() const {
 }
 
 NicTeamingPolicy PortGroupImpl::GetNicTeamingPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetNicTeamingPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return ConfiguredTeaming(store, group.id).MergedOver(SwitchTeaming(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetNicTeamingPolicy", name_, true, ConfiguredTeaming, SwitchTeaming);
 }
 
 NicTeamingPolicy PortGroupImpl::GetConfiguredNicTeamingPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetConfiguredNicTeamingPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return WithParentValues(ConfiguredTeaming(store, group.id),
-                            SwitchTeaming(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetConfiguredNicTeamingPolicy", name_, false, ConfiguredTeaming,
+                         SwitchTeaming);
 }
 
 void PortGroupImpl::SetNicTeamingPolicy(const NicTeamingPolicy& policy) {
@@ -236,27 +234,18 @@ void PortGroupImpl::SetNicTeamingPolicy(const NicTeamingPolicy& policy) {
         throw HostCtlException("Unable to set the teaming policy of port group " + name_ +
                                ": the number of active uplinks is negative");
     }
-    StorePolicy(store, group.id, "teaming", Model::TeamingToJson(policy).dump());
+    StorePolicy(store, group.id, "UPDATE portgroup_policy SET teaming = ? WHERE portgroup_id = ?",
+                Model::TeamingToJson(policy).dump());
   });
 }
 
 PortSecurityPolicy PortGroupImpl::GetPortSecurityPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetPortSecurityPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return ConfiguredSecurity(store, group.id).MergedOver(SwitchSecurity(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetPortSecurityPolicy", name_, true, ConfiguredSecurity, SwitchSecurity);
 }
 
 PortSecurityPolicy PortGroupImpl::GetConfiguredPortSecurityPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetConfiguredPortSecurityPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return WithParentValues(ConfiguredSecurity(store, group.id),
-                            SwitchSecurity(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetConfiguredPortSecurityPolicy", name_, false, ConfiguredSecurity,
+                         SwitchSecurity);
 }
 
 void PortGroupImpl::SetPortSecurityPolicy(const PortSecurityPolicy& policy) {
@@ -264,27 +253,18 @@ void PortGroupImpl::SetPortSecurityPolicy(const PortSecurityPolicy& policy) {
   store.CheckFault("SetPortSecurityPolicy", name_);
   store.Write([&] {
     GroupRow group = RequireGroup(store, name_);
-    StorePolicy(store, group.id, "security", Model::SecurityToJson(policy).dump());
+    StorePolicy(store, group.id, "UPDATE portgroup_policy SET security = ? WHERE portgroup_id = ?",
+                Model::SecurityToJson(policy).dump());
   });
 }
 
 ShapingPolicy PortGroupImpl::GetTrafficShapingPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetTrafficShapingPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return ConfiguredShaping(store, group.id).MergedOver(SwitchShaping(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetTrafficShapingPolicy", name_, true, ConfiguredShaping, SwitchShaping);
 }
 
 ShapingPolicy PortGroupImpl::GetConfiguredTrafficShapingPolicy() const {
-  Store& store = Store::Host();
-  store.CheckFault("GetConfiguredTrafficShapingPolicy", name_);
-  return store.Read([&] {
-    GroupRow group = RequireGroup(store, name_);
-    return WithParentValues(ConfiguredShaping(store, group.id),
-                            SwitchShaping(store, group.portsetId));
-  });
+  return ReadGroupPolicy("GetConfiguredTrafficShapingPolicy", name_, false, ConfiguredShaping,
+                         SwitchShaping);
 }
 
 void PortGroupImpl::SetTrafficShapingPolicy(const ShapingPolicy& policy) {
@@ -294,7 +274,8 @@ void PortGroupImpl::SetTrafficShapingPolicy(const ShapingPolicy& policy) {
     GroupRow group = RequireGroup(store, name_);
     CheckShapingInForce(policy.MergedOver(SwitchShaping(store, group.portsetId)),
                         "port group " + name_);
-    StorePolicy(store, group.id, "shaping", Model::ShapingToJson(policy).dump());
+    StorePolicy(store, group.id, "UPDATE portgroup_policy SET shaping = ? WHERE portgroup_id = ?",
+                Model::ShapingToJson(policy).dump());
   });
 }
 

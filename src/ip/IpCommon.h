@@ -1,0 +1,46 @@
+//===- IpCommon.h - What every IP service family reads the same way -------===//
+//
+// The netstack a command works on and the "type" selector of the listings,
+// shared by the families that declare their parameters with ParamTable.h and
+// by those that use InterfaceCommon.h.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "Fabrik/Call.h"
+#include "HostCtl/Network/PortsetGetType.h"
+
+#include <string>
+
+namespace CorvexCli::NetworkNamespace {
+
+/// The netstack a command works on: the "netstack" parameter when it is given
+/// and not empty, else the default instance.
+inline std::string NetstackParameter(const Fabrik::CallSpec::Input& input) {
+  if (input.HasParameter("netstack") && !input.GetParameter("netstack").empty())
+    return input.GetParameter("netstack");
+  return "defaultTcpipStack";
+}
+
+/// Reads the "type" parameter of a listing into \p selector: regular objects
+/// when it is absent, system objects when it is "system". Gives false, with
+/// the error added, for any other type, and, when \p netstackMatters, for
+/// system objects asked of a netstack other than the default one.
+inline bool ReadListType(const Fabrik::CallSpec::Input& input, Fabrik::CallSpec::Output& output,
+                         HostCtl::Network::PortsetGetType& selector, bool netstackMatters = true) {
+  selector = HostCtl::Network::PortsetGetRegular;
+  if (!input.HasParameter("type"))
+    return true;
+  if (input.GetParameter("type") != "system") {
+    output.AddErrorMessage("Invalid type value, should be 'system'.");
+    return false;
+  }
+  if (netstackMatters && NetstackParameter(input) != "defaultTcpipStack") {
+    output.AddErrorMessage("Invalid netstack value, should be 'defaultTcpipStack'.");
+    return false;
+  }
+  selector = HostCtl::Network::PortsetGetSystem;
+  return true;
+}
+
+} // namespace CorvexCli::NetworkNamespace
