@@ -211,6 +211,18 @@ def verify(host, items, baseline):
         for key, item in ours[kind].items():
             if item.state == PRESENT and key not in snap[kind]:
                 problems.append("%r was acknowledged but is lost" % item)
+        # A worker adds its items one after another, each at the end of its
+        # list (of its switch, for port groups): they are listed in that order.
+        listed = {}
+        for key in snap[kind]:
+            item = ours[kind].get(key)
+            if item is not None:
+                group = (item.worker, getattr(item, "switch", None))
+                listed.setdefault(group, []).append(item.serial)
+        for (worker, _), serials in listed.items():
+            if serials != sorted(serials):
+                problems.append("the %s items of worker %d are listed out of order: %s" %
+                                (kind, worker, serials))
     return problems
 
 
