@@ -21,6 +21,7 @@ The seed is printed; --seed replays a run.
     crash_test.py OSTRACLI OSTRAHOST [--runs N] [--seed N]
 """
 import argparse
+import collections
 import os
 import random
 import signal
@@ -35,6 +36,9 @@ import changes  # noqa: E402
 KILL_SHARE = 0.6
 # Runs at the start that are never killed; they measure a command's duration.
 CALIBRATION_RUNS = 10
+# The typical duration is the median of this many recent runs that had no kill
+# planned, so that it follows the load of the machine.
+DURATION_WINDOW = 15
 # The worker number of this test's items (see changes.Item).
 WORKER = 9
 # A stale lock would make the next run wait this long and then fail.
@@ -67,8 +71,7 @@ def main():
         batch_file = os.path.join(host.tmp.name, "batch.txt")
         serials = {kind: 0 for kind in changes.KINDS}
         items, present, batches = [], [], []
-        durations = []
-        typical = None
+        durations = collections.deque(maxlen=DURATION_WINDOW)
         killed = finished = after_kill = 0
         previous_killed = False
 
@@ -104,7 +107,9 @@ def main():
 
             # Run it, and perhaps kill it.
             kill = run >= CALIBRATION_RUNS and rng.random() < KILL_SHARE
-            delay = rng.uniform(0, typical) if kill else 0
+            if kill:
+                typical = sorted(durations)[len(durations) // 2]
+                delay = rng.uniform(0, typical)
             started = time.monotonic()
             proc = start(host, proc_args, batch)
             if kill:
@@ -112,12 +117,12 @@ def main():
                 proc.send_signal(signal.SIGKILL)
             out, err = proc.communicate()
             took = time.monotonic() - started
-            if run < CALIBRATION_RUNS:
+            if not kill:
                 durations.append(took)
-                if run == CALIBRATION_RUNS - 1:
-                    typical = sorted(durations)[len(durations) // 2]
-                    print("a change takes about %.1f ms; kills land 0 to %.1f ms after start" %
-                          (1000 * typical, 1000 * typical))
+            if run == CALIBRATION_RUNS - 1:
+                typical = sorted(durations)[len(durations) // 2]
+                print("a change takes about %.1f ms at first; kills land from 0 to about that "
+                      "long after the start" % (1000 * typical))
 
             if proc.returncode == -signal.SIGKILL:
                 killed += 1
