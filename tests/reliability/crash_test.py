@@ -156,8 +156,9 @@ def main():
               (args.runs, elapsed, killed, finished, after_kill))
         # Every run that finished had to succeed; those right after a kill
         # show that the killed process left no lock behind.
-        print("the longest run right after a kill took %.1f ms (a stale lock would hold it "
-              "%d ms and fail it)" % (1000 * after_kill_longest, BUSY_TIMEOUT_MS))
+        print("the longest run right after a kill took %.1f ms; a lock left behind would have "
+              "failed it after the busy timeout of %d ms" % (1000 * after_kill_longest,
+                                                             BUSY_TIMEOUT_MS))
         if killed < args.runs // 4 or after_kill == 0:
             problems.append("only %d runs were killed, %d ran right after a kill" %
                             (killed, after_kill))
