@@ -19,6 +19,7 @@ using Fabrik::CallSpec::Output;
 using Fabrik::CallSpec::OutputSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaList;
+using Fabrik::MetaObj::MetaString;
 using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using TvkCtl::Network::RoutingInfoImpl;
@@ -272,14 +273,18 @@ void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
     std::vector<HostCtl::Network::Ipv4Route> routes = routing.GetCurrentTarvikRoutes(selector);
     auto list = MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure());
     list->Reserve(routes.size());
+    // Every field of a row is set, so a row starts as a shallow copy of one
+    // structure (its fields in order, in one allocation) rather than as a
+    // fresh template: a listing may hold hundreds of thousands of rows.
+    const std::shared_ptr<MetaStruct> shape = GetOutputStructure();
     for (const HostCtl::Network::Ipv4Route& route : routes) {
-      auto row = GetOutputStructure();
-      row->SetField(kNetmask, route.GetNetwork().GetNetmask().GetStringAddress());
-      row->SetField(kInterface, route.GetInterfaceName());
-      row->SetField(kNetwork, NetworkText<Ipv4Family>(route.GetNetwork()));
-      row->SetField(kGateway, route.GetGateway().GetStringAddress());
-      row->SetField(kSource, routing.GetDefaultGatewaySource(route.GetNetwork()));
-      list->Add(row);
+      auto row = std::make_shared<MetaStruct>(*shape);
+      row->SetField(kNetwork, MetaString::New(NetworkText<Ipv4Family>(route.GetNetwork())));
+      row->SetField(kNetmask, MetaString::New(route.GetNetwork().GetNetmask().GetStringAddress()));
+      row->SetField(kGateway, MetaString::New(route.GetGateway().GetStringAddress()));
+      row->SetField(kInterface, MetaString::New(route.GetInterfaceName()));
+      row->SetField(kSource, MetaString::New(routing.GetDefaultGatewaySource(route.GetNetwork())));
+      list->Add(std::move(row));
     }
     output->SetRootObject(list);
   } catch (const HostCtlException& e) {

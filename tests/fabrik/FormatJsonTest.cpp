@@ -85,3 +85,63 @@ TEST(JsonFormatTest, ReadsBackAsTheResult) {
   for (const auto& [name, root] : Samples())
     EXPECT_EQ(nlohmann::ordered_json::parse(Render("json", root)), Expected(root)) << name;
 }
+
+// The writer chooses the fields of a structure kind once and reuses the
+// choice; rows of one name whose fields differ, and one kind at two depths,
+// must still be written as if each were chosen alone.
+TEST(JsonFormatTest, RowsOfOneKindWithDifferentFieldsOrDepths) {
+  auto row = [](const char* name, bool withMtu) {
+    auto value = MetaStruct::New("Row");
+    value->SetField("Name", name);
+    if (withMtu)
+      value->SetField("MTU", 9000);
+    return value;
+  };
+  auto list = MetaList::New(Struct);
+  list->Add(row("a", false));
+  list->Add(row("b", true));
+  auto nested = row("c", false);
+  nested->SetField("Inner", row("d", true));
+  list->Add(nested);
+  EXPECT_EQ(Render("json", list, {{"fields:Row", "MTU,Name"}}), "[\n"
+                                                                "  {\n"
+                                                                "    \"Name\": \"a\"\n"
+                                                                "  },\n"
+                                                                "  {\n"
+                                                                "    \"MTU\": 9000,\n"
+                                                                "    \"Name\": \"b\"\n"
+                                                                "  },\n"
+                                                                "  {\n"
+                                                                "    \"Name\": \"c\"\n"
+                                                                "  }\n"
+                                                                "]\n");
+  EXPECT_EQ(Render("json", list), "[\n"
+                                  "  {\n"
+                                  "    \"Name\": \"a\"\n"
+                                  "  },\n"
+                                  "  {\n"
+                                  "    \"Name\": \"b\",\n"
+                                  "    \"MTU\": 9000\n"
+                                  "  },\n"
+                                  "  {\n"
+                                  "    \"Name\": \"c\",\n"
+                                  "    \"Inner\": {\n"
+                                  "      \"Name\": \"d\",\n"
+                                  "      \"MTU\": 9000\n"
+                                  "    }\n"
+                                  "  }\n"
+                                  "]\n");
+}
+
+// A listing longer than the writer's buffer is passed on in pieces, whole.
+TEST(JsonFormatTest, LongListingsArriveWhole) {
+  auto list = MetaList::New(String);
+  std::string expected = "[";
+  for (int i = 0; i < 20000; ++i) {
+    std::string item = "item-" + std::to_string(i);
+    list->Add(item);
+    expected += std::string(i ? "," : "") + "\n  \"" + item + "\"";
+  }
+  expected += "\n]\n";
+  EXPECT_EQ(Render("json", list), expected);
+}

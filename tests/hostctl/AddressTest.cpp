@@ -59,14 +59,15 @@ TEST(AddressTest, MacValidityRequiresUnicastAndNotZero) {
 
 TEST(AddressTest, Ipv4Corpus) {
   const std::vector<Case> cases = {
-      {"1.2.3.4", true, ""},    {"0.0.0.0", true, ""},     {"255.255.255.255", true, ""},
+      {"1.2.3.4", true, ""},     {"0.0.0.0", true, ""},     {"255.255.255.255", true, ""},
       {"01.2.3.4", false, ""}, // Leading zero.
-      {"1.2.3.00", false, ""},  {"256.1.1.1", false, ""},  {"1.2.3", false, ""},
-      {"1.2.3.4.5", false, ""}, {"1..3.4", false, ""},     {".1.2.3", false, ""},
-      {"1.2.3.4.", false, ""},  {"+1.2.3.4", false, ""},   {"1.2.3.-4", false, ""},
-      {"0x1.2.3.4", false, ""}, {"1.2.3.4/24", false, ""}, {" 1.2.3.4", false, ""},
-      {"1.2.3.4 ", false, ""},  {"4294967295", false, ""}, {"99999999999.1.1.1", false, ""},
-      {"", false, ""},
+      {"1.2.3.00", false, ""},   {"256.1.1.1", false, ""},  {"1.2.3", false, ""},
+      {"1.2.3.4.5", false, ""},  {"1..3.4", false, ""},     {".1.2.3", false, ""},
+      {"1.2.3.4.", false, ""},   {"+1.2.3.4", false, ""},   {"1.2.3.-4", false, ""},
+      {"0x1.2.3.4", false, ""},  {"1.2.3.4/24", false, ""}, {" 1.2.3.4", false, ""},
+      {"1.2.3.4 ", false, ""},   {"4294967295", false, ""}, {"99999999999.1.1.1", false, ""},
+      {"", false, ""},           {"10.0.100.0", true, ""},  {"1.2.3.256", false, ""},
+      {"1.2.3.0255", false, ""}, {"1.2.3.4..", false, ""},  {"1.2.3.", false, ""},
   };
   for (const Case& c : cases) {
     EXPECT_EQ(c.valid, Ipv4Address::IsValidAddress(c.text)) << c.text;

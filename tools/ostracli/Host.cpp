@@ -24,8 +24,10 @@
 #include <cstring>
 #include <dirent.h>
 #include <dlfcn.h>
+#include <ostream>
 #include <sstream>
 #include <stdexcept>
+#include <streambuf>
 #include <unistd.h>
 
 #ifndef OSTRA_VERSION
@@ -42,6 +44,28 @@ namespace Ostra {
 using namespace Fabrik;
 
 namespace {
+
+/// A stream buffer that appends to a string: formatters write the result
+/// straight into the command's output text, without a buffer of their own and
+/// a copy of it (a listing may be megabytes long).
+class AppendBuffer final : public std::streambuf {
+public:
+  explicit AppendBuffer(std::string& text) : text_(text) {}
+
+protected:
+  int_type overflow(int_type c) override {
+    if (!traits_type::eq_int_type(c, traits_type::eof()))
+      text_ += traits_type::to_char_type(c);
+    return traits_type::not_eof(c);
+  }
+  std::streamsize xsputn(const char* data, std::streamsize count) override {
+    text_.append(data, static_cast<std::size_t>(count));
+    return count;
+  }
+
+private:
+  std::string& text_; ///< Destination.
+};
 
 std::string ExecutableDirectory() {
   char buffer[PATH_MAX];
@@ -279,18 +303,17 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
         params.Set(key, value);
     for (const auto& [key, value] : global.params)
       params.Set(key, value);
-    std::ostringstream text;
+    AppendBuffer buffer(out);
+    std::ostream text(&buffer);
     formatter->Write(text, root, params);
-    out += text.str();
   }
   for (const std::string& message : output->GetErrorMessages())
     err += message + "\n";
   return output->HasError() ? ExitCommandError : ExitOk;
 }
 
-int RunHost(int argc, char** argv) {
+int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
   std::vector<std::string> args(argv + 1, argv + argc);
-  std::unique_ptr<CommandTree> tree;
   try {
     tree = CommandTree::Load(DefaultPluginDirectory());
   } catch (const std::exception& e) {

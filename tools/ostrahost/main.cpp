@@ -4,6 +4,8 @@
 //   ostrahost import FILE [--host PATH]      (FILE "-" reads standard input)
 //   ostrahost export [--host PATH]
 //   ostrahost profile NAME
+//   ostrahost generate PATH [--routes N] [--portgroups N] [--vms N]
+//                           [--ports-per-vm N] [--neighbours N] [--hosts-entries N]
 //
 // The host defaults to $OSTRACLI_HOST, else the default host of ostracli.
 //
@@ -21,6 +23,7 @@
 #include <sstream>
 #include <string>
 #include <sys/stat.h>
+#include <utility>
 #include <vector>
 
 namespace {
@@ -33,6 +36,15 @@ const char* const kUsage =
     "                                               created when it does not exist)\n"
     "  ostrahost export [--host PATH]               print the host as a JSON host description\n"
     "  ostrahost profile NAME                       print a built-in profile (demo, empty)\n"
+    "  ostrahost generate PATH [SIZES]              create a large host: the demo host grown to\n"
+    "                                               SIZES, all optional:\n"
+    "      --routes N          IPv4 routes on defaultTcpipStack (default 10000)\n"
+    "      --portgroups N      port groups over the standard switches (default 4000)\n"
+    "      --vms N             VMs over the standard switches (default 1000)\n"
+    "      --ports-per-vm N    ports of each VM (default 4); all VM ports must fit\n"
+    "                          the 4608 ports of the standard switches\n"
+    "      --neighbours N      IPv4 neighbours of tvk0 (default 0)\n"
+    "      --hosts-entries N   hosts entries (default 0)\n"
     "\n"
     "The host is --host, else $OSTRACLI_HOST, else the default host of ostracli.\n";
 
@@ -77,6 +89,30 @@ void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
   }
 }
 
+/// Reads a non-negative count; false when \p text is not one.
+bool ParseCount(const std::string& text, int64_t& value) {
+  if (text.empty() || text.size() > 9 || text.find_first_not_of("0123456789") != std::string::npos)
+    return false;
+  value = std::stoll(text);
+  return true;
+}
+
+/// Creates \p path as a generated host; a failure leaves no file behind.
+void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) {
+  Model::CheckHostSizes(sizes);
+  std::unique_ptr<Model::Store> store = Model::Store::Create(path);
+  try {
+    Model::GenerateHost(*store, sizes);
+    // The whole host in the database file itself, so that it can be copied.
+    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+  } catch (...) {
+    store.reset();
+    for (const char* suffix : {"", "-wal", "-shm"})
+      std::remove((path + suffix).c_str());
+    throw;
+  }
+}
+
 } // namespace
 
 int main(int argc, char** argv) {
@@ -88,9 +124,29 @@ int main(int argc, char** argv) {
   std::string command = args[0];
   std::vector<std::string> positional;
   std::string host, profile = "demo";
+  Model::HostSizes sizes;
+  const std::pair<const char*, int64_t*> sizeOptions[] = {
+      {"--routes", &sizes.routes},
+      {"--portgroups", &sizes.portgroups},
+      {"--vms", &sizes.vms},
+      {"--ports-per-vm", &sizes.portsPerVm},
+      {"--neighbours", &sizes.neighbours},
+      {"--hosts-entries", &sizes.hostsEntries},
+  };
+  bool sized = false;
   for (std::size_t i = 1; i < args.size(); ++i) {
     const std::string& arg = args[i];
-    if (arg == "--host" || arg == "--profile") {
+    int64_t* size = nullptr;
+    for (const auto& [name, target] : sizeOptions)
+      if (arg == name)
+        size = target;
+    if (size) {
+      if (i + 1 >= args.size())
+        return Usage("option " + arg + " requires a value");
+      if (!ParseCount(args[++i], *size))
+        return Usage("option " + arg + " takes a count, not \"" + args[i] + "\"");
+      sized = true;
+    } else if (arg == "--host" || arg == "--profile") {
       if (i + 1 >= args.size())
         return Usage("option " + arg + " requires a value");
       (arg == "--host" ? host : profile) = args[++i];
@@ -100,6 +156,8 @@ int main(int argc, char** argv) {
       positional.push_back(arg);
     }
   }
+  if (sized && command != "generate")
+    return Usage("only generate takes sizes");
   try {
     if (command == "init") {
       if (positional.size() != 1)
@@ -107,6 +165,14 @@ int main(int argc, char** argv) {
       if (Exists(positional[0]))
         return Fail("the file " + positional[0] + " exists already");
       WriteHost(positional[0], Model::Profile(profile));
+      return 0;
+    }
+    if (command == "generate") {
+      if (positional.size() != 1)
+        return Usage("generate takes one PATH");
+      if (Exists(positional[0]))
+        return Fail("the file " + positional[0] + " exists already");
+      WriteGeneratedHost(positional[0], sizes);
       return 0;
     }
     if (command == "import") {

@@ -7,8 +7,11 @@
 //===----------------------------------------------------------------------===//
 #include "FormatInternal.h"
 
+#include <charconv>
+#include <deque>
 #include <ostream>
-#include <sstream>
+#include <string>
+#include <vector>
 
 namespace Fabrik::Format::Detail {
 
@@ -23,53 +26,83 @@ namespace {
 
 /// Blanks of indent per nesting level.
 constexpr std::size_t IndentStep = 2;
+/// Bytes of text the writer keeps before passing them on to its sink.
+constexpr std::size_t FlushSize = 64 * 1024;
 
-void WriteString(std::ostream& out, const std::string& text) {
+/// True for a byte that a JSON string holds as it is.
+inline bool IsPlain(unsigned char c) {
+  return c >= 0x20 && c < 0x80 && c != '"' && c != '\\';
+}
+
+void WriteString(std::string& out, const std::string& text) {
   static const char Hex[] = "0123456789abcdef";
-  out << '"';
+  out += '"';
   std::size_t pos = 0;
   while (pos < text.size()) {
+    // Runs of plain bytes, nearly all of most texts, are copied at once.
+    std::size_t run = pos;
+    while (run < text.size() && IsPlain(static_cast<unsigned char>(text[run])))
+      ++run;
+    out.append(text, pos, run - pos);
+    pos = run;
+    if (pos >= text.size())
+      break;
     const unsigned char c = static_cast<unsigned char>(text[pos]);
     if (c == '"' || c == '\\') {
-      out << '\\' << static_cast<char>(c);
+      out += '\\';
+      out += static_cast<char>(c);
       ++pos;
     } else if (c < 0x20) {
-      out << "\\u00" << Hex[c >> 4] << Hex[c & 0xF];
-      ++pos;
-    } else if (c < 0x80) {
-      out << static_cast<char>(c);
+      out += "\\u00";
+      out += Hex[c >> 4];
+      out += Hex[c & 0xF];
       ++pos;
     } else if (std::size_t length = Utf8SequenceLength(text, pos)) {
-      out.write(text.data() + pos, static_cast<std::streamsize>(length));
+      out.append(text, pos, length);
       pos += length;
     } else {
-      out << "\\ufffd";
+      out += "\\ufffd";
       ++pos;
     }
   }
-  out << '"';
+  out += '"';
 }
 
 /// Writes JSON values either pretty-printed (one item or member per line) or
-/// compact (one line, no blanks).
+/// compact (one line, no blanks) into a text buffer.
 class JsonWriter {
 public:
-  JsonWriter(std::ostream& out, const Parameters& params, bool pretty)
-      : out_(out), params_(params), pretty_(pretty) {}
+  /// Writes into \p out; with a \p sink, the text written so far is passed
+  /// on to it in pieces, so that a long listing is not held twice.
+  JsonWriter(std::string& out, const Parameters& params, bool pretty, std::ostream* sink = nullptr)
+      : out_(out), params_(params), pretty_(pretty), sink_(sink) {}
+
+  /// Passes the text written so far on to the sink.
+  void Flush() {
+    if (sink_ && !out_.empty()) {
+      sink_->write(out_.data(), static_cast<std::streamsize>(out_.size()));
+      out_.clear();
+    }
+  }
 
   /// Writes \p value; the caller has written the indent of its first line.
   void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
     if (!IsShown(value)) {
-      out_ << "null";
+      out_ += "null";
       return;
     }
     switch (value->GetType()) {
     case MetaObj::Boolean:
-      out_ << (static_cast<const MetaBool&>(*value).GetValue() ? "true" : "false");
+      out_ += static_cast<const MetaBool&>(*value).GetValue() ? "true" : "false";
       return;
-    case MetaObj::Integer:
-      out_ << static_cast<const MetaInt&>(*value).GetValue();
+    case MetaObj::Integer: {
+      char digits[24];
+      auto end = std::to_chars(digits, digits + sizeof digits,
+                               static_cast<const MetaInt&>(*value).GetValue())
+                     .ptr;
+      out_.append(digits, end);
       return;
+    }
     case MetaObj::String:
       WriteString(out_, static_cast<const MetaString&>(*value).GetValue());
       return;
@@ -80,60 +113,133 @@ public:
       Object(static_cast<const MetaStruct&>(*value), indent, atRoot);
       return;
     }
-    out_ << "null";
+    out_ += "null";
   }
 
 private:
+  /// The fields chosen for structures of one name and layout; the rows of a
+  /// list share it, so the formatter parameters are read once per list.
+  struct Selection {
+    std::string name;                 ///< Structure name.
+    bool atRoot = false;              ///< Chosen for the root level.
+    std::vector<std::string> layout;  ///< Field names of the structure, in order.
+    std::vector<std::size_t> indices; ///< Indices of the chosen fields, in order.
+    /// What precedes each chosen field's value at indent prefixIndent: the
+    /// line break and indent (pretty) and the quoted name with its colon.
+    std::vector<std::string> prefixes;
+    std::size_t prefixIndent = std::string::npos; ///< Indent of prefixes.
+  };
+
+  static bool SameLayout(const Selection& selection, const MetaStruct& value) {
+    const std::vector<MetaStruct::Field>& fields = value.GetFields();
+    if (fields.size() != selection.layout.size())
+      return false;
+    for (std::size_t i = 0; i < fields.size(); ++i)
+      if (fields[i].name != selection.layout[i])
+        return false;
+    return true;
+  }
+
+  Selection& Select(const MetaStruct& value, bool atRoot) {
+    for (Selection& selection : selections_)
+      if (selection.atRoot == atRoot && selection.name == value.GetName() &&
+          SameLayout(selection, value))
+        return selection;
+    Selection selection;
+    selection.name = value.GetName();
+    selection.atRoot = atRoot;
+    const std::vector<MetaStruct::Field>& fields = value.GetFields();
+    for (const MetaStruct::Field& field : fields)
+      selection.layout.push_back(field.name);
+    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine))
+      selection.indices.push_back(static_cast<std::size_t>(field - fields.data()));
+    selections_.push_back(std::move(selection));
+    return selections_.back();
+  }
+
+  /// The prefixes of \p selection's fields for members at \p indent.
+  const std::vector<std::string>& Prefixes(Selection& selection, const MetaStruct& value,
+                                           std::size_t indent) {
+    if (selection.prefixIndent == indent)
+      return selection.prefixes;
+    selection.prefixes.clear();
+    for (std::size_t index : selection.indices) {
+      std::string prefix;
+      if (pretty_) {
+        prefix += '\n';
+        prefix.append(indent, ' ');
+      }
+      WriteString(prefix, value.GetFields()[index].name);
+      prefix += pretty_ ? ": " : ":";
+      selection.prefixes.push_back(std::move(prefix));
+    }
+    selection.prefixIndent = indent;
+    return selection.prefixes;
+  }
+
   /// Starts the next item or member of a container at \p indent.
   void Separate(bool first, std::size_t indent) {
     if (!first)
-      out_ << ',';
-    if (pretty_)
-      out_ << '\n' << std::string(indent, ' ');
+      out_ += ',';
+    if (pretty_) {
+      out_ += '\n';
+      out_.append(indent, ' ');
+    }
   }
 
   /// Ends a non-empty container whose opening line is at \p indent.
   void Close(char bracket, std::size_t indent) {
-    if (pretty_)
-      out_ << '\n' << std::string(indent, ' ');
-    out_ << bracket;
+    if (pretty_) {
+      out_ += '\n';
+      out_.append(indent, ' ');
+    }
+    out_ += bracket;
   }
 
   void Array(const MetaList& list, std::size_t indent, bool atRoot) {
-    out_ << '[';
+    out_ += '[';
     bool first = true;
     for (const MetaObjectPtr& item : list.GetItems()) {
       Separate(first, indent + IndentStep);
       first = false;
       Value(item, indent + IndentStep, atRoot);
+      if (out_.size() >= FlushSize)
+        Flush();
     }
     if (first)
-      out_ << ']';
+      out_ += ']';
     else
       Close(']', indent);
   }
 
   void Object(const MetaStruct& value, std::size_t indent, bool atRoot) {
-    out_ << '{';
+    out_ += '{';
     bool first = true;
-    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine)) {
-      if (!IsShown(field->value))
+    // Selections live in a deque: writing nested structures may add some
+    // without moving this one, but may change its prefixes (a structure of
+    // the same kind at another depth), so they are looked up per field.
+    Selection& selection = Select(value, atRoot);
+    for (std::size_t i = 0; i < selection.indices.size(); ++i) {
+      const MetaStruct::Field& field = value.GetFields()[selection.indices[i]];
+      if (!IsShown(field.value))
         continue;
-      Separate(first, indent + IndentStep);
+      if (!first)
+        out_ += ',';
       first = false;
-      WriteString(out_, field->name);
-      out_ << (pretty_ ? ": " : ":");
-      Value(field->value, indent + IndentStep, false);
+      out_ += Prefixes(selection, value, indent + IndentStep)[i];
+      Value(field.value, indent + IndentStep, false);
     }
     if (first)
-      out_ << '}';
+      out_ += '}';
     else
       Close('}', indent);
   }
 
-  std::ostream& out_;        ///< Destination.
-  const Parameters& params_; ///< Formatter parameters.
-  bool pretty_;              ///< One item or member per line, indented.
+  std::string& out_;                 ///< Destination.
+  const Parameters& params_;         ///< Formatter parameters.
+  bool pretty_;                      ///< One item or member per line, indented.
+  std::ostream* sink_;               ///< Where Flush passes the text on, if anywhere.
+  std::deque<Selection> selections_; ///< Fields chosen so far, by structure.
 };
 
 class JsonFormatter final : public Formatter {
@@ -142,9 +248,11 @@ public:
              const Parameters& params) const override {
     if (!root)
       return;
-    JsonWriter writer(out, params, /*pretty=*/true);
+    std::string text;
+    JsonWriter writer(text, params, /*pretty=*/true, &out);
     writer.Value(root, 0, /*atRoot=*/true);
-    out << '\n';
+    text += '\n';
+    writer.Flush();
   }
   bool IsMachineFormat() const override { return true; }
 };
@@ -152,10 +260,10 @@ public:
 } // namespace
 
 std::string CompactJson(const MetaObjectPtr& value, const Parameters& params) {
-  std::ostringstream out;
+  std::string out;
   JsonWriter writer(out, params, /*pretty=*/false);
   writer.Value(value, 0, /*atRoot=*/false);
-  return out.str();
+  return out;
 }
 
 std::unique_ptr<Formatter> MakeJsonFormatter() {

@@ -10,6 +10,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -37,6 +38,32 @@ std::vector<std::string> ProfileNames();
 /// Creates the store file at \p path from the demo profile, making the
 /// directories it needs; safe when several processes do it at once.
 void CreateDemoHost(const std::string& path);
+
+/// Sizes of a generated host (ostrahost generate).
+struct HostSizes {
+  int64_t routes = 10000;    ///< IPv4 routes on the default netstack.
+  int64_t portgroups = 4000; ///< Port groups, spread over the standard switches.
+  int64_t vms = 1000;        ///< VMs, spread over the standard switches.
+  int64_t portsPerVm = 4;    ///< Ports of each VM.
+  int64_t neighbours = 0;    ///< IPv4 neighbours of tvk0.
+  int64_t hostsEntries = 0;  ///< Hosts entries.
+
+  static constexpr int64_t kMaxRoutes = 2000000;
+  static constexpr int64_t kMaxPortGroups = 100000;
+  static constexpr int64_t kMaxVms = 4608;
+  static constexpr int64_t kMaxPortsPerVm = 64;
+  static constexpr int64_t kMaxNeighbours = 1000000;
+  static constexpr int64_t kMaxHostsEntries = 1000000;
+};
+
+/// Throws HostCtl::Lib::HostCtlException naming the first size out of range.
+void CheckHostSizes(const HostSizes& sizes);
+
+/// Fills \p store, a new empty store, with the demo host grown to \p sizes,
+/// in one transaction (docs/host-state.md, "Generated hosts"). Throws
+/// HostCtl::Lib::HostCtlException when the sizes do not fit the host's limits
+/// (the VM ports must fit on the standard switches); nothing is written then.
+void GenerateHost(Store& store, const HostSizes& sizes);
 
 /// The demo profile's fragments, embedded at build time.
 std::vector<std::string_view> DemoProfileFragments();

@@ -59,6 +59,9 @@ public:
   bool Step();
   /// Steps to completion (statements that return no rows).
   void Run();
+  /// Makes the statement ready to run again; bind every parameter anew
+  /// before the next Step or Run (bulk inserts reuse one statement so).
+  void Reset();
 
   int64_t Int(int column) const;
   std::string Text(int column) const;

@@ -40,19 +40,39 @@ bool ParseDecimal(const std::string& text, std::size_t begin, std::size_t end, u
   return true;
 }
 
+/// Four decimal octets (0 to 255, no leading zeros) separated by dots, in one
+/// pass: listings parse a stored address or two for every row.
 bool ParseIpv4Range(const std::string& text, std::size_t begin, std::size_t end, uint32_t& value) {
   uint32_t result = 0;
-  std::size_t pos = begin;
-  for (int part = 0; part < 4; ++part) {
-    std::size_t dot = part < 3 ? text.find('.', pos) : end;
-    if (dot == std::string::npos || dot > end)
+  int dots = 0;
+  unsigned octet = 0;
+  std::size_t digits = 0;
+  bool leadingZero = false;
+  for (std::size_t i = begin; i <= end; ++i) {
+    if (i == end || text[i] == '.') {
+      if (digits == 0 || (leadingZero && digits > 1))
+        return false;
+      result = (result << 8) | octet;
+      if (i == end)
+        break;
+      if (++dots > 3)
+        return false;
+      octet = 0;
+      digits = 0;
+      continue;
+    }
+    char c = text[i];
+    if (c < '0' || c > '9')
       return false;
-    unsigned octet = 0;
-    if (!ParseDecimal(text, pos, dot, 255, octet))
+    if (digits == 0)
+      leadingZero = c == '0';
+    octet = octet * 10 + static_cast<unsigned>(c - '0');
+    if (octet > 255)
       return false;
-    result = (result << 8) | octet;
-    pos = dot + 1;
+    ++digits;
   }
+  if (dots != 3)
+    return false;
   value = result;
   return true;
 }
@@ -132,10 +152,21 @@ bool Ipv4Address::IsValidAddress(const std::string& text) {
 }
 
 std::string Ipv4Address::GetStringAddress() const {
+  // Written by hand: listings of many routes format several addresses a row,
+  // and snprintf was most of their cost.
   char text[16];
-  std::snprintf(text, sizeof text, "%u.%u.%u.%u", value_ >> 24, (value_ >> 16) & 0xff,
-                (value_ >> 8) & 0xff, value_ & 0xff);
-  return text;
+  char* end = text;
+  for (int shift = 24; shift >= 0; shift -= 8) {
+    unsigned byte = (value_ >> shift) & 0xff;
+    if (byte >= 100)
+      *end++ = static_cast<char>('0' + byte / 100);
+    if (byte >= 10)
+      *end++ = static_cast<char>('0' + byte / 10 % 10);
+    *end++ = static_cast<char>('0' + byte % 10);
+    if (shift)
+      *end++ = '.';
+  }
+  return std::string(text, end);
 }
 
 bool Ipv4Address::IsNetmask() const {

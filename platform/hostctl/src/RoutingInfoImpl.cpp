@@ -79,6 +79,11 @@ void RoutingInfoImpl::Refresh() {
   sources_.clear();
 }
 
+uint64_t RoutingInfoImpl::SourceKey(const Ipv4Network& network) {
+  return (uint64_t{network.GetNetwork().GetValue()} << 8) |
+         static_cast<uint64_t>(network.GetPrefixLength());
+}
+
 // --- IPv4 routes -------------------------------------------------------------
 
 std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType selector) {
@@ -100,7 +105,7 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
           mask == 0 || !Ipv4Address(mask).IsNetmask())
         continue;
       Ipv4Network network(Ipv4Address(address & mask), Ipv4Address(mask));
-      sources_.emplace(network.GetStringAddress(), SOURCE_CONNECTED);
+      sources_.emplace(SourceKey(network), SOURCE_CONNECTED);
       routes.emplace_back(network, Ipv4Address(), nics.Text(0));
     }
     Statement rows = store.Prepare(
@@ -110,7 +115,7 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
     while (rows.Step()) {
       Ipv4Network network(Ipv4Address(rows.Text(0)),
                           Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));
-      sources_.emplace(network.GetStringAddress(), rows.Text(4));
+      sources_.emplace(SourceKey(network), rows.Text(4));
       routes.emplace_back(network, Ipv4Address(rows.Text(2)), rows.Text(3));
     }
   });
@@ -196,7 +201,7 @@ void RoutingInfoImpl::SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool
 std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network) {
   Store& store = Store::Host();
   store.CheckFault("GetDefaultGatewaySource", netstack_);
-  auto known = sources_.find(network.GetStringAddress());
+  auto known = sources_.find(SourceKey(network));
   if (known != sources_.end())
     return known->second;
   return store.Read([&] {

@@ -11,6 +11,7 @@
 #include "HostCtl/Network/PortsetGetType.h"
 #include "HostCtl/Network/Routing.h"
 
+#include <cstdint>
 #include <string>
 #include <unordered_map>
 #include <vector>
@@ -98,8 +99,10 @@ public:
 
 private:
   std::string netstack_; ///< Key of the netstack instance.
-  /// Sources of the routes the last IPv4 listing returned, by network text.
-  std::unordered_map<std::string, std::string> sources_;
+  /// The key of \p network in sources_: its address and prefix length.
+  static uint64_t SourceKey(const HostCtl::Network::Ipv4Network& network);
+  /// Sources of the routes the last IPv4 listing returned, by SourceKey.
+  std::unordered_map<uint64_t, std::string> sources_;
 };
 
 } // namespace TvkCtl::Network
