@@ -2,12 +2,14 @@
 #include "model/Store.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "HostCtl/Session.h"
 #include "model/CoreModel.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <fstream>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -312,6 +314,54 @@ TEST_F(StoreTest, FullDiskChangesNothing) {
               "The host state at " + path_ + " cannot be changed: the disk is full");
   }
   EXPECT_FALSE(store->Read([&] { return Model::GetSetting(*store, "key0").has_value(); }));
+}
+
+} // namespace
+
+namespace {
+
+/// The journal mode and synchronous level of the connection, read inside the
+/// transaction that is about to commit.
+std::pair<std::string, int64_t> Durability(Model::Store& store) {
+  Model::Statement mode = store.Prepare("PRAGMA journal_mode");
+  mode.Step();
+  Model::Statement sync = store.Prepare("PRAGMA synchronous");
+  sync.Step();
+  return {mode.Text(0), sync.Int(0)};
+}
+
+TEST_F(StoreTest, EveryWritePathCommitsInWalModeWithFullSync) {
+  const std::pair<std::string, int64_t> durable{"wal", 2};
+  // A new store, and the import that fills it.
+  auto created = Model::Store::Create(path_);
+  EXPECT_EQ(created->Write([&] { return Durability(*created); }), durable) << "Create";
+  Model::ImportHost(*created, TwoNics());
+  created.reset();
+  // An existing store opened by path (ostrahost, the tests).
+  {
+    Model::Store opened(path_);
+    EXPECT_EQ(opened.Write([&] { return Durability(opened); }), durable) << "opened by path";
+  }
+  // The process's host store, one command at a time and as a batch.
+  Model::Store::SetPath(path_);
+  Model::Store& host = Model::Store::Host();
+  EXPECT_EQ(host.Write([&] { return Durability(host); }), durable) << "host store";
+  HostCtl::Session::BeginBatch();
+  EXPECT_EQ(host.Write([&] { return Durability(host); }), durable) << "batch";
+  HostCtl::Session::EndBatch(true);
+  Model::Store::CloseHost();
+  // The default host, created from the demo profile on first use.
+  Model::Store::SetPath("");
+  const char* env = std::getenv("OSTRACLI_HOST");
+  const std::string saved = env ? env : "";
+  ::setenv("XDG_STATE_HOME", (dir_ + "/state").c_str(), 1);
+  ::unsetenv("OSTRACLI_HOST");
+  Model::Store& fresh = Model::Store::Host();
+  EXPECT_EQ(fresh.GetPath(), dir_ + "/state/ostracli/host.db");
+  EXPECT_EQ(fresh.Write([&] { return Durability(fresh); }), durable) << "default host";
+  ::unsetenv("XDG_STATE_HOME");
+  if (!saved.empty())
+    ::setenv("OSTRACLI_HOST", saved.c_str(), 1);
 }
 
 } // namespace
