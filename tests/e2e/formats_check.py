@@ -8,6 +8,7 @@ JSON parser; simple and table must not fail.
 
     formats_check.py OSTRACLI OSTRAHOST
 """
+import concurrent.futures
 import csv
 import io
 import json
@@ -45,37 +46,43 @@ def main():
                     commands.append(sub)
 
         walk(["network"])
-        passed = failed = 0
         xmllint = shutil.which("xmllint")
-        for path in commands:
-            for fmt in ("simple", "table", "json", "xml", "csv", "keyvalue"):
-                done = run(["--formatter", fmt] + path)
-                problem = None
-                if done.returncode not in (0, 1):
-                    problem = f"exit status {done.returncode}"
-                elif fmt == "json" and done.stdout:
-                    try:
-                        json.loads(done.stdout)
-                    except ValueError as error:
-                        problem = f"not JSON: {error}"
-                elif fmt == "xml" and done.stdout and xmllint:
-                    lint = subprocess.run([xmllint, "--noout", "-"], input=done.stdout,
-                                          capture_output=True)
-                    if lint.returncode:
-                        problem = "not well-formed: " + lint.stderr.decode()[:200]
-                elif fmt == "csv" and done.stdout:
-                    try:
-                        rows = list(csv.reader(io.StringIO(done.stdout.decode(), newline=""),
-                                               strict=True))
-                        if len({len(row) for row in rows}) > 1:
-                            problem = "rows of different lengths"
-                    except csv.Error as error:
-                        problem = f"not CSV: {error}"
-                if problem:
-                    failed += 1
-                    print(f"{' '.join(path)} --formatter {fmt}: {problem}")
-                else:
-                    passed += 1
+        def check(path, fmt):
+            done = run(["--formatter", fmt] + path)
+            if done.returncode not in (0, 1):
+                return f"exit status {done.returncode}"
+            if fmt == "json" and done.stdout:
+                try:
+                    json.loads(done.stdout)
+                except ValueError as error:
+                    return f"not JSON: {error}"
+            elif fmt == "xml" and done.stdout and xmllint:
+                lint = subprocess.run([xmllint, "--noout", "-"], input=done.stdout,
+                                      capture_output=True)
+                if lint.returncode:
+                    return "not well-formed: " + lint.stderr.decode()[:200]
+            elif fmt == "csv" and done.stdout:
+                try:
+                    rows = list(csv.reader(io.StringIO(done.stdout.decode(), newline=""),
+                                           strict=True))
+                    if len({len(row) for row in rows}) > 1:
+                        return "rows of different lengths"
+                except csv.Error as error:
+                    return f"not CSV: {error}"
+            return None
+
+        runs = [(path, fmt) for path in commands
+                for fmt in ("simple", "table", "json", "xml", "csv", "keyvalue")]
+        # The commands only read the host, so they run in parallel.
+        with concurrent.futures.ThreadPoolExecutor(max_workers=os.cpu_count() or 1) as pool:
+            problems = list(pool.map(lambda run_: check(*run_), runs))
+        passed = failed = 0
+        for (path, fmt), problem in zip(runs, problems):
+            if problem:
+                failed += 1
+                print(f"{' '.join(path)} --formatter {fmt}: {problem}")
+            else:
+                passed += 1
         print(f"{len(commands)} commands; {passed} passed, {failed} failed")
         return 1 if failed or not commands else 0
 

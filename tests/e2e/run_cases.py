@@ -17,6 +17,7 @@ changes of earlier ones. Run with --update to rewrite the expected output from
 what the tools print now; review the diff before committing it.
 """
 import argparse
+import concurrent.futures
 import os
 import pathlib
 import shlex
@@ -28,12 +29,15 @@ import tempfile
 def parse_case(path):
     host = None
     steps = []
+    comments = []  # comment lines met since the last step, kept for --update
     for number, raw in enumerate(path.read_text(encoding="utf-8").split("\n"), 1):
         line = raw
         if line.startswith("host:"):
             host = line[5:].strip()
         elif line.startswith("$ "):
-            steps.append({"command": line[2:], "out": [], "err": [], "status": 0, "line": number})
+            steps.append({"command": line[2:], "out": [], "err": [], "status": 0, "line": number,
+                          "comments": comments if steps else []})
+            comments = []
         elif line.startswith(">") or line.startswith("!") or line.startswith("?"):
             if not steps:
                 raise ValueError(f"{path}:{number}: output before any command")
@@ -44,7 +48,9 @@ def parse_case(path):
                 steps[-1]["err"].append(body)
             else:
                 steps[-1]["status"] = int(body)
-        elif line.strip() == "" or line.startswith("#"):
+        elif line.startswith("#"):
+            comments.append(line)
+        elif line.strip() == "":
             continue
         else:
             raise ValueError(f"{path}:{number}: unrecognised line: {raw!r}")
@@ -110,6 +116,7 @@ def write_case(path, host, steps):
         header.pop()
     text = "\n".join(header) + "\n"
     for step in steps:
+        text += "".join("\n" + c for c in step.get("comments", []))
         text += "\n$ " + step["command"] + "\n"
         text += "".join((">" + (" " + l if l else "")) + "\n" for l in step["out"])
         text += "".join(("!" + (" " + l if l else "")) + "\n" for l in step["err"])
@@ -123,18 +130,26 @@ def main():
     parser.add_argument("--ostrahost", required=True)
     parser.add_argument("--cases", required=True)
     parser.add_argument("--update", action="store_true", help="rewrite expected output")
+    parser.add_argument("--jobs", type=int, default=os.cpu_count() or 1,
+                        help="case files run at once (default: one per core)")
     parser.add_argument("filter", nargs="*", help="only case files whose path contains one of these")
     args = parser.parse_args()
     tools = {"ostracli": os.path.abspath(args.ostracli), "ostrahost": os.path.abspath(args.ostrahost)}
     cases = sorted(pathlib.Path(args.cases).rglob("*.case"))
     if args.filter:
         cases = [c for c in cases if any(f in str(c) for f in args.filter)]
-    passed = failed = 0
-    for case in cases:
+    def run(case):
         try:
-            failures, parsed = run_case(case, tools, args.update)
+            return run_case(case, tools, args.update)
         except ValueError as error:
-            failures, parsed = [str(error)], None
+            return [str(error)], None
+
+    passed = failed = 0
+    # Each case file has its own host, so files run in parallel; results are
+    # reported in file order.
+    with concurrent.futures.ThreadPoolExecutor(max_workers=max(1, args.jobs)) as pool:
+        results = list(pool.map(run, cases))
+    for case, (failures, parsed) in zip(cases, results):
         if args.update and parsed:
             write_case(case, *parsed)
         if failures:

@@ -19,7 +19,10 @@ namespace {
 
 Model::Store& Scratch() {
   static std::unique_ptr<Model::Store> store = [] {
-    std::string path = "/tmp/ostra-import-fuzz-" + std::to_string(::getpid()) + ".db";
+    // On tmpfs the store's synchronous commits cost nothing, which makes the
+    // fuzzer many times faster.
+    const char* dir = ::access("/dev/shm", W_OK) == 0 ? "/dev/shm" : "/tmp";
+    std::string path = std::string(dir) + "/ostra-import-fuzz-" + std::to_string(::getpid()) + ".db";
     for (const char* suffix : {"", "-wal", "-shm"})
       ::unlink((path + suffix).c_str());
     return Model::Store::Create(path);

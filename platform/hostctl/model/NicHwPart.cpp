@@ -52,7 +52,8 @@ constexpr int64_t kU8Max = std::numeric_limits<uint8_t>::max();
 
 /// Refuses keys of \p object that are not in \p keys.
 void CheckKnown(const JsonObject& object, std::initializer_list<const char*> keys) {
-  for (const auto& [key, value] : object.Json().items()) {
+  for (const auto& item : object.Json().items()) {
+    const std::string& key = item.key();
     bool known = std::any_of(keys.begin(), keys.end(), [&](const char* k) { return key == k; });
     if (!known)
       object.Fail(key.c_str(), "unknown field");
@@ -195,7 +196,8 @@ ordered_json Encode(const PnicOffloadSettings& in) {
 
 void Decode(const ordered_json& json, const std::string& path, PnicCoalesceParams& out) {
   JsonObject o(json, path);
-  for (const auto& [key, value] : json.items()) {
+  for (const auto& item : json.items()) {
+    const std::string& key = item.key();
     bool known = key == "adaptiveRx" || key == "adaptiveTx" ||
                  std::any_of(std::begin(kCoalesceFields), std::end(kCoalesceFields),
                              [&](const CoalesceField& f) { return key == f.key; });

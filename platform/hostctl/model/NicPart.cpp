@@ -209,7 +209,8 @@ std::vector<uint32_t> CodesFromJson(const std::string& text) {
 
 /// Refuses keys of a nested object that are not in \p allowed.
 void CheckObjectKeys(const JsonObject& object, std::initializer_list<const char*> allowed) {
-  for (const auto& [key, value] : object.Json().items()) {
+  for (const auto& item : object.Json().items()) {
+    const std::string& key = item.key();
     bool known =
         std::any_of(allowed.begin(), allowed.end(), [&](const char* name) { return key == name; });
     if (!known)
@@ -223,7 +224,8 @@ void ReadCounters(const std::optional<JsonObject>& object,
                   const std::array<CounterKey<Record>, N>& keys, Record& record) {
   if (!object)
     return;
-  for (const auto& [key, value] : object->Json().items()) {
+  for (const auto& item : object->Json().items()) {
+    const std::string& key = item.key();
     bool known = std::any_of(keys.begin(), keys.end(),
                              [&](const CounterKey<Record>& k) { return key == k.key; });
     if (!known)
