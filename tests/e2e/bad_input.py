@@ -15,6 +15,8 @@ as:
                 key for the text parameters of OUTSIDE_TEXT
     overflow    2^63, one past the largest 64-bit integer
     empty       the empty string ("--flag=" for a flag)
+    4k          4096 bytes, the longest value the command host passes on, for
+                a text parameter without a constraint
     long        1 MiB of text (through "--batch -": a single argument string
                 of that size exceeds the kernel's limit and execve fails with
                 E2BIG)
@@ -47,13 +49,16 @@ import tempfile
 import time
 
 TIMEOUT = 20
-CASES = ("missing", "type", "outside", "overflow", "empty", "long", "utf8")
+CASES = ("missing", "type", "outside", "overflow", "empty", "4k", "long", "utf8")
 OUTCOMES = ("refused", "error", "accepted", "fault")
 # Cases whose values the command host refuses before any command code runs,
 # whatever the parameter.
 HOST_CASES = ("missing", "type", "overflow", "long", "utf8")
 MIB = 1 << 20
-MAX_MESSAGE = 1024
+# The longest option value the command host passes on.
+HOST_LIMIT = 4096
+# The longest message expected; a message may quote a 4 KiB value twice.
+MAX_MESSAGE = 2 * HOST_LIMIT + 1024
 
 # Values that exist on the demo host, by parameter name.
 GOOD = {
@@ -99,7 +104,8 @@ BASE = {
         "integrity-key": "0123456789abcdef0123"},
     "network ip ipsec sa remove": {"sa-name": "sa-store"},
     "network ip ipsec sp add": {"sp-name": "sp-plain", "sp-source": "any", "sp-destination": "any",
-                                "source-port": "0", "destination-port": "0"},
+                                "source-port": "0", "destination-port": "0", "action": "ipsec",
+                                "sa-name": "sa-store"},
     "network ip ipsec sp remove": {"sp-name": "sp-store"},
     "network ip interface add": {"portgroup-name": "VM Traffic", "interface-name": "tvk20"},
     "network ip interface remove": {"interface-name": "tvk1"},
@@ -214,7 +220,15 @@ ACCEPTED = {
         "empty reads as absent: all interfaces",
     ("network ip interface ipv6 get", "interface-name", "empty"): "empty reads as absent: all",
     ("network ip interface remove", "netstack", "empty"): "removal by name ignores the netstack",
-    ("network ip ipsec sp add", "sa-name", "empty"): "the SA name counts only with action ipsec",
+    ("network ip interface remove", "netstack", "4k"): "removal by name ignores the netstack",
+    ("network ip interface list", "netstack", "4k"): "an unknown netstack lists nothing",
+    ("network ip interface ipv4 get", "netstack", "4k"): "an unknown netstack lists nothing",
+    ("network ip interface ipv4 address list", "netstack", "4k"):
+        "an unknown netstack lists nothing",
+    ("network ip interface ipv6 get", "netstack", "4k"): "an unknown netstack lists nothing",
+    ("network ip hosts add", "comment", "4k"): "a comment is free text of any length",
+    ("network nic set", "virtual-address", "4k"): "the virtual address is free text for the driver",
+    ("network ip ipsec sp add", "sa-name", "empty"): "no SA name lets the host choose the SA",
     ("network ip netstack set", "name", "empty"): "an empty name leaves the name untouched",
     ("network ip hosts add", "comment", "empty"): "an entry may have no comment",
     ("network nic set", "phy-address", "outside"): "-1 leaves the PHY address as it is",
@@ -412,6 +426,8 @@ def bad_values(command, parameter):
                            f"the pattern {constraint['pattern']}")
         values.append(("outside", OUTSIDE_PATTERN[constraint["pattern"]]))
     values.append(("empty", ""))
+    if kind in ("string", "string list") and constraint is None:
+        values.append(("4k", "x" * HOST_LIMIT))
     values.append(("long", "x" * MIB))
     values.append(("utf8", good.encode() + b"\xff\xfe"))
     return values
