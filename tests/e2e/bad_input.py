@@ -493,7 +493,13 @@ def one_of_each_kind(commands):
 def run_command(tools, command, mib_through_batch, host_cases_for):
     """All bad runs of one command; returns (counts, faults, messages)."""
     path = command["path"]
-    base = base_args(command)
+    try:
+        base = base_args(command)
+        for parameter in command["parameters"]:
+            bad_values(command, parameter)
+    except KeyError as missing:
+        # A command or pattern the tables do not know yet.
+        return {}, [str(missing.args[0])], []
     db = tools.fresh_host("cmd")
     # counts[case][outcome], outcome one of OUTCOMES.
     counts = {}
@@ -594,4 +600,8 @@ def main():
 
 
 if __name__ == "__main__":
-    sys.exit(main())
+    try:
+        sys.exit(main())
+    except (OSError, subprocess.SubprocessError, ValueError) as error:
+        print(f"bad_input.py: {error}", file=sys.stderr)
+        sys.exit(1)
