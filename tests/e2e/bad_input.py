@@ -470,6 +470,8 @@ def check_run(path, parameter, status, out, err, batch):
         return "no message"
     if len(text) > MAX_MESSAGE:
         return f"message of {len(text)} bytes"
+    if "Sanitizer" in text or "runtime error:" in text:
+        return "sanitizer report: " + text.strip()[:400]
     if any(word in text for word in ("Internal error", "Traceback", "SQL", "sqlite")):
         # An escaped exception or the store's own words, not the command's.
         return "message: " + text.strip()[:200]
