@@ -288,9 +288,8 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   return output->HasError() ? ExitCommandError : ExitOk;
 }
 
-int RunHost(int argc, char** argv) {
+int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
   std::vector<std::string> args(argv + 1, argv + argc);
-  std::unique_ptr<CommandTree> tree;
   try {
     tree = CommandTree::Load(DefaultPluginDirectory());
   } catch (const std::exception& e) {

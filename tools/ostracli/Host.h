@@ -90,7 +90,9 @@ std::string DefaultPluginDirectory();
 int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
                    std::string& err);
 
-/// The whole program: loads the tree, runs argv, prints, returns the status.
-int RunHost(int argc, char** argv);
+/// The whole program: loads the tree into \p tree, runs argv, prints, returns
+/// the status. The caller owns the tree, so it decides whether tearing it down
+/// at the end of the process is worth the time.
+int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree);
 
 } // namespace Ostra
