@@ -367,6 +367,8 @@ TEST_F(IpServicesTest, SecurityAssociationsCheckKeysAndUniqueness) {
   IpSecConfigImpl ipsec;
   ipsec.AddSADConfig(MakeSa("sa1", 500));
   ExpectRefused([&] { ipsec.AddSADConfig(MakeSa("sa1", 501)); }, "An SA named sa1 already exists");
+  ExpectRefused([&] { ipsec.AddSADConfig(MakeSa(std::string(128, 's'), 501)); },
+                "An SA name is at most 127 bytes long");
   ExpectRefused([&] { ipsec.AddSADConfig(MakeSa("sa2", 500)); },
                 "The SA sa1 already uses destination 2001:db8:2::9 with that SPI");
   IpSecSadParam shortKey = MakeSa("sa3", 502);
@@ -411,6 +413,8 @@ TEST_F(IpServicesTest, PoliciesLoseTheirSaWhenItIsRemoved) {
   same.dstPort = 0;
   same.saName = "sa9";
   ExpectRefused([&] { ipsec.AddSPDConfig(same); }, "No SA named sa9 exists");
+  same.name = std::string(128, 'p');
+  ExpectRefused([&] { ipsec.AddSPDConfig(same); }, "An SP name is at most 127 bytes long");
 
   ipsec.RemoveSADConfig("sa1");
   // A new SA of the same name does not take over the lost binding.

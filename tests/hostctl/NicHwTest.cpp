@@ -213,6 +213,14 @@ TEST_F(NicHwTest, CoalesceKeepsTheWholeRecordAndChecksRates) {
   ExpectRefusal(
       [&] { nic.SetCoalesceParams(params); },
       "Adaptive coalescing on vmnic0 needs a sample interval of 1 to 3600 seconds, not 0");
+  // A negative delay given to a command arrives as its low 32 bits.
+  params.sampleInterval = 4;
+  params.txMaxFramesHigh = static_cast<uint32_t>(-1);
+  ExpectRefusal([&] { nic.SetCoalesceParams(params); },
+                "The coalescing high-rate TX delay packets of vmnic0 must be at most 2147483647, "
+                "not 4294967295");
+  params.txMaxFramesHigh = 0x7fffffff;
+  nic.SetCoalesceParams(params);
 }
 
 TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {

@@ -189,6 +189,10 @@ TEST_F(SwitchingTest, PortGroupsAreUniqueAndCannotBeRemovedInUse) {
   EXPECT_EQ(Message([&] { core->AddPortGroup("Storage A"); }),
             "Unable to add port group Storage A to coreSwitch: a port group of that name already "
             "exists on storageSwitch");
+  EXPECT_EQ(Message([&] { core->AddPortGroup(std::string(128, 'b')); }),
+            "Unable to add a port group to coreSwitch: the port group name is longer than 127 "
+            "bytes");
+  core->AddPortGroup(std::string(127, 'b'));
   core->AddPortGroup("Backup");
   auto backup = NetworkFactory::GetPortGroupByName("Backup");
   ASSERT_TRUE(backup);

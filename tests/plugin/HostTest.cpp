@@ -89,7 +89,16 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
       {{"-n", "a", "-n", "b"}, "option --nic-name is given more than once"},
       {{"-n", "a", "--speed", "fast"}, "option --speed: \"fast\" is not an integer"},
       {{"-n", "a", "--speed", "99999999999999999999"},
-       "option --speed: \"99999999999999999999\" is not an integer"},
+       "option --speed: \"99999999999999999999\" is outside the 64-bit integer range"},
+      {{"-n", "a", "--speed", "-9223372036854775809"},
+       "option --speed: \"-9223372036854775809\" is outside the 64-bit integer range"},
+      // Bytes that are not UTF-8 are shown escaped, so the message stays text.
+      {{"-n", "a", "--speed", "1\xff\xfe"}, "option --speed: \"1\\xff\\xfe\" is not an integer"},
+      {{"-n", "a", "-e", "caf\xc3\xa9"},
+       "option --enabled: \"caf\xc3\xa9\" is not a boolean (true/false, yes/no, on/off, 1/0)"},
+      // A long value is cut before a character that would not fit whole.
+      {{"-n", "a", "--speed", std::string(63, '9') + "\xc3\xa9"},
+       "option --speed: \"" + std::string(63, '9') + "...\" is not an integer"},
       {{"-n", "a", "--speed", "10"}, "option --speed: value 10 is not one of: 100, 1000"},
       {{"-n", "a", "--duplex", "Full"},
        "option --duplex: value \"Full\" is not one of: full, half"},

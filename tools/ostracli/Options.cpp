@@ -48,23 +48,6 @@ namespace {
 /// keeps unbounded input away from every command and from the host state.
 constexpr std::size_t kMaxValueBytes = 4096;
 
-std::string Quote(const std::string& text) {
-  // Keeps messages readable for long or binary input.
-  std::string shown = text.size() > 64 ? text.substr(0, 64) + "..." : text;
-  std::string out = "\"";
-  for (unsigned char c : shown) {
-    if (c < 0x20 || c == 0x7f) {
-      static const char hex[] = "0123456789abcdef";
-      out += "\\x";
-      out += hex[c >> 4];
-      out += hex[c & 15];
-    } else {
-      out += static_cast<char>(c);
-    }
-  }
-  return out + "\"";
-}
-
 std::string OptionName(const ParameterSpec& spec) {
   return "--" + spec.GetName();
 }
@@ -109,6 +92,44 @@ bool IsUtf8(const std::string& text) {
   return true;
 }
 
+std::string Quote(const std::string& text) {
+  // Keeps messages readable for long or binary input: at most 64 bytes, cut
+  // before a character that would not fit whole, and control bytes escaped.
+  // Text that is not UTF-8 has every byte above 0x7f escaped as well, so that
+  // the message itself stays valid UTF-8.
+  std::size_t cut = text.size();
+  if (cut > 64) {
+    cut = 64;
+    while (cut > 0 && (static_cast<unsigned char>(text[cut]) & 0xc0) == 0x80)
+      --cut;
+  }
+  std::string shown = text.substr(0, cut);
+  const bool utf8 = IsUtf8(shown);
+  std::string out = "\"";
+  for (unsigned char c : shown) {
+    if (c < 0x20 || c == 0x7f || (c >= 0x80 && !utf8)) {
+      static const char hex[] = "0123456789abcdef";
+      out += "\\x";
+      out += hex[c >> 4];
+      out += hex[c & 15];
+    } else {
+      out += static_cast<char>(c);
+    }
+  }
+  return out + (cut < text.size() ? "...\"" : "\"");
+}
+
+/// Whether \p text is a decimal integer, however large.
+bool IsDecimal(const std::string& text) {
+  std::size_t start = !text.empty() && (text[0] == '-' || text[0] == '+') ? 1 : 0;
+  if (start >= text.size())
+    return false;
+  for (std::size_t i = start; i < text.size(); ++i)
+    if (text[i] < '0' || text[i] > '9')
+      return false;
+  return true;
+}
+
 bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
            std::string& problem) {
   const std::string name = OptionName(spec);
@@ -117,7 +138,8 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
   case Integer: {
     long number = 0;
     if (!ParseInteger(value, number)) {
-      problem = "option " + name + ": " + Quote(value) + " is not an integer";
+      problem = "option " + name + ": " + Quote(value) +
+                (IsDecimal(value) ? " is outside the 64-bit integer range" : " is not an integer");
       return false;
     }
     if (constraint) {

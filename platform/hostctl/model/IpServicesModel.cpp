@@ -362,6 +362,8 @@ void InsertHostsEntry(Store& store, const std::string& ip, const std::string& ho
 void InsertSa(Store& store, const IpSecSadParam& sa) {
   if (sa.name.empty())
     throw HostCtlException("An SA needs a name");
+  if (sa.name.size() > 127)
+    throw HostCtlException("An SA name is at most 127 bytes long");
   if (sa.name == "UNKNOWN")
     throw HostCtlException("The SA name UNKNOWN is reserved");
   std::string source = CanonicalIpv6(sa.srcAddress);
@@ -405,6 +407,8 @@ void InsertSa(Store& store, const IpSecSadParam& sa) {
 void InsertSp(Store& store, const IpSecSpdParam& sp) {
   if (sp.name.empty())
     throw HostCtlException("An SP needs a name");
+  if (sp.name.size() > 127)
+    throw HostCtlException("An SP name is at most 127 bytes long");
   std::string source = CanonicalIpv6(sp.srcAddress);
   std::string destination = CanonicalIpv6(sp.dstAddress);
   auto inRange = [](int code, std::size_t size) {

@@ -218,6 +218,8 @@ void ImportPortGroups(Store& store, const JsonObject& vswitch, int64_t portsetId
     std::string name = pg.String("name");
     if (name.empty())
       pg.Fail("name", "must not be empty");
+    if (name.size() > 127)
+      pg.Fail("name", "must not be longer than 127 bytes");
     Statement exists = store.Prepare("SELECT 1 FROM portgroup WHERE name = ?");
     exists.Bind(1, name);
     if (exists.Step())

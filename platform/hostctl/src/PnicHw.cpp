@@ -118,8 +118,46 @@ constexpr RingSlot kRingSlots[] = {
     {"TX", &PnicRingParams::tx, true},
 };
 
+/// A count or delay of the coalescing record and its name in messages.
+struct CoalesceSlot {
+  const char* name;                     ///< Name in messages.
+  uint32_t PnicCoalesceParams::*member; ///< Field.
+};
+
+constexpr CoalesceSlot kCoalesceSlots[] = {
+    {"statistics interval", &PnicCoalesceParams::statsBlockUsecs},
+    {"sample interval", &PnicCoalesceParams::sampleInterval},
+    {"low packet rate", &PnicCoalesceParams::pktRateLow},
+    {"high packet rate", &PnicCoalesceParams::pktRateHigh},
+    {"RX microseconds", &PnicCoalesceParams::rxUsecs},
+    {"RX maximum frames", &PnicCoalesceParams::rxMaxFrames},
+    {"RX microseconds during an interrupt", &PnicCoalesceParams::rxUsecsIrq},
+    {"RX maximum frames during an interrupt", &PnicCoalesceParams::rxMaxFramesIrq},
+    {"TX microseconds", &PnicCoalesceParams::txUsecs},
+    {"TX maximum frames", &PnicCoalesceParams::txMaxFrames},
+    {"TX microseconds during an interrupt", &PnicCoalesceParams::txUsecsIrq},
+    {"TX maximum frames during an interrupt", &PnicCoalesceParams::txMaxFramesIrq},
+    {"low-rate RX delay time", &PnicCoalesceParams::rxUsecsLow},
+    {"low-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesLow},
+    {"low-rate TX delay time", &PnicCoalesceParams::txUsecsLow},
+    {"low-rate TX delay packets", &PnicCoalesceParams::txMaxFramesLow},
+    {"high-rate RX delay time", &PnicCoalesceParams::rxUsecsHigh},
+    {"high-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesHigh},
+    {"high-rate TX delay time", &PnicCoalesceParams::txUsecsHigh},
+    {"high-rate TX delay packets", &PnicCoalesceParams::txMaxFramesHigh},
+};
+
+/// The largest coalescing count or delay a driver takes. Larger values are
+/// what a negative number becomes in the record's 32 bits, and no hardware
+/// delays an interrupt for weeks.
+constexpr uint32_t kMaxCoalesceValue = 0x7fffffff;
+
 /// Checks a coalescing record the way a driver does.
 void CheckCoalesce(const std::string& nic, const PnicCoalesceParams& p) {
+  for (const CoalesceSlot& slot : kCoalesceSlots)
+    if (p.*slot.member > kMaxCoalesceValue)
+      throw HostCtlException(StrPrintf("The coalescing %s of %s must be at most %u, not %u",
+                                       slot.name, nic.c_str(), kMaxCoalesceValue, p.*slot.member));
   if ((p.adaptiveRx || p.adaptiveTx) && (p.sampleInterval < 1 || p.sampleInterval > 3600))
     throw HostCtlException(StrPrintf("Adaptive coalescing on %s needs a sample interval of 1 to "
                                      "3600 seconds, not %u",

@@ -315,6 +315,9 @@ std::unique_ptr<PortGroup> VirtualSwitchImpl::AddPortGroup(const std::string& na
   if (name.empty())
     throw HostCtlException("Unable to add a port group to " + data_.name +
                            ": the port group name is empty");
+  if (name.size() > 127)
+    throw HostCtlException("Unable to add a port group to " + data_.name +
+                           ": the port group name is longer than 127 bytes");
   store.Write([&] {
     RequirePortset(store, data_);
     Statement owner = store.Prepare(
