@@ -96,6 +96,19 @@ TEST_F(NicModelTest, ExportThenImportGivesTheSameHost) {
   EXPECT_EQ(vmnic0["vlanStats"], true);
 }
 
+TEST_F(NicModelTest, AnOddDuplexCodeSurvivesExportAndImport) {
+  // A NIC without advertised modes gets one from its own speed and duplex;
+  // the exported mode must import again whatever the NIC's code is.
+  ordered_json host = Model::Profile("demo");
+  host["nics"][5]["duplex"] = 4;
+  host["nics"][5].erase("info");
+  Load(host);
+  ordered_json first = Model::ExportHost(Model::Store::Host());
+  EXPECT_EQ(first["nics"][5]["info"]["advertisedModes"][0]["duplex"], 4);
+  Load(first);
+  EXPECT_EQ(Model::ExportHost(Model::Store::Host()).dump(), first.dump());
+}
+
 TEST_F(NicModelTest, ImportNamesTheBadField) {
   ordered_json host = Model::Profile("demo");
   host["nics"][0]["info"]["phyAddress"] = 32;

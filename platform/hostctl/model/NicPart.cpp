@@ -9,7 +9,7 @@
 //
 // Host description keys, inside each object of "nics":
 //   "info": {"supportedPorts": [port codes 0-6], "supportsAutoNegotiation",
-//            "advertisedModes": [{"speed", "duplex" 0-2, "media" 0-38}],
+//            "advertisedModes": [{"speed", "duplex" 0-255, "media" 0-38}],
 //            "advertisedAutoNegotiation", "port", "phyAddress" 0-31,
 //            "transceiver" 0-1, "autoNegotiation", "supportsWakeOn",
 //            "wakeOn": [codes 0-8], "messageLevelSupported", "messageLevel",
@@ -272,7 +272,9 @@ NicSettings ReadSettings(const JsonObject& nic, Store& store, const std::string&
       for (const JsonObject& mode : info->Objects("advertisedModes")) {
         CheckObjectKeys(mode, {"speed", "duplex", "media"});
         record.advertisedModes.push_back({static_cast<uint32_t>(mode.Int("speed", 0, 400000)),
-                                          static_cast<uint32_t>(mode.Int("duplex", 0, 2)),
+                                          // Any code the NIC's own duplex may have: a
+                                          // NIC's default mode carries its duplex code.
+                                          static_cast<uint32_t>(mode.Int("duplex", 0, 255)),
                                           static_cast<uint32_t>(mode.Int("media", 0, 38))});
       }
     }
