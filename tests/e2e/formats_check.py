@@ -18,7 +18,7 @@ import subprocess
 import sys
 import tempfile
 
-CHANGING = ("add", "remove", "set", "load", "unload", "refresh", "change", "run", "restart")
+from command_tree import read_only_commands
 
 
 def main():
@@ -31,22 +31,9 @@ def main():
         def run(args, **kw):
             return subprocess.run([cli] + args, capture_output=True, env=env, **kw)
 
-        def help_of(path):
-            return json.loads(run(["--formatter", "json"] + path + ["--help"]).stdout)
-
-        commands = []
-
-        def walk(path):
-            for child in help_of(path)["children"]:
-                sub = path + [child["name"]]
-                if child["kind"] == "namespace":
-                    walk(sub)
-                elif not any(p["required"] for p in help_of(sub)["parameters"]) and \
-                        not any(word in sub[-1] for word in CHANGING):
-                    commands.append(sub)
-
-        walk(["network"])
+        commands = read_only_commands(cli, env)
         xmllint = shutil.which("xmllint")
+
         def check(path, fmt):
             done = run(["--formatter", fmt] + path)
             if done.returncode not in (0, 1):

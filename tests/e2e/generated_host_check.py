@@ -16,7 +16,7 @@ import sys
 import tempfile
 import time
 
-CHANGING = ("add", "remove", "set", "load", "unload", "refresh", "change", "run", "restart")
+from command_tree import read_only_commands
 SIZES = {"--routes": 25, "--portgroups": 9, "--vms": 5, "--ports-per-vm": 3,
          "--neighbours": 7, "--hosts-entries": 6}
 # Listings that grow with the sizes, and by how many rows.
@@ -64,21 +64,7 @@ def main():
         def run(db, args):
             return subprocess.run([cli, "--host", db] + args, capture_output=True)
 
-        def help_of(path):
-            return json.loads(run(demo, ["--formatter", "json"] + path + ["--help"]).stdout)
-
-        commands = []
-
-        def walk(path):
-            for child in help_of(path)["children"]:
-                sub = path + [child["name"]]
-                if child["kind"] == "namespace":
-                    walk(sub)
-                elif not any(p["required"] for p in help_of(sub)["parameters"]) and \
-                        not any(word in sub[-1] for word in CHANGING):
-                    commands.append(sub)
-
-        walk(["network"])
+        commands = read_only_commands(cli, extra=["--host", demo])
         for path in commands:
             small = run(demo, ["--formatter", "json"] + path)
             large = run(big, ["--formatter", "json"] + path)

@@ -269,3 +269,11 @@ def check_store(path):
     finally:
         db.close()
     return problems
+
+
+def report(problems):
+    """Prints each problem and the one-line summary; returns the exit status."""
+    for problem in problems:
+        print("FAIL: " + problem)
+    print("%d passed, %d failed" % (0 if problems else 1, 1 if problems else 0))
+    return 1 if problems else 0

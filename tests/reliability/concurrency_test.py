@@ -127,10 +127,7 @@ def main():
     finally:
         host.close()
 
-    for problem in problems:
-        print("FAIL: " + problem)
-    print("%d passed, %d failed" % (0 if problems else 1, 1 if problems else 0))
-    return 1 if problems else 0
+    return changes.report(problems)
 
 
 if __name__ == "__main__":

@@ -71,19 +71,13 @@ std::string HostPath(const std::string& given) {
   return Model::Store::DefaultPath();
 }
 
-/// Creates \p path from \p host, or replaces the host it holds. The host
-/// ends up in the database file itself, not only in its write-ahead log, so
-/// that copying the file alone copies the host.
-void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
-  if (Exists(path)) {
-    Model::Store store(path);
-    Model::ImportHost(store, host);
-    store.Exec("PRAGMA wal_checkpoint(TRUNCATE)");
-    return;
-  }
+/// Creates \p path and fills it with \p fill; a failure leaves no file
+/// behind. The host ends up in the database file itself, not only in its
+/// write-ahead log, so that copying the file alone copies the host.
+template <typename Fill> void CreateHost(const std::string& path, Fill&& fill) {
   std::unique_ptr<Model::Store> store = Model::Store::Create(path);
   try {
-    Model::ImportHost(*store, host);
+    fill(*store);
     store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
   } catch (...) {
     store.reset();
@@ -91,6 +85,17 @@ void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
       std::remove((path + suffix).c_str());
     throw;
   }
+}
+
+/// Creates \p path from \p host, or replaces the host it holds.
+void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
+  if (Exists(path)) {
+    Model::Store store(path);
+    Model::ImportHost(store, host);
+    store.Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+    return;
+  }
+  CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
 }
 
 /// Reads a non-negative count; false when \p text is not one.
@@ -104,17 +109,7 @@ bool ParseCount(const std::string& text, int64_t& value) {
 /// Creates \p path as a generated host; a failure leaves no file behind.
 void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) {
   Model::CheckHostSizes(sizes);
-  std::unique_ptr<Model::Store> store = Model::Store::Create(path);
-  try {
-    Model::GenerateHost(*store, sizes);
-    // The whole host in the database file itself, so that it can be copied.
-    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
-  } catch (...) {
-    store.reset();
-    for (const char* suffix : {"", "-wal", "-shm"})
-      std::remove((path + suffix).c_str());
-    throw;
-  }
+  CreateHost(path, [&](Model::Store& store) { Model::GenerateHost(store, sizes); });
 }
 
 } // namespace
