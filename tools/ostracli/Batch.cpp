@@ -86,9 +86,10 @@ int RunBatch(const CommandTree& tree, const std::string& file,
   ParseGlobalOptions(defaults, global, err);
   if (!global.hostPath.empty()) {
     ::setenv("OSTRACLI_HOST", global.hostPath.c_str(), 1);
-    HostCtl::Session::SetHostPath(global.hostPath);
   }
   try {
+    if (!global.hostPath.empty())
+      HostCtl::Session::SetHost(global.hostPath);
     HostCtl::Session::BeginBatch();
   } catch (const HostCtl::Lib::HostCtlException& e) {
     std::fprintf(stderr, "%s\n", e.what());

@@ -224,6 +224,16 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   }
   if (!global.hostPath.empty())
     ::setenv("OSTRACLI_HOST", global.hostPath.c_str(), 1);
+  // A host that cannot be used (the Linux host without its module) is one
+  // clear error before anything runs.
+  if (const char* host = std::getenv("OSTRACLI_HOST"); host && *host) {
+    try {
+      HostCtl::Session::SetHost(host);
+    } catch (const HostCtl::Lib::HostCtlException& e) {
+      err += std::string("Error: ") + e.what() + "\n";
+      return ExitCommandError;
+    }
+  }
 
   // Resolve the command path: words up to the first option.
   std::vector<std::string> words;
@@ -278,6 +288,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   }
 
   auto output = CallSpec::Output::New();
+  HostCtl::Session::ClearNotAvailable();
   try {
     command->Execute(input, output);
   } catch (const HostCtl::Lib::HostCtlException& e) {
@@ -307,8 +318,15 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     std::ostream text(&buffer);
     formatter->Write(text, root, params);
   }
-  for (const std::string& message : output->GetErrorMessages())
-    err += message + "\n";
+  // A command that failed because the host lacks an operation it needs is
+  // reported as one line naming the command, not as the operation's failure.
+  std::string missing =
+      output->HasError() ? HostCtl::Session::NotAvailableLine(command->GetPathString(' ')) : "";
+  if (!missing.empty())
+    err += missing + "\n";
+  else
+    for (const std::string& message : output->GetErrorMessages())
+      err += message + "\n";
   return output->HasError() ? ExitCommandError : ExitOk;
 }
 

@@ -13,6 +13,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Address.h"
+#include "TvkCtl/Network/TvkNicImpl.h"
 #include "model/CoreModel.h"
 #include "model/JsonRead.h"
 #include "model/Part.h"
@@ -46,9 +47,15 @@ const std::vector<std::string>& EcnModes() {
 }
 
 const std::vector<std::string>& TagNames() {
-  static const std::vector<std::string> names = {
-      "HostConsole", "Driftway",     "TwinRun",     "Replica",  "ReplicaCopy",  "Ambrel",
-      "SharedStore", "StoreWitness", "ArchiveCopy", "TimeSync", "BlockOverTcp", "BlockOverRdma"};
+  // The names every host uses.
+  static const std::vector<std::string> names = [] {
+    std::vector<std::string> all;
+    for (int type = 1; const char* name = TvkCtl::Network::TvkNicTagIdToName(
+                           static_cast<HostCtl::Network::TvkNicTagType>(type));
+         ++type)
+      all.emplace_back(name);
+    return all;
+  }();
   return names;
 }
 

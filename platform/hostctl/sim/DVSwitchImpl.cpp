@@ -1,11 +1,11 @@
 //===- DVSwitchImpl.cpp - Distributed switches, their ports and LACP ------===//
 #include "HostCtl/Lib.h"
-#include "SwitchingStore.h"
+#include "sim/SwitchingStore.h"
 
 #include <cstring>
 #include <map>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using namespace HostCtl::Network;
@@ -126,8 +126,9 @@ std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
       auto used = clients.find(key);
       DVPortData port{rows.Text(2), rows.Text(3),
                       used == clients.end() ? std::vector<std::string>() : used->second};
-      ports.push_back(std::make_unique<DVPortImpl>(
-          DVPortParam{uuid, key, static_cast<uint32_t>(rows.Int(1))}, std::move(port)));
+      // Callers use a listed port as TvkCtl::Network::DVPortImpl.
+      ports.push_back(std::make_unique<TvkCtl::Network::DVPortImpl>(std::make_unique<DVPortImpl>(
+          DVPortParam{uuid, key, static_cast<uint32_t>(rows.Int(1))}, std::move(port))));
     }
     return ports;
   });
@@ -399,4 +400,4 @@ void DVPortImpl::SetConnectionId(uint32_t connectionId) {
   param_.connectionId = connectionId;
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -4,12 +4,12 @@
 // NIC's DCB record in a read transaction.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/DcbInfoImpl.h"
+#include "sim/DcbInfoImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/NicHwModel.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Store;
@@ -74,4 +74,4 @@ std::vector<DcbAppInfo> DcbInfoImpl::GetAppInfo() const {
   return ReadDcb("GetAppInfo", nic_).apps;
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

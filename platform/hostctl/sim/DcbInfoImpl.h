@@ -8,32 +8,33 @@
 #pragma once
 
 #include "HostCtl/Network/DcbRecords.h"
+#include "backend/Backend.h"
 
 #include <cstdint>
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
-class DcbInfoImpl {
+class DcbInfoImpl : public HostCtl::Backend::Dcb {
 public:
   /// The DCB state of NIC \p nic; nothing is read until an operation is called.
   explicit DcbInfoImpl(std::string nic);
   ~DcbInfoImpl();
 
   /// A HostCtl::Network::DcbMode code.
-  uint32_t GetMode() const;
-  bool IsEnabled() const;
-  HostCtl::Network::DcbCapabilities GetCapabilities() const;
-  bool IsPfcEnabled() const;
+  uint32_t GetMode() const override;
+  bool IsEnabled() const override;
+  HostCtl::Network::DcbCapabilities GetCapabilities() const override;
+  bool IsPfcEnabled() const override;
   /// PFC enable bit per priority (bit i = priority i).
-  uint8_t GetPfcConfig() const;
-  HostCtl::Network::DcbIeeeEtsConfig GetIeeeEtsConfig() const;
-  HostCtl::Network::DcbIeeePfcConfig GetIeeePfcConfig() const;
-  std::vector<HostCtl::Network::DcbAppInfo> GetAppInfo() const;
+  uint8_t GetPfcConfig() const override;
+  HostCtl::Network::DcbIeeeEtsConfig GetIeeeEtsConfig() const override;
+  HostCtl::Network::DcbIeeePfcConfig GetIeeePfcConfig() const override;
+  std::vector<HostCtl::Network::DcbAppInfo> GetAppInfo() const override;
 
 private:
   std::string nic_; ///< NIC name.
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,5 +1,5 @@
 //===- DnsConfigImpl.cpp - Resolver configuration of one netstack ---------===//
-#include "TvkCtl/Network/DnsConfigImpl.h"
+#include "sim/DnsConfigImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/IpServicesModel.h"
@@ -8,7 +8,7 @@
 #include <algorithm>
 #include <cctype>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Store;
@@ -160,4 +160,4 @@ void DnsConfigImpl::SaveConfig() {
   loaded_ = true;
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

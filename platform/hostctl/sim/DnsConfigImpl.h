@@ -10,39 +10,40 @@
 #pragma once
 
 #include "HostCtl/Network/IpAddress.h"
+#include "backend/Backend.h"
 
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
-class DnsConfigImpl {
+class DnsConfigImpl : public HostCtl::Backend::Dns {
 public:
   /// The configuration of netstack \p netstackKey (checked when first used).
   explicit DnsConfigImpl(std::string netstackKey);
 
   /// Reads the stored configuration again; refuses a netstack that does not
   /// exist. Changes not yet saved are kept.
-  void Refresh();
+  void Refresh() override;
 
   /// Appends a server; refuses one already in the list.
-  void AddUserNameServer(const HostCtl::Network::IpAddress& address);
+  void AddUserNameServer(const HostCtl::Network::IpAddress& address) override;
   /// Removes a server; refuses one not in the list.
-  void RemoveNameServer(const HostCtl::Network::IpAddress& address);
+  void RemoveNameServer(const HostCtl::Network::IpAddress& address) override;
   /// Removes every server.
-  void RemoveNameServers();
+  void RemoveNameServers() override;
   /// The servers in order of use.
-  std::vector<std::string> GetNameServers();
+  std::vector<std::string> GetNameServers() override;
 
   /// Appends a search domain; refuses a malformed or duplicate one.
-  void AddUserSearchDomain(const std::string& domain);
+  void AddUserSearchDomain(const std::string& domain) override;
   /// Removes a search domain; refuses one not in the list.
-  void RemoveSearchDomain(const std::string& domain);
+  void RemoveSearchDomain(const std::string& domain) override;
   /// The search domains in search order, separated by blanks.
-  std::string GetSearchDomainsString();
+  std::string GetSearchDomainsString() override;
 
   /// Writes the changes made through this object.
-  void SaveConfig();
+  void SaveConfig() override;
 
 private:
   /// One change not yet saved.
@@ -63,4 +64,4 @@ private:
   std::vector<Change> changes_;      ///< Changes not yet saved, in order.
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -10,13 +10,13 @@
 // number of contexts, destroying a context still associated with a switch.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "sim/NetworkInfoImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/CoreModel.h"
 #include "model/DatapathModel.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
@@ -180,4 +180,4 @@ bool NetworkInfoImpl::SetEnsLcoreAffinity(int64_t affinity, int64_t id) {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

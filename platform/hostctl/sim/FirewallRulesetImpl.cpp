@@ -1,10 +1,10 @@
 //===- FirewallRulesetImpl.cpp - Rulesets of the simulated firewall --------===//
-#include "TvkCtl/System/FirewallRulesetImpl.h"
+#include "sim/FirewallRulesetImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/FirewallModel.h"
 
-namespace TvkCtl::System {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::System::FirewallAllowedIps;
@@ -250,4 +250,4 @@ void FirewallRulesetImpl::RemoveAllowedIp(const std::string& text) {
   });
 }
 
-} // namespace TvkCtl::System
+} // namespace Sim

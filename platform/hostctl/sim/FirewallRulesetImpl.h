@@ -3,7 +3,7 @@
 
 #include "HostCtl/System/FirewallRuleset.h"
 
-namespace TvkCtl::System {
+namespace Sim {
 
 /// A ruleset of the simulated host, identified by its label. Every operation
 /// except GetRulesetId reads or changes the host; operations other than
@@ -36,4 +36,4 @@ private:
   std::string id_; ///< The ruleset's label.
 };
 
-} // namespace TvkCtl::System
+} // namespace Sim

@@ -1,5 +1,5 @@
 //===- HostsFile.cpp - The host's name table ------------------------------===//
-#include "TvkCtl/Network/HostsFile.h"
+#include "sim/HostsFile.h"
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"
@@ -9,7 +9,7 @@
 
 #include <cctype>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
@@ -17,27 +17,6 @@ using Model::Store;
 
 HostsFile::HostsFile() = default;
 HostsFile::~HostsFile() = default;
-
-bool HostsFile::IsValidHostName(const std::string& name) {
-  if (name.empty() || name.size() > 253)
-    return false;
-  std::size_t start = 0;
-  while (true) {
-    std::size_t dot = name.find('.', start);
-    std::size_t end = dot == std::string::npos ? name.size() : dot;
-    std::size_t length = end - start;
-    if (length == 0 || length > 63 || name[start] == '-' || name[end - 1] == '-')
-      return false;
-    for (std::size_t i = start; i < end; ++i) {
-      unsigned char c = static_cast<unsigned char>(name[i]);
-      if (!std::isalnum(c) && c != '-')
-        return false;
-    }
-    if (dot == std::string::npos)
-      return true;
-    start = dot + 1;
-  }
-}
 
 void HostsFile::AddEntryFromUser(const std::string& ip, const std::string& hostname,
                                  const std::vector<std::string>& aliases,
@@ -87,4 +66,4 @@ std::vector<std::shared_ptr<HostsFileEntry>> HostsFile::GetEntriesFromConfig() {
   return entries;
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -8,32 +8,17 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "backend/Backend.h"
+
 #include <memory>
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
-/// One entry of the hosts table.
-class HostsFileEntry {
-public:
-  HostsFileEntry(std::string ipAddress, std::string hostName, std::vector<std::string> aliases,
-                 std::string comment)
-      : ip_(std::move(ipAddress)), host_(std::move(hostName)), aliases_(std::move(aliases)),
-        comment_(std::move(comment)) {}
-  const std::string& GetIpAddress() const { return ip_; }
-  const std::string& GetHostName() const { return host_; }
-  const std::vector<std::string>& GetAliases() const { return aliases_; }
-  const std::string& GetComment() const { return comment_; }
+using TvkCtl::Network::HostsFileEntry;
 
-private:
-  std::string ip_;                   ///< Canonical address text.
-  std::string host_;                 ///< Host name.
-  std::vector<std::string> aliases_; ///< Further names, in order.
-  std::string comment_;              ///< One line of text; may be empty.
-};
-
-class HostsFile {
+class HostsFile : public HostCtl::Backend::HostsTable {
 public:
   HostsFile();
   ~HostsFile();
@@ -42,15 +27,13 @@ public:
   /// comment of more than one line, and an entry whose address and host name
   /// are already in the table.
   void AddEntryFromUser(const std::string& ip, const std::string& hostname,
-                        const std::vector<std::string>& aliases, const std::string& comment);
+                        const std::vector<std::string>& aliases,
+                        const std::string& comment) override;
   /// Removes the user entry of that address and host name; refuses when there
   /// is none (or it is a system entry).
-  void RemoveEntryFromUser(const std::string& ip, const std::string& hostname);
+  void RemoveEntryFromUser(const std::string& ip, const std::string& hostname) override;
   /// The user entries in the order they were added.
-  std::vector<std::shared_ptr<HostsFileEntry>> GetEntriesFromConfig();
-
-  /// Whether \p name is a valid host name (RFC 1123 labels).
-  static bool IsValidHostName(const std::string& name);
+  std::vector<std::shared_ptr<HostsFileEntry>> GetEntriesFromConfig() override;
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,5 +1,5 @@
 //===- IpSecConfigImpl.cpp - The kernel's IPsec databases -----------------===//
-#include "TvkCtl/Network/IpSecConfigImpl.h"
+#include "sim/IpSecConfigImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/IpServicesModel.h"
@@ -7,7 +7,7 @@
 
 #include <algorithm>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::IpSecSadParam;
@@ -15,68 +15,8 @@ using HostCtl::Network::IpSecSpdParam;
 using Model::Statement;
 using Model::Store;
 
-const std::array<std::string, 4> IpSecConfigImpl::SA_STATE = {"larval", "mature", "dying", "dead"};
-const std::array<std::string, 3> IpSecConfigImpl::SA_MODE = {"transport", "tunnel", "any"};
-const std::array<std::string, 3> IpSecConfigImpl::SA_ENCPT_ALG = {"null", "3des-cbc", "aes128-cbc"};
-const std::array<std::string, 2> IpSecConfigImpl::SA_AUTH_ALG = {"hmac-sha1", "hmac-sha2-256"};
-const std::array<std::string, 3> IpSecConfigImpl::SP_ACTION = {"none", "discard", "ipsec"};
-const std::array<std::string, 2> IpSecConfigImpl::SP_DIRECTION = {"in", "out"};
-const std::array<std::string, 4> IpSecConfigImpl::SP_UL_PROTO_TYPE = {"any", "tcp", "udp", "icmp6"};
-
-namespace {
-
-/// The code of \p text in the first \p count entries of \p table; \p dflt for
-/// the empty text.
-template <std::size_t N>
-int ToCode(const std::array<std::string, N>& table, std::size_t count, const std::string& text,
-           int dflt, const char* what) {
-  if (text.empty())
-    return dflt;
-  auto end = table.begin() + static_cast<std::ptrdiff_t>(count);
-  auto it = std::find(table.begin(), end, text);
-  if (it == end)
-    throw HostCtlException("Unknown IPsec " + std::string(what) + " '" + text + "'");
-  return static_cast<int>(it - table.begin());
-}
-
-} // namespace
-
 IpSecConfigImpl::IpSecConfigImpl() = default;
 IpSecConfigImpl::~IpSecConfigImpl() = default;
-
-int IpSecConfigImpl::StringToIpSecMode(const std::string& text) {
-  return ToCode(SA_MODE, 2, text, 0, "mode");
-}
-int IpSecConfigImpl::StringToIpSecEncyptAlgo(const std::string& text) {
-  return ToCode(SA_ENCPT_ALG, SA_ENCPT_ALG.size(), text, 0, "encryption algorithm");
-}
-int IpSecConfigImpl::StringToIpSecAuthAlgo(const std::string& text) {
-  return ToCode(SA_AUTH_ALG, SA_AUTH_ALG.size(), text, 0, "integrity algorithm");
-}
-int IpSecConfigImpl::StringToIpSecAction(const std::string& text) {
-  return ToCode(SP_ACTION, SP_ACTION.size(), text, 0, "action");
-}
-int IpSecConfigImpl::StringToIpSecDirection(const std::string& text) {
-  return ToCode(SP_DIRECTION, SP_DIRECTION.size(), text, 1, "direction");
-}
-int IpSecConfigImpl::StringToIpSecULProtoType(const std::string& text) {
-  return ToCode(SP_UL_PROTO_TYPE, SP_UL_PROTO_TYPE.size(), text, 0, "protocol");
-}
-
-int IpSecConfigImpl::EncryptionKeyLength(int algorithm) {
-  switch (algorithm) {
-  case 1:
-    return 24; // 3des-cbc: three 64-bit keys.
-  case 2:
-    return 16; // aes128-cbc.
-  default:
-    return 0; // null.
-  }
-}
-
-int IpSecConfigImpl::IntegrityKeyLength(int algorithm) {
-  return algorithm == 1 ? 32 : 20; // hmac-sha2-256, hmac-sha1.
-}
 
 void IpSecConfigImpl::AddSADConfig(const IpSecSadParam& sa) {
   Store& store = Store::Host();
@@ -214,4 +154,4 @@ void IpSecConfigImpl::GetSPDConfigList(std::vector<IpSecSpdParam>& list) {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,28 +1,12 @@
 //===- IpServices.cpp - Connections, world names and IP address values ----===//
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/IpAddress.h"
-#include "TvkCtl/Network/NetworkInfoImpl.h"
-#include "TvkCtl/Resource/ResourceInfoImpl.h"
 #include "model/IpServicesModel.h"
 #include "model/Store.h"
+#include "sim/NetworkInfoImpl.h"
+#include "sim/ResourceInfoImpl.h"
 
-namespace HostCtl::Network {
-
-IpAddress IpAddress::FromString(const std::string& text) {
-  if (Ipv4Address::IsValidAddress(text))
-    return IpAddress(Ipv4Address(text));
-  if (Ipv6Address::IsValidAddress(text))
-    return IpAddress(Ipv6Address(text));
-  throw HostCtl::Lib::HostCtlException("Invalid IP address: " + text);
-}
-
-std::string IpAddress::GetStringAddress() const {
-  return IsIpv4() ? GetIpv4().GetStringAddress() : GetIpv6().GetStringAddress();
-}
-
-} // namespace HostCtl::Network
-
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Network::TcpIpConnection;
 using Model::Statement;
@@ -75,9 +59,9 @@ void NetworkInfoImpl::GetCurrentIpTarvikConnections(std::vector<TcpIpConnection>
   LoadConnections("GetCurrentIpTarvikConnections", 2, list, netstack);
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim
 
-namespace TvkCtl::Resource {
+namespace Sim {
 
 ResourceInfoImpl::ResourceInfoImpl() = default;
 ResourceInfoImpl::~ResourceInfoImpl() = default;
@@ -100,4 +84,4 @@ std::string ResourceInfoImpl::GetWorldName(int64_t worldId) {
   return it == names_.end() ? std::string() : it->second;
 }
 
-} // namespace TvkCtl::Resource
+} // namespace Sim

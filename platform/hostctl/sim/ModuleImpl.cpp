@@ -1,11 +1,11 @@
 //===- ModuleImpl.cpp - Kernel modules of the simulated host ---------------===//
-#include "TvkCtl/System/ModuleImpl.h"
+#include "sim/ModuleImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/System/SystemInfo.h"
 #include "model/Store.h"
 
-namespace TvkCtl::System {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
@@ -77,4 +77,4 @@ void ModuleImpl::Unload() {
   stale_ = true;
 }
 
-} // namespace TvkCtl::System
+} // namespace Sim

@@ -7,11 +7,13 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "backend/Backend.h"
+
 #include <string>
 
-namespace TvkCtl::System {
+namespace Sim {
 
-class ModuleImpl {
+class ModuleImpl : public HostCtl::Backend::Module {
 public:
   /// The module named \p name; operations on a name that is no module of the
   /// host throw HostCtlException.
@@ -20,15 +22,15 @@ public:
 
   const std::string& GetName() const { return name_; }
   /// Whether the module is loaded.
-  bool IsLoaded();
+  bool IsLoaded() override;
   /// Re-reads the module's state.
-  void Refresh();
+  void Refresh() override;
   /// Loads the module with the option string \p options; loading a loaded
   /// module keeps it loaded. \p force loads it even when its options differ
   /// from those it was loaded with (the options are then replaced).
-  void Load(const std::string& options, bool force);
+  void Load(const std::string& options, bool force) override;
   /// Unloads the module; refused when it is not loaded.
-  void Unload();
+  void Unload() override;
 
 private:
   std::string name_;    ///< Module name.
@@ -36,4 +38,4 @@ private:
   bool stale_ = true;   ///< loaded_ must be read again.
 };
 
-} // namespace TvkCtl::System
+} // namespace Sim

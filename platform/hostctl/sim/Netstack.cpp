@@ -7,18 +7,18 @@
 // running value and the value configured for the next boot.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/NetstackInstanceImpl.h"
+#include "sim/NetstackInstanceImpl.h"
 
 #include "HostCtl/Lib.h"
-#include "TvkCtl/Network/NetworkInfoImpl.h"
-#include "TvkCtl/Network/TvkNicImpl.h"
 #include "model/CoreModel.h"
 #include "model/IpModel.h"
 #include "model/Store.h"
+#include "sim/NetworkInfoImpl.h"
+#include "sim/TvkNicImpl.h"
 
 #include <algorithm>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::NetstackInstance;
@@ -358,4 +358,4 @@ std::unique_ptr<HostCtl::Network::TvKernelNicInfo> NetworkInfoImpl::GetTvKernelN
   return std::make_unique<TvKernelNicInfoImpl>();
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

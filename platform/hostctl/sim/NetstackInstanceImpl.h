@@ -15,7 +15,7 @@
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 /// The settings of one netstack instance as the host stores them.
 struct NetstackData {
@@ -76,4 +76,4 @@ private:
   bool stale_ = false; ///< Reload before the next read.
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

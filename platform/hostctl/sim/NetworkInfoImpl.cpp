@@ -1,11 +1,11 @@
 //===- NetworkInfoImpl.cpp - Physical NICs of the network root ------------===//
-#include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "sim/NetworkInfoImpl.h"
 
 #include "HostCtl/SmartNic.h"
-#include "TvkCtl/Network/PnicImpl.h"
 #include "model/Store.h"
+#include "sim/PnicImpl.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
 
@@ -55,17 +55,11 @@ std::unique_ptr<HostCtl::Network::Pnic> NetworkInfoImpl::GetPnicByName(const std
   return std::make_unique<PnicImpl>(std::move(data));
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim
 
-namespace HostCtl::Network {
+namespace Sim {
 
-std::unique_ptr<NetworkInfo> NetworkFactory::GetNetworkInfo() {
-  return std::make_unique<TvkCtl::Network::NetworkInfoImpl>();
-}
-
-} // namespace HostCtl::Network
-
-namespace HostCtl::SmartNic {
+using HostCtl::SmartNic::SmartNic;
 
 namespace {
 class SmartNicImpl : public SmartNic {
@@ -78,7 +72,7 @@ private:
 };
 } // namespace
 
-std::unique_ptr<SmartNic> SmartNicInfo::GetSmartNicByPnic(const std::string& pnicName) {
+std::unique_ptr<SmartNic> GetSmartNicByPnic(const std::string& pnicName) {
   Model::Store& store = Model::Store::Host();
   store.CheckFault("GetSmartNicByPnic", pnicName);
   return store.Read([&]() -> std::unique_ptr<SmartNic> {
@@ -91,4 +85,4 @@ std::unique_ptr<SmartNic> SmartNicInfo::GetSmartNicByPnic(const std::string& pni
   });
 }
 
-} // namespace HostCtl::SmartNic
+} // namespace Sim

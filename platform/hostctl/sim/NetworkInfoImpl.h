@@ -3,10 +3,11 @@
 
 #include "HostCtl/Network/Connection.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "backend/Backend.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
-class NetworkInfoImpl : public HostCtl::Network::NetworkInfo {
+class NetworkInfoImpl : public HostCtl::Backend::Network {
 public:
   NetworkInfoImpl();
   ~NetworkInfoImpl() override;
@@ -56,11 +57,11 @@ public:
   /// Append the netstack's TCP, UDP or raw IP sockets to \p list, in the
   /// host's order; a netstack that does not exist is refused.
   void GetCurrentTcpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
-                                      const std::string& netstack);
+                                      const std::string& netstack) override;
   void GetCurrentUdpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
-                                      const std::string& netstack);
+                                      const std::string& netstack) override;
   void GetCurrentIpTarvikConnections(std::vector<HostCtl::Network::TcpIpConnection>& list,
-                                     const std::string& netstack);
+                                     const std::string& netstack) override;
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

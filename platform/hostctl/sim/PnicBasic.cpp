@@ -6,7 +6,7 @@
 // physical NIC, over the side tables of model/NicPart.cpp.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/PnicImpl.h"
+#include "sim/PnicImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/NicModel.h"
@@ -15,7 +15,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
@@ -246,4 +246,4 @@ void PnicImpl::GetPnicStats(PnicStats& stats) const {
     stats.*key.member = counters.value(key.key, uint64_t{0});
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -8,8 +8,8 @@
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"
-#include "TvkCtl/Network/PnicImpl.h"
 #include "model/NicHwModel.h"
+#include "sim/PnicImpl.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -18,7 +18,7 @@
 #include <iterator>
 #include <sys/stat.h>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Misc::StrPrintf;
@@ -414,4 +414,4 @@ std::string PnicImpl::GetHwCapName(int bit) {
   return names[static_cast<std::size_t>(bit)];
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,10 +1,10 @@
 //===- PnicImpl.cpp - Identity, link and admin state of a physical NIC ----===//
-#include "TvkCtl/Network/PnicImpl.h"
+#include "sim/PnicImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/Store.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
@@ -146,4 +146,4 @@ void PnicImpl::SetAdminStatus(bool up) {
   stale_ = true;
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -9,13 +9,14 @@
 
 #include "HostCtl/Network/Pnic.h"
 #include "HostCtl/Network/Switching.h"
+#include "backend/Backend.h"
 
 #include <cstdint>
 #include <memory>
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 /// The basic state of a physical NIC.
 struct PnicData {
@@ -34,7 +35,7 @@ struct PnicData {
   uint32_t mtu = 0;         ///< MTU.
 };
 
-class PnicImpl : public HostCtl::Network::Pnic {
+class PnicImpl : public HostCtl::Backend::Pnic {
 public:
   /// A NIC looked up by name; operations on a name that is no NIC of the host
   /// throw HostCtlException.
@@ -74,7 +75,7 @@ public:
   void DetachBranch(const std::string& branch) override;
   std::vector<HostCtl::Network::PnicAttachment> GetAttachments() const override;
   /// Packet counters.
-  void GetPnicStats(HostCtl::Network::PnicStats& stats) const;
+  void GetPnicStats(HostCtl::Network::PnicStats& stats) const override;
 
   // --- Hardware settings.
   void GetOffloadSettings(HostCtl::Network::PnicOffloadSettings& settings) const override;
@@ -97,7 +98,7 @@ public:
 
   // --- Datapath.
   /// The NIC's uplink port, or null when the NIC is no uplink of a switch.
-  std::unique_ptr<HostCtl::Network::Port> GetPort() const;
+  std::unique_ptr<HostCtl::Network::Port> GetPort() const override;
 
 protected:
   /// The basic state, read from the host when stale; throws HostCtlException
@@ -109,4 +110,4 @@ private:
   mutable bool stale_;    ///< data_ must be read again.
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -8,12 +8,12 @@
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
-#include "TvkCtl/Network/PnicImpl.h"
-#include "TvkCtl/Network/Switching.h"
-#include "TvkCtl/Resource/WorldImpl.h"
 #include "model/Store.h"
+#include "sim/PnicImpl.h"
+#include "sim/Switching.h"
+#include "sim/WorldImpl.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::FilterStats;
@@ -174,9 +174,9 @@ std::unique_ptr<HostCtl::Network::Port> PnicImpl::GetPort() const {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim
 
-namespace TvkCtl::Resource {
+namespace Sim {
 
 WorldImpl::WorldImpl(int64_t worldId) : worldId_(worldId) {}
 WorldImpl::~WorldImpl() = default;
@@ -193,4 +193,4 @@ std::string WorldImpl::GetWorldName() const {
   });
 }
 
-} // namespace TvkCtl::Resource
+} // namespace Sim

@@ -9,14 +9,14 @@
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
-#include "SwitchingStore.h"
 #include "model/SwitchingModel.h"
+#include "sim/SwitchingStore.h"
 
 #include <algorithm>
 #include <optional>
 #include <set>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using namespace HostCtl::Network;
@@ -279,4 +279,4 @@ void PortGroupImpl::SetTrafficShapingPolicy(const ShapingPolicy& policy) {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,11 +1,11 @@
 //===- PortsetImpl.cpp - Switch identity, ports and the switch service ----===//
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
-#include "SwitchingStore.h"
-#include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "model/Store.h"
+#include "sim/NetworkInfoImpl.h"
+#include "sim/SwitchingStore.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using namespace HostCtl::Network;
@@ -328,28 +328,22 @@ std::vector<std::unique_ptr<PortGroup>> NetworkInfoImpl::GetAllPortGroups(Portse
   return groups;
 }
 
-} // namespace TvkCtl::Network
+// --- Lookups of the network factory.
 
-namespace HostCtl::Network {
-
-using TvkCtl::Network::PortsetData;
-using TvkCtl::Network::PortsetKind;
-
-std::unique_ptr<DVSwitch> NetworkFactory::GetDVSwitchByName(const std::string& name) {
-  return TvkCtl::Network::FindDistributed("GetDVSwitchByName", name);
+std::unique_ptr<DVSwitch> GetDVSwitchByName(const std::string& name) {
+  return FindDistributed("GetDVSwitchByName", name);
 }
 
-std::unique_ptr<VirtualSwitch> NetworkFactory::GetVirtualSwitchById(const std::string& name,
-                                                                    PortsetGetType type) {
+std::unique_ptr<VirtualSwitch> GetVirtualSwitchById(const std::string& name, PortsetGetType type) {
   Model::Store& store = Model::Store::Host();
   store.CheckFault("GetVirtualSwitchById", name);
-  auto data = store.Read([&] { return TvkCtl::Network::FindPortset(store, name); });
+  auto data = store.Read([&] { return FindPortset(store, name); });
   if (!data || data->kind != PortsetKind::Standard || data->system != (type == PortsetGetSystem))
     return nullptr;
-  return std::make_unique<TvkCtl::Network::VirtualSwitchImpl>(std::move(*data));
+  return std::make_unique<VirtualSwitchImpl>(std::move(*data));
 }
 
-std::unique_ptr<PortGroup> NetworkFactory::GetPortGroupByName(const std::string& name) {
+std::unique_ptr<PortGroup> GetPortGroupByName(const std::string& name) {
   Model::Store& store = Model::Store::Host();
   store.CheckFault("GetPortGroupByName", name);
   bool found = store.Read([&] {
@@ -359,14 +353,14 @@ std::unique_ptr<PortGroup> NetworkFactory::GetPortGroupByName(const std::string&
   });
   if (!found)
     return nullptr;
-  return std::make_unique<TvkCtl::Network::PortGroupImpl>(name);
+  return std::make_unique<PortGroupImpl>(name);
 }
 
-std::unique_ptr<DVPort> NetworkFactory::GetDVPort(const DVPortParam& param) {
-  auto port = std::make_unique<TvkCtl::Network::DVPortImpl>(param);
+std::unique_ptr<DVPort> GetDVPort(const DVPortParam& param) {
+  auto port = std::make_unique<DVPortImpl>(param);
   if (!port->IsValid())
     return nullptr;
-  return port;
+  return std::make_unique<TvkCtl::Network::DVPortImpl>(std::move(port));
 }
 
-} // namespace HostCtl::Network
+} // namespace Sim

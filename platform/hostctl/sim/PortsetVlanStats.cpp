@@ -8,12 +8,12 @@
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
-#include "TvkCtl/Network/Switching.h"
 #include "model/Store.h"
+#include "sim/Switching.h"
 
 #include <map>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::VlanStats;
@@ -79,4 +79,4 @@ void PortsetImpl::SetVlanStatsEnabled(const std::string& nicName, bool enabled) 
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,11 +1,13 @@
 //===- RoutingInfoImpl.cpp - Routes and neighbours of one netstack --------===//
+#include "sim/RoutingInfoImpl.h"
+
 #include "TvkCtl/Network/RoutingInfoImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/IpServicesModel.h"
 #include "model/Store.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Ipv4Address;
@@ -21,8 +23,12 @@ using Model::Statement;
 using Model::Store;
 namespace IpSvc = Model::IpSvc;
 
-const Ipv4Network RoutingInfoImpl::DEFAULT_IPV4_ROUTE(Ipv4Address(0u), Ipv4Address(0u));
-const Ipv6Network RoutingInfoImpl::DEFAULT_IPV6_ROUTE(Ipv6Address(), 0);
+// The constants every host shares.
+const Ipv4Network& DEFAULT_IPV4_ROUTE = TvkCtl::Network::RoutingInfoImpl::DEFAULT_IPV4_ROUTE;
+const Ipv6Network& DEFAULT_IPV6_ROUTE = TvkCtl::Network::RoutingInfoImpl::DEFAULT_IPV6_ROUTE;
+constexpr const char* SOURCE_USER = TvkCtl::Network::RoutingInfoImpl::SOURCE_USER;
+constexpr const char* SOURCE_CONFIG = TvkCtl::Network::RoutingInfoImpl::SOURCE_CONFIG;
+constexpr const char* SOURCE_CONNECTED = TvkCtl::Network::RoutingInfoImpl::SOURCE_CONNECTED;
 
 namespace {
 
@@ -335,17 +341,6 @@ void RoutingInfoImpl::SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) 
 
 // --- Neighbour caches --------------------------------------------------------
 
-const std::vector<std::string>& RoutingInfoImpl::NeighborTypeNames() {
-  static const std::vector<std::string> names = {"Unknown", "Dynamic", "Static", "Local", "Router"};
-  return names;
-}
-
-const std::vector<std::string>& RoutingInfoImpl::NeighborStateNames() {
-  static const std::vector<std::string> names = {"Incomplete", "Reachable", "Stale",
-                                                 "Delay",      "Probe",     "Unreachable"};
-  return names;
-}
-
 void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& list,
                                                     const std::string& interfaceName,
                                                     PortsetGetType selector) {
@@ -376,24 +371,6 @@ void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& l
   });
 }
 
-namespace {
-std::string NameOf(const std::vector<std::string>& names, int code) {
-  return code >= 0 && static_cast<std::size_t>(code) < names.size() ? names[code] : names[0];
-}
-} // namespace
-
-std::string RoutingInfoImpl::GetIpv4NeighborType(const Ipv4Neighbor& neighbor) const {
-  return NameOf(NeighborTypeNames(), neighbor.GetTypeCode());
-}
-
-std::string RoutingInfoImpl::GetIpv6NeighborType(const Ipv6Neighbor& neighbor) const {
-  return NameOf(NeighborTypeNames(), neighbor.GetTypeCode());
-}
-
-std::string RoutingInfoImpl::GetIpv6NeighborState(const Ipv6Neighbor& neighbor) const {
-  return NameOf(NeighborStateNames(), neighbor.GetStateCode());
-}
-
 void RoutingInfoImpl::RemoveIpv4Neighbor(const Ipv4Neighbor& neighbor) {
   Store& store = Store::Host();
   store.CheckFault("RemoveIpv4Neighbor", netstack_);
@@ -414,4 +391,4 @@ void RoutingInfoImpl::RemoveIpv6Neighbor(const Ipv6Neighbor& neighbor) {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

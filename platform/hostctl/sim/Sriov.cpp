@@ -5,16 +5,16 @@
 // sriov_nic and sriov_vf tables of model/NicPart.cpp.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "sim/NetworkInfoImpl.h"
 
 #include "HostCtl/Lib.h"
-#include "TvkCtl/Network/PnicImpl.h"
 #include "model/NicModel.h"
 #include "model/Store.h"
+#include "sim/PnicImpl.h"
 
 #include <nlohmann/json.hpp>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
 
@@ -104,4 +104,4 @@ void NetworkInfoImpl::GetSriovNicVFStats(SriovNicVFStats& stats, const std::stri
     stats.*key.member = counters.value(key.key, uint64_t{0});
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -9,6 +9,8 @@
 #pragma once
 
 #include "HostCtl/Network/Switching.h"
+#include "TvkCtl/Network/Switching.h"
+#include "backend/Backend.h"
 
 #include <cstdint>
 #include <map>
@@ -17,7 +19,7 @@
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 /// What kind of switch a portset is.
 enum class PortsetKind { Standard, Distributed, Opaque };
@@ -31,7 +33,7 @@ struct PortsetData {
 };
 
 /// Common part of every switch.
-class PortsetImpl : public virtual HostCtl::Network::Portset {
+class PortsetImpl : public virtual TvkCtl::Network::PortsetImpl {
 public:
   explicit PortsetImpl(PortsetData data);
   ~PortsetImpl() override;
@@ -40,7 +42,7 @@ public:
   static bool IsValidVirtualSwitch(const std::string& name);
   /// The id other objects use for the switch: the UUID of a distributed or
   /// opaque switch, the name of a standard one.
-  std::string GetIdentifier() const;
+  std::string GetIdentifier() const override;
   int64_t GetPortsetId() const { return data_.id; }
   PortsetKind GetKind() const { return data_.kind; }
   bool IsSystem() const { return data_.system; }
@@ -92,7 +94,7 @@ public:
 };
 
 /// A distributed or opaque switch.
-class DVSwitchImpl : public virtual HostCtl::Network::DVSwitch, public PortsetImpl {
+class DVSwitchImpl : public virtual TvkCtl::Network::DVSwitchImpl, public PortsetImpl {
 public:
   explicit DVSwitchImpl(PortsetData data);
   ~DVSwitchImpl() override;
@@ -127,7 +129,7 @@ struct PortGroupData {
 
 /// A port group, by name. It is valid while the host has a port group of that
 /// name; operations on one it does not have throw HostCtlException.
-class PortGroupImpl : public virtual HostCtl::Network::PortGroup {
+class PortGroupImpl : public HostCtl::Backend::PortGroup {
 public:
   explicit PortGroupImpl(std::string name);
   /// A port group as a listing read it; its switch, VLAN ID and client count
@@ -172,7 +174,7 @@ struct DVPortData {
 };
 
 /// A distributed port, by switch UUID and port key.
-class DVPortImpl : public virtual HostCtl::Network::DVPort {
+class DVPortImpl : public HostCtl::Backend::DVPort {
 public:
   explicit DVPortImpl(HostCtl::Network::DVPortParam param);
   DVPortImpl(std::string switchId, std::string dvPortId);
@@ -242,37 +244,37 @@ private:
 };
 
 /// The switch service: lists, looks up, adds and removes switches.
-class VirtualSwitchInfoImpl {
+class VirtualSwitchInfoImpl : public HostCtl::Backend::Switches {
 public:
   VirtualSwitchInfoImpl();
   ~VirtualSwitchInfoImpl();
 
   /// Every switch of every kind, standard switches first, in host order.
-  std::vector<std::unique_ptr<HostCtl::Network::Portset>> GetAllSwitches();
+  std::vector<std::unique_ptr<HostCtl::Network::Portset>> GetAllSwitches() override;
   /// Standard switches of the selector's kind.
   std::vector<std::unique_ptr<HostCtl::Network::VirtualSwitch>>
-  GetVirtualSwitches(HostCtl::Network::PortsetGetType type);
+  GetVirtualSwitches(HostCtl::Network::PortsetGetType type) override;
   std::unique_ptr<HostCtl::Network::VirtualSwitch>
-  GetVirtualSwitchByName(const std::string& name, HostCtl::Network::PortsetGetType type);
+  GetVirtualSwitchByName(const std::string& name, HostCtl::Network::PortsetGetType type) override;
   /// Creates standard switch \p name with \p ports ports and the given policies.
   std::unique_ptr<HostCtl::Network::VirtualSwitch>
   AddVirtualSwitchWithPolicy(const HostCtl::Network::NicTeamingPolicy& teaming,
                              const HostCtl::Network::PortSecurityPolicy& security,
                              const HostCtl::Network::ShapingPolicy& shaping,
                              const HostCtl::Network::NicCapabilities& capabilities,
-                             const std::string& name, uint32_t ports);
+                             const std::string& name, uint32_t ports) override;
   /// Removes standard switch \p name; refused while kernel interfaces or VM
   /// ports use its port groups.
-  void RemoveVirtualSwitch(const std::string& name);
+  void RemoveVirtualSwitch(const std::string& name) override;
 
-  std::vector<std::unique_ptr<HostCtl::Network::DVSwitch>> GetDVSwitches();
-  std::vector<std::unique_ptr<HostCtl::Network::DVSwitch>> GetOpaqueDVSwitches();
+  std::vector<std::unique_ptr<HostCtl::Network::DVSwitch>> GetDVSwitches() override;
+  std::vector<std::unique_ptr<HostCtl::Network::DVSwitch>> GetOpaqueDVSwitches() override;
   /// The distributed or opaque switch of that name (or display name), or null.
-  std::unique_ptr<HostCtl::Network::DVSwitch> GetDVSwitchByName(const std::string& name);
+  std::unique_ptr<HostCtl::Network::DVSwitch> GetDVSwitchByName(const std::string& name) override;
 
-  bool IsLegacySwitch(const std::string& name);
-  bool IsDVSwitch(const std::string& name);
-  bool IsOpaqueSwitch(const std::string& name);
+  bool IsLegacySwitch(const std::string& name) override;
+  bool IsDVSwitch(const std::string& name) override;
+  bool IsOpaqueSwitch(const std::string& name) override;
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -7,14 +7,14 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "TvkCtl/Network/Switching.h"
 #include "model/Store.h"
+#include "sim/Switching.h"
 
 #include <memory>
 #include <optional>
 #include <string>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 /// The switch of that name, of any kind.
 std::optional<PortsetData> FindPortset(Model::Store& store, const std::string& name);
@@ -35,4 +35,4 @@ HostCtl::Network::NicTeamingPolicy SwitchConfiguredTeaming(Model::Store& store, 
 HostCtl::Network::PortSecurityPolicy SwitchSecurity(Model::Store& store, int64_t portsetId);
 HostCtl::Network::ShapingPolicy SwitchShaping(Model::Store& store, int64_t portsetId);
 
-} // namespace TvkCtl::Network
+} // namespace Sim

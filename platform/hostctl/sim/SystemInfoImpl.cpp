@@ -1,12 +1,12 @@
 //===- SystemInfoImpl.cpp - Firewall state and the host object -------------===//
-#include "TvkCtl/System/SystemInfoImpl.h"
+#include "sim/SystemInfoImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/System/Host.h"
-#include "TvkCtl/System/FirewallRulesetImpl.h"
 #include "model/FirewallModel.h"
+#include "sim/FirewallRulesetImpl.h"
 
-namespace TvkCtl::System {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::System::FirewallModuleName;
@@ -98,26 +98,4 @@ std::unique_ptr<FirewallRuleset> SystemInfoImpl::GetFirewallRulesetById(const st
   return std::make_unique<FirewallRulesetImpl>(id);
 }
 
-} // namespace TvkCtl::System
-
-namespace HostCtl {
-
-namespace {
-
-class HostImpl : public Host {
-public:
-  std::unique_ptr<Network::NetworkInfo> GetNetworkInfo() override {
-    return Network::NetworkFactory::GetNetworkInfo();
-  }
-  std::unique_ptr<System::SystemInfo> GetSystemInfo() override {
-    return std::make_unique<TvkCtl::System::SystemInfoImpl>();
-  }
-};
-
-} // namespace
-
-std::unique_ptr<Host> HostFactory::GetHost() {
-  return std::make_unique<HostImpl>();
-}
-
-} // namespace HostCtl
+} // namespace Sim

@@ -2,11 +2,12 @@
 #pragma once
 
 #include "HostCtl/System/SystemInfo.h"
+#include "backend/Backend.h"
 
-namespace TvkCtl::System {
+namespace Sim {
 
 /// The system-information root of the simulated host.
-class SystemInfoImpl : public HostCtl::System::SystemInfo {
+class SystemInfoImpl : public HostCtl::Backend::System {
 public:
   SystemInfoImpl();
   ~SystemInfoImpl() override;
@@ -23,7 +24,7 @@ public:
 
   /// Whether the firewall's filters are in place (built by
   /// LoadFirewallRulesets, removed by DestroyFirewallFilters).
-  bool AreFirewallFiltersActive();
+  bool AreFirewallFiltersActive() override;
 };
 
-} // namespace TvkCtl::System
+} // namespace Sim

@@ -5,12 +5,12 @@
 // Adding and removing interfaces is in TvkNicAttach.cpp.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/TvkNicImpl.h"
+#include "sim/TvkNicImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/Store.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Network::TvkNic;
 using HostCtl::Network::TvkNicTagType;
@@ -114,4 +114,4 @@ void TvKernelNicInfoImpl::GetTvkernelNicNamesByInstanceKey(std::vector<std::stri
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

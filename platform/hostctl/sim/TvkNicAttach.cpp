@@ -6,7 +6,7 @@
 // gets the lowest free name and a fresh MAC unless told otherwise.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/TvkNicImpl.h"
+#include "sim/TvkNicImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetstackInstance.h"
@@ -14,7 +14,7 @@
 #include "model/IpModel.h"
 #include "model/Store.h"
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::ConnectionPoint;
@@ -250,4 +250,4 @@ void TvKernelNicInfoImpl::RemoveTvKernelNic(ConnectionPoint* point, const std::s
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

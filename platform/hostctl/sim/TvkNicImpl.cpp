@@ -6,7 +6,7 @@
 // host read it directly.
 //
 //===----------------------------------------------------------------------===//
-#include "TvkCtl/Network/TvkNicImpl.h"
+#include "sim/TvkNicImpl.h"
 
 #include "HostCtl/Lib.h"
 #include "model/IpModel.h"
@@ -15,7 +15,7 @@
 #include <cctype>
 #include <cstdio>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::IpConfig;
@@ -26,23 +26,6 @@ using HostCtl::Network::MacAddress;
 using HostCtl::Network::TvkNicTagType;
 using Model::Statement;
 using Model::Store;
-
-// --- Tag names ---------------------------------------------------------------
-
-const char* TvkNicTagIdToName(TvkNicTagType type) {
-  const auto& names = Model::Ip::TagNames();
-  if (type < 1 || type > static_cast<int>(names.size()))
-    return nullptr;
-  return names[static_cast<std::size_t>(type - 1)].c_str();
-}
-
-TvkNicTagType TvkNicTagNameToId(const std::string& name) {
-  const auto& names = Model::Ip::TagNames();
-  for (std::size_t i = 0; i < names.size(); ++i)
-    if (names[i] == name)
-      return static_cast<TvkNicTagType>(i + 1);
-  return HostCtl::Network::TvkNicTagInvalid;
-}
 
 // --- Reading and writing interface rows --------------------------------------
 
@@ -435,4 +418,4 @@ void TvkNicImpl::Announce() {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

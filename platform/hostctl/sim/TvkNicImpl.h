@@ -9,18 +9,18 @@
 #pragma once
 
 #include "HostCtl/Network/TvkNic.h"
+#include "TvkCtl/Network/TvkNicImpl.h"
 
 #include <cstdint>
 #include <memory>
 #include <string>
 #include <vector>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
-/// The name of tag \p type, or null for a value that is no tag.
-const char* TvkNicTagIdToName(HostCtl::Network::TvkNicTagType type);
-/// The tag of that name (matched exactly), or TvkNicTagInvalid.
-HostCtl::Network::TvkNicTagType TvkNicTagNameToId(const std::string& name);
+// Tag names are the same on every host.
+using TvkCtl::Network::TvkNicTagIdToName;
+using TvkCtl::Network::TvkNicTagNameToId;
 
 /// The cached attributes of a kernel interface.
 struct TvkNicData {
@@ -95,4 +95,4 @@ public:
                          const std::string& netstack) override;
 };
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -1,12 +1,12 @@
 //===- Util.cpp - Host programs, acting on the host model only ------------===//
-#include "TvkCtl/Util.h"
+#include "sim/Backend.h"
 
 #include "HostCtl/Lib.h"
 #include "model/CoreModel.h"
 #include "model/IpModel.h"
 #include "model/Store.h"
 
-namespace TvkCtl::Util {
+namespace Sim {
 
 namespace {
 
@@ -23,12 +23,7 @@ const KnownService kServices[] = {
 
 } // namespace
 
-std::string MakeChildRpTvkOption(int pool) {
-  return "++respool=host/system/tvkservices/child" + std::to_string(pool);
-}
-
-int TvkCtl_Exec(const std::string& command, bool /*background*/, bool /*wait*/,
-                bool /*captureOutput*/) {
+int Exec(const std::string& command, bool /*background*/, bool /*wait*/, bool /*captureOutput*/) {
   std::size_t space = command.find(' ');
   std::string program = command.substr(0, space);
   std::string options = space == std::string::npos ? "" : command.substr(space + 1);
@@ -47,4 +42,4 @@ int TvkCtl_Exec(const std::string& command, bool /*background*/, bool /*wait*/,
   return 127;
 }
 
-} // namespace TvkCtl::Util
+} // namespace Sim

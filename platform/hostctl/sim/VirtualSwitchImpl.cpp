@@ -7,14 +7,14 @@
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
-#include "SwitchingStore.h"
 #include "model/CoreModel.h"
 #include "model/SwitchingModel.h"
+#include "sim/SwitchingStore.h"
 
 #include <algorithm>
 #include <set>
 
-namespace TvkCtl::Network {
+namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
 using namespace HostCtl::Network;
@@ -526,4 +526,4 @@ void VirtualSwitchInfoImpl::RemoveVirtualSwitch(const std::string& name) {
   });
 }
 
-} // namespace TvkCtl::Network
+} // namespace Sim

@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <string>
 
-namespace TvkCtl::Resource {
+namespace Sim {
 
 /// A world of the host, by id; the VMs are worlds.
 class WorldImpl {
@@ -21,4 +21,4 @@ private:
   int64_t worldId_; ///< World id.
 };
 
-} // namespace TvkCtl::Resource
+} // namespace Sim
