@@ -28,7 +28,6 @@ namespace {
 struct State {
   std::unique_ptr<Backend::Backend> backend;         ///< In use, once made.
   std::string spec;                                  ///< --host value it serves.
-  bool chosen = false;                               ///< SetHost named the host.
   std::map<std::string, Backend::Factory> factories; ///< By scheme.
   std::string missingOperation;                      ///< Last operation not available, or "".
   std::string missingHost;                           ///< The host that lacked it.
@@ -119,7 +118,6 @@ void ResetCurrent() {
   State& state = TheState();
   state.backend.reset();
   state.spec.clear();
-  state.chosen = false;
 }
 
 [[noreturn]] void Unavailable(const char* operation) {
@@ -148,21 +146,19 @@ std::string DefaultHostPath() {
 
 void SetHost(const std::string& spec) {
   State& state = TheState();
-  if (state.backend && state.chosen && state.spec == spec)
+  if (state.backend && state.spec == spec)
     return;
   std::unique_ptr<Backend::Backend> backend = MakeBackend(spec, true);
   state.backend = std::move(backend);
   state.spec = spec;
-  state.chosen = true;
 }
 
 void SetHostPath(const std::string& path) {
   State& state = TheState();
-  if (state.backend && state.chosen && state.spec == path)
+  if (state.backend && state.spec == path)
     return;
   state.backend = Backend::MakeSimulatedHost(path);
   state.spec = path;
-  state.chosen = true;
 }
 
 bool HasTransactions() {
