@@ -359,3 +359,36 @@ TEST_F(StoreTest, EveryWritePathCommitsToTheFileWithFullSync) {
 }
 
 } // namespace
+
+namespace {
+
+std::vector<std::string> Column(Model::Store& store, const char* sql) {
+  std::vector<std::string> values;
+  Model::Statement rows = store.Prepare(sql);
+  while (rows.Step())
+    values.push_back(rows.Text(0));
+  return values;
+}
+
+// A host written by the release before layout 2 (a write-ahead log, resolver
+// tables that SQLite 3.40's integrity check misreads) is brought up to date
+// when it is first opened, and stays the same host.
+TEST_F(StoreTest, UpgradesAFileOfTheLayoutBefore) {
+  std::system(("cp " HOSTCTL_FIXTURES "/layout1.db " + path_).c_str());
+  {
+    Model::Store old(path_);
+    EXPECT_EQ(Column(old, "PRAGMA user_version"), std::vector<std::string>{"2"});
+    EXPECT_EQ(Column(old, "PRAGMA journal_mode"), std::vector<std::string>{"delete"});
+    EXPECT_EQ(Column(old, "PRAGMA integrity_check"), std::vector<std::string>{"ok"});
+    EXPECT_TRUE(Column(old, "PRAGMA foreign_key_check").empty());
+    // The same host as a demo host made now, resolver order included.
+    auto fresh = Model::Store::Create(dir_ + "/fresh.db");
+    Model::ImportHost(*fresh, Model::Profile("demo"));
+    EXPECT_EQ(Model::ExportHost(old), Model::ExportHost(*fresh));
+  }
+  // A second open finds nothing left to do.
+  Model::Store again(path_);
+  EXPECT_EQ(Column(again, "PRAGMA integrity_check"), std::vector<std::string>{"ok"});
+}
+
+} // namespace
