@@ -68,7 +68,8 @@ std::optional<KeyValues> ReadKeyValues(const std::string& text) {
           if (code < 0x80)
             value += static_cast<char>(code);
           else if (code < 0x800)
-            value += {static_cast<char>(0xC0 | (code >> 6)), static_cast<char>(0x80 | (code & 0x3F))};
+            value +=
+                {static_cast<char>(0xC0 | (code >> 6)), static_cast<char>(0x80 | (code & 0x3F))};
           else
             value += {static_cast<char>(0xE0 | (code >> 12)),
                       static_cast<char>(0x80 | ((code >> 6) & 0x3F)),
@@ -212,8 +213,8 @@ TEST(KeyValueFormatTest, ReadsBackAsTheResult) {
   auto odd = MetaStruct::New("Odd.Name");
   odd->SetField("a.b[1]=c\\", "x=y\\z\r\nw\v\f\x1c\x1d\x1e|\xC2\x85|\xE2\x80\xA8|\xE2\x80\xA9|\t");
   const std::string text = Render("keyvalue", odd);
-  for (const char* end : {"\r", "\v", "\f", "\x1c", "\x1d", "\x1e", "\xC2\x85", "\xE2\x80\xA8",
-                          "\xE2\x80\xA9"})
+  for (const char* end :
+       {"\r", "\v", "\f", "\x1c", "\x1d", "\x1e", "\xC2\x85", "\xE2\x80\xA8", "\xE2\x80\xA9"})
     EXPECT_EQ(text.find(end), std::string::npos) << text;
   EXPECT_EQ(text.find('\n'), text.size() - 1);
   std::optional<KeyValues> read = ReadKeyValues(text);

@@ -45,7 +45,8 @@ TEST(SimpleFormatTest, ScalarsAndStringLists) {
 TEST(SimpleFormatTest, StoredTextCannotForgeLinesOrReachTheTerminal) {
   auto value = MetaStruct::New("PortGroup");
   value->SetField("Name", "pg\n   Uplinks: vmnic9");
-  value->SetField("Comment", "\x1b]0;owned\x07 tab\there \xC2\x9B" "2J caf\xC3\xA9");
+  value->SetField("Comment", "\x1b]0;owned\x07 tab\there \xC2\x9B"
+                             "2J caf\xC3\xA9");
   EXPECT_EQ(Render("simple", value),
             "Name: pg\\n   Uplinks: vmnic9\n"
             "Comment: \\x1b]0;owned\\x07 tab\\there \\u009b2J caf\xC3\xA9\n");

@@ -2,10 +2,10 @@
 #include "Host.h"
 #include "Options.h"
 
+#include "../support/ScratchHost.h"
 #include "Fabrik/AutoCli.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
-#include "../support/ScratchHost.h"
 #include "model/CoreModel.h"
 #include "model/Store.h"
 
@@ -295,8 +295,9 @@ TEST(HostTest, ACommandIsOneTransaction) {
 TEST(HostTest, LongEchoedValuesAreShortened) {
   const std::string word(200, 'x');
   const std::string accented = std::string(70, 'a') + "\xc3\xa9";
-  std::string shortened = Ostra::ShortenEchoes(
-      "Error: \"" + word + "\" and \"" + accented + "\" are refused; " + word, {word, accented, "x"});
+  std::string shortened =
+      Ostra::ShortenEchoes("Error: \"" + word + "\" and \"" + accented + "\" are refused; " + word,
+                           {word, accented, "x"});
   const std::string cut = std::string(64, 'x') + "\xe2\x80\xa6 (200 bytes)";
   EXPECT_EQ(shortened, "Error: \"" + cut + "\" and \"" + std::string(64, 'a') +
                            "\xe2\x80\xa6 (72 bytes)\" are refused; " + cut);

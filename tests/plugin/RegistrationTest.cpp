@@ -6,8 +6,8 @@
 // the children, and the names that the default output settings refer to.
 //
 //===----------------------------------------------------------------------===//
-#include "entry/Register.h"
 #include "Host.h"
+#include "entry/Register.h"
 
 #include "datapath.h"
 #include "firewall.h"

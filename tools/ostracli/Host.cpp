@@ -19,17 +19,17 @@
 #include <algorithm>
 #include <cerrno>
 #include <climits>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <dirent.h>
-#include <csignal>
-#include <sys/stat.h>
 #include <dlfcn.h>
 #include <ostream>
 #include <sstream>
 #include <stdexcept>
 #include <streambuf>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #ifndef OSTRA_VERSION
@@ -106,8 +106,8 @@ std::string HostProblem() {
     return "";
   struct stat st {};
   if (::stat(host.path.c_str(), &st) != 0 && errno == ENOENT)
-    return "ostracli: no host state at " + host.path +
-           " (create one with: ostrahost init " + host.path + ")\n";
+    return "ostracli: no host state at " + host.path + " (create one with: ostrahost init " +
+           host.path + ")\n";
   if (S_ISDIR(st.st_mode))
     return "ostracli: " + host.path + " is a directory, not a host state\n";
   if (::access(host.path.c_str(), R_OK) != 0)
@@ -250,8 +250,8 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
         return -1;
       options.lockTimeoutMs = ParseTimeout(text);
       if (options.lockTimeoutMs < 0) {
-        err += "Error: option --lock-timeout takes milliseconds from 0 to 9999999, got \"" +
-               text + "\"\n";
+        err += "Error: option --lock-timeout takes milliseconds from 0 to 9999999, got \"" + text +
+               "\"\n";
         return -1;
       }
     } else if (name == "--reference") {

@@ -388,8 +388,12 @@ std::string EscapeControls(const std::string& text, Escapes which) {
     } else if (length == 1) {
       escaped += {'\\', 'x', kHex[code >> 4], kHex[code & 15]};
     } else {
-      escaped += {'\\', 'u', kHex[(code >> 12) & 15], kHex[(code >> 8) & 15],
-                  kHex[(code >> 4) & 15], kHex[code & 15]};
+      escaped += {'\\',
+                  'u',
+                  kHex[(code >> 12) & 15],
+                  kHex[(code >> 8) & 15],
+                  kHex[(code >> 4) & 15],
+                  kHex[code & 15]};
     }
     pos += length;
   }

@@ -123,8 +123,8 @@ void TableFormatter::Write(std::ostream& out, const MetaObjectPtr& root,
     std::vector<std::string>& line = cells.emplace_back();
     for (const std::string& column : columns) {
       const MetaObjectPtr* value = row->GetField(column);
-      line.push_back(value ? EscapeControls(WithUnit(CompactText(*value, params), *row, column, params))
-                           : "");
+      line.push_back(
+          value ? EscapeControls(WithUnit(CompactText(*value, params), *row, column, params)) : "");
     }
   }
 

@@ -107,7 +107,8 @@ std::string Backslashed(const std::string& text) {
   for (std::size_t pos = 0; pos < text.size();) {
     std::size_t length = Utf8SequenceLength(text, pos);
     const auto c = static_cast<unsigned char>(text[pos]);
-    const bool bad = length == 0 || (length == 1 && c < 0x20 && c != '\t' && c != '\n' && c != '\r') ||
+    const bool bad = length == 0 ||
+                     (length == 1 && c < 0x20 && c != '\t' && c != '\n' && c != '\r') ||
                      text.compare(pos, length, "\xEF\xBF\xBE") == 0 ||
                      text.compare(pos, length, "\xEF\xBF\xBF") == 0;
     if (length == 0)

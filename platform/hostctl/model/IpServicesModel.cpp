@@ -321,8 +321,7 @@ void SaveDns(Store& store, const std::string& netstack, const std::vector<std::s
         .Run();
 }
 
-bool HasDnsEntry(Store& store, const std::string& netstack, bool domain,
-                 const std::string& value) {
+bool HasDnsEntry(Store& store, const std::string& netstack, bool domain, const std::string& value) {
   RequireNetstack(store, netstack);
   Statement find =
       domain ? store.Prepare("SELECT 1 FROM ipsvc_dns_search WHERE netstack = ? AND "
@@ -334,10 +333,11 @@ bool HasDnsEntry(Store& store, const std::string& netstack, bool domain,
 void AppendDnsEntry(Store& store, const std::string& netstack, bool domain,
                     const std::string& value) {
   Statement insert =
-      domain ? store.Prepare("INSERT INTO ipsvc_dns_search(netstack, domain, ord) SELECT ?1, ?2, "
-                             "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_search WHERE netstack = ?1")
-             : store.Prepare("INSERT INTO ipsvc_dns_server(netstack, address, ord) SELECT ?1, ?2, "
-                             "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_server WHERE netstack = ?1");
+      domain
+          ? store.Prepare("INSERT INTO ipsvc_dns_search(netstack, domain, ord) SELECT ?1, ?2, "
+                          "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_search WHERE netstack = ?1")
+          : store.Prepare("INSERT INTO ipsvc_dns_server(netstack, address, ord) SELECT ?1, ?2, "
+                          "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_server WHERE netstack = ?1");
   insert.BindAll(netstack, value).Run();
 }
 

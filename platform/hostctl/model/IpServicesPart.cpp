@@ -53,22 +53,23 @@ namespace {
 // NOT NULL column placed between the key columns of a WITHOUT ROWID table.
 // The order index makes an addition at the end cost O(log n); the domain
 // index finds a domain in any case.
-#define DNS_TABLES \
-  "CREATE TABLE ipsvc_dns_server(\n" \
-  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n" \
-  "  address TEXT NOT NULL,\n" \
-  "  ord INTEGER NOT NULL,\n" \
-  "  PRIMARY KEY(netstack, address)\n" \
-  ") WITHOUT ROWID;\n" \
-  "CREATE UNIQUE INDEX ipsvc_dns_server_by_ord ON ipsvc_dns_server(netstack, ord);\n" \
-  "CREATE TABLE ipsvc_dns_search(\n" \
-  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n" \
-  "  domain TEXT NOT NULL,\n" \
-  "  ord INTEGER NOT NULL,\n" \
-  "  PRIMARY KEY(netstack, domain)\n" \
-  ") WITHOUT ROWID;\n" \
-  "CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);\n" \
-  "CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE NOCASE);\n"
+#define DNS_TABLES                                                                                 \
+  "CREATE TABLE ipsvc_dns_server(\n"                                                               \
+  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
+  "  address TEXT NOT NULL,\n"                                                                     \
+  "  ord INTEGER NOT NULL,\n"                                                                      \
+  "  PRIMARY KEY(netstack, address)\n"                                                             \
+  ") WITHOUT ROWID;\n"                                                                             \
+  "CREATE UNIQUE INDEX ipsvc_dns_server_by_ord ON ipsvc_dns_server(netstack, ord);\n"              \
+  "CREATE TABLE ipsvc_dns_search(\n"                                                               \
+  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
+  "  domain TEXT NOT NULL,\n"                                                                      \
+  "  ord INTEGER NOT NULL,\n"                                                                      \
+  "  PRIMARY KEY(netstack, domain)\n"                                                              \
+  ") WITHOUT ROWID;\n"                                                                             \
+  "CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);\n"              \
+  "CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE "          \
+  "NOCASE);\n"
 
 const char* const kIpServicesSchema = R"sql(
 -- Static and default routes of a netstack, one row each; the routes of the

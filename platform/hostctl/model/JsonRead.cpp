@@ -11,10 +11,10 @@ ordered_json ParseDescription(const std::string& text) {
   // The parser keeps the last of repeated keys without a word; a description
   // that says two things about one field is refused instead.
   struct Frame {
-    bool object;                   ///< An object, else an array.
-    std::set<std::string> keys;    ///< Keys seen so far (objects).
-    std::string key;               ///< The latest key (objects).
-    std::size_t count = 0;         ///< Elements begun so far (arrays).
+    bool object;                ///< An object, else an array.
+    std::set<std::string> keys; ///< Keys seen so far (objects).
+    std::string key;            ///< The latest key (objects).
+    std::size_t count = 0;      ///< Elements begun so far (arrays).
   };
   std::vector<Frame> frames;
   auto path = [&frames] {

@@ -267,9 +267,8 @@ std::unique_ptr<Store> Store::Create(const std::string& path) {
     sqlite3_close(db);
     throw HostCtlException("Cannot create the host state at " + path + ": " + message);
   }
-  std::string sql =
-      "PRAGMA application_id=" + std::to_string(kApplicationId) +
-      "; PRAGMA user_version=" + std::to_string(kSchemaVersion) + "; BEGIN;";
+  std::string sql = "PRAGMA application_id=" + std::to_string(kApplicationId) +
+                    "; PRAGMA user_version=" + std::to_string(kSchemaVersion) + "; BEGIN;";
   for (const Part* part : AllParts())
     sql += part->schema;
   sql += "COMMIT;";

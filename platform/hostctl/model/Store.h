@@ -182,14 +182,14 @@ private:
   std::string LostMessage() const;
 
   struct Cache;
-  std::string path_;             ///< Database file.
-  sqlite3* db_ = nullptr;        ///< Connection.
-  std::unique_ptr<Cache> cache_; ///< Prepared statements and faults.
-  int depth_ = 0;                ///< Nesting of transaction scopes.
-  bool writing_ = false;         ///< The open transaction is a write.
-  bool lost_ = false;            ///< SQLite rolled back the open transaction.
+  std::string path_;                ///< Database file.
+  sqlite3* db_ = nullptr;           ///< Connection.
+  std::unique_ptr<Cache> cache_;    ///< Prepared statements and faults.
+  int depth_ = 0;                   ///< Nesting of transaction scopes.
+  bool writing_ = false;            ///< The open transaction is a write.
+  bool lost_ = false;               ///< SQLite rolled back the open transaction.
   mutable std::string lastFailure_; ///< Text of the last failure, for a lost transaction.
-  std::vector<bool> units_;      ///< Open units, innermost last; true: began the transaction.
+  std::vector<bool> units_;         ///< Open units, innermost last; true: began the transaction.
 };
 
 /// Shorthand for Store::Host().CheckFault(...).
