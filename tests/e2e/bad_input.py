@@ -41,6 +41,7 @@ import concurrent.futures
 import errno
 import itertools
 import json
+import re
 import os
 import shutil
 import subprocess
@@ -464,8 +465,9 @@ def check_run(path, parameter, status, out, err, batch):
     except UnicodeDecodeError:
         return "message is not UTF-8: " + repr(err[:120])
     if batch:
-        text = "\n".join(line for line in text.splitlines()
-                         if not line.startswith("Batch stopped at line"))
+        # A batch names the line of each message and ends with its summary.
+        text = "\n".join(re.sub(r"^ostracli: -:\d+: ", "", line) for line in text.splitlines()
+                         if not re.match(r"ostracli: -: \d+ lines? applied", line))
     if not text.strip():
         return "no message"
     if len(text) > MAX_MESSAGE:

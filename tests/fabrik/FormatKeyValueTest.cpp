@@ -61,7 +61,26 @@ std::optional<KeyValues> ReadKeyValues(const std::string& text) {
     for (std::size_t i = pos + 1; i < line.size(); ++i) {
       if (line[i] == '\\' && i + 1 < line.size()) {
         const char next = line[++i];
-        value += next == 'n' ? '\n' : next == 'r' ? '\r' : next;
+        if (next == 'x' || next == 'u') { // \xHH, \uHHHH: one code point.
+          const std::size_t digits = next == 'x' ? 2 : 4;
+          const unsigned long code = std::stoul(line.substr(i + 1, digits), nullptr, 16);
+          i += digits;
+          if (code < 0x80)
+            value += static_cast<char>(code);
+          else if (code < 0x800)
+            value +=
+                {static_cast<char>(0xC0 | (code >> 6)), static_cast<char>(0x80 | (code & 0x3F))};
+          else
+            value += {static_cast<char>(0xE0 | (code >> 12)),
+                      static_cast<char>(0x80 | ((code >> 6) & 0x3F)),
+                      static_cast<char>(0x80 | (code & 0x3F))};
+          continue;
+        }
+        value += next == 'n'   ? '\n'
+                 : next == 'r' ? '\r'
+                 : next == 'v' ? '\v'
+                 : next == 'f' ? '\f'
+                               : next;
       } else {
         value += line[i];
       }
@@ -190,9 +209,15 @@ TEST(KeyValueFormatTest, ReadsBackAsTheResult) {
     EXPECT_EQ(read->value, Expected(root)) << name;
   }
 
+  // Every character that some line-splitting reader takes as a line end.
   auto odd = MetaStruct::New("Odd.Name");
-  odd->SetField("a.b[1]=c\\", "x=y\\z\r\nw");
-  std::optional<KeyValues> read = ReadKeyValues(Render("keyvalue", odd));
+  odd->SetField("a.b[1]=c\\", "x=y\\z\r\nw\v\f\x1c\x1d\x1e|\xC2\x85|\xE2\x80\xA8|\xE2\x80\xA9|\t");
+  const std::string text = Render("keyvalue", odd);
+  for (const char* end :
+       {"\r", "\v", "\f", "\x1c", "\x1d", "\x1e", "\xC2\x85", "\xE2\x80\xA8", "\xE2\x80\xA9"})
+    EXPECT_EQ(text.find(end), std::string::npos) << text;
+  EXPECT_EQ(text.find('\n'), text.size() - 1);
+  std::optional<KeyValues> read = ReadKeyValues(text);
   ASSERT_TRUE(read);
   EXPECT_EQ(read->root, "Odd.Name");
   EXPECT_EQ(read->value, Expected(odd));

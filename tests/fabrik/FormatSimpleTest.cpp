@@ -42,6 +42,16 @@ TEST(SimpleFormatTest, ScalarsAndStringLists) {
   EXPECT_EQ(Render("simple", list), "search.example\nlab.example\n");
 }
 
+TEST(SimpleFormatTest, StoredTextCannotForgeLinesOrReachTheTerminal) {
+  auto value = MetaStruct::New("PortGroup");
+  value->SetField("Name", "pg\n   Uplinks: vmnic9");
+  value->SetField("Comment", "\x1b]0;owned\x07 tab\there \xC2\x9B"
+                             "2J caf\xC3\xA9");
+  EXPECT_EQ(Render("simple", value),
+            "Name: pg\\n   Uplinks: vmnic9\n"
+            "Comment: \\x1b]0;owned\\x07 tab\\there \\u009b2J caf\xC3\xA9\n");
+}
+
 TEST(SimpleFormatTest, StructureWithNestedValuesUnitsAndUnsetFields) {
   auto value = Switch("vSwitch0", 1500, {"vmnic0", "vmnic1"}, {});
   value->SetField("Notes", "");

@@ -97,16 +97,18 @@ TEST(TableFormatTest, FallsBackToSimpleForScalarsAndHandlesEdges) {
 
 TEST(TableFormatTest, CountsCharactersNotBytesAndKeepsCellsOnOneLine) {
   auto list = MetaList::New(Struct);
-  for (const char* name : {"Z\xC3\xBCrich", "Bern\nNord"}) {
+  // A stored line break or terminal escape is shown escaped, never obeyed.
+  for (const char* name : {"Z\xC3\xBCrich", "Bern\nNord", "\x1b[2J\xC2\x9B"}) {
     auto row = MetaStruct::New("City");
     row->SetField("Name", name);
     row->SetField("Id", 1L);
     list->Add(row);
   }
-  EXPECT_EQ(Render("table", list), "Name       Id\n"
-                                   "---------  --\n"
-                                   "Z\xC3\xBCrich     1\n"
-                                   "Bern Nord  1\n");
+  EXPECT_EQ(Render("table", list), "Name           Id\n"
+                                   "-------------  --\n"
+                                   "Z\xC3\xBCrich         1\n"
+                                   "Bern\\nNord     1\n"
+                                   "\\x1b[2J\\u009b  1\n");
 }
 
 TEST_F(ColumnsTest, WrapsTheLastColumnToTheTerminalWidth) {

@@ -136,24 +136,27 @@ TEST(XmlFormatTest, SelectsFieldsAndIgnoresDisplayParameters) {
                           "</output>\n");
 }
 
-TEST(XmlFormatTest, EscapesMarkupAndReplacesWhatXmlCannotHold) {
+TEST(XmlFormatTest, EscapesMarkupAndWhatXmlCannotHoldReversibly) {
   auto value = MetaStruct::New("A&B");
   value->SetField("Say \"<hi>\"", "Tom & Jerry's <tag> ]]>\t\r\n");
-  // NUL and other control characters, U+FFFF and bytes that are not UTF-8.
+  // NUL and other control characters, U+FFFF and bytes that are not UTF-8:
+  // written as backslash escapes in a string marked so, backslashes too.
   value->SetField("Raw", "a\0b\x01\x1f\x7f"
                          "c\xEF\xBF\xBF"
                          "d\xC0\xAF"
-                         "e\xC3\xA9"s);
+                         "e\xC3\xA9\\"s);
+  value->SetField("Plain", "back\\slash");
   EXPECT_EQ(Render("xml", value),
             Declaration + "<output>\n"
                           "  <structure typeName=\"A&amp;B\">\n"
                           "    <field name=\"Say &quot;&lt;hi&gt;&quot;\"><string>Tom &amp; "
                           "Jerry's &lt;tag&gt; ]]&gt;&#9;&#13;&#10;</string></field>\n"
-                          "    <field name=\"Raw\"><string>a\xEF\xBF\xBD"
-                          "b\xEF\xBF\xBD\xEF\xBF\xBD\x7f"
-                          "c\xEF\xBF\xBD"
-                          "d\xEF\xBF\xBD\xEF\xBF\xBD"
-                          "e\xC3\xA9</string></field>\n"
+                          "    <field name=\"Raw\"><string escaped=\"backslash\">a\\x00"
+                          "b\\x01\\x1f\x7f"
+                          "c\\xef\\xbf\\xbf"
+                          "d\\xc0\\xaf"
+                          "e\xC3\xA9\\\\</string></field>\n"
+                          "    <field name=\"Plain\"><string>back\\slash</string></field>\n"
                           "  </structure>\n"
                           "</output>\n");
 }

@@ -220,7 +220,7 @@ namespace {
 
 TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
   auto store = Make(TwoNics());
-  store->BeginBatch();
+  store->BeginUnit(true);
   store->Write([&] { Model::PutSetting(*store, "a", "1"); });
   EXPECT_THROW(store->Write([&] {
     Model::PutSetting(*store, "b", "1");
@@ -228,15 +228,15 @@ TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
   }),
                HostCtlException);
   store->Write([&] { Model::PutSetting(*store, "c", "1"); });
-  store->EndBatch(true);
+  store->EndUnit(true);
   Model::Store other(path_);
   EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "a").has_value(); }));
   EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "b").has_value(); }));
   EXPECT_TRUE(other.Read([&] { return Model::GetSetting(other, "c").has_value(); }));
 
-  store->BeginBatch();
+  store->BeginUnit(true);
   store->Write([&] { Model::PutSetting(*store, "d", "1"); });
-  store->EndBatch(false);
+  store->EndUnit(false);
   EXPECT_FALSE(other.Read([&] { return Model::GetSetting(other, "d").has_value(); }));
 }
 
@@ -245,9 +245,7 @@ TEST_F(StoreTest, BatchKeepsGoodOperationsAndUndoesFailedOnes) {
 namespace {
 
 TEST_F(StoreTest, TruncatedStoreIsReportedNotReset) {
-  Make(TwoNics())->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
-  for (const char* suffix : {"-wal", "-shm"})
-    ::unlink((path_ + suffix).c_str());
+  Make(TwoNics());
   struct stat st {};
   ASSERT_EQ(::stat(path_.c_str(), &st), 0);
   ASSERT_EQ(::truncate(path_.c_str(), st.st_size / 2), 0);
@@ -271,16 +269,16 @@ TEST_F(StoreTest, WriterWaitsForALockThenGivesUpClearly) {
   pid_t pid = ::fork();
   if (pid == 0) {
     Model::Store holder(path_);
-    holder.BeginBatch(); // Holds the write lock.
+    holder.BeginUnit(true); // Holds the write lock.
     char c = 1;
     (void)!::write(ready[1], &c, 1);
     (void)!::read(release[0], &c, 1);
-    holder.EndBatch(false);
+    holder.EndUnit(false);
     ::_exit(0);
   }
   char c;
   ASSERT_EQ(::read(ready[0], &c, 1), 1);
-  ::setenv("OSTRACLI_BUSY_TIMEOUT_MS", "200", 1);
+  Model::Store::SetLockTimeout(200);
   {
     Model::Store store(path_);
     try {
@@ -293,7 +291,7 @@ TEST_F(StoreTest, WriterWaitsForALockThenGivesUpClearly) {
     // Reads go on while the other process holds the write lock.
     EXPECT_FALSE(store.Read([&] { return Model::GetSetting(store, "x").has_value(); }));
   }
-  ::unsetenv("OSTRACLI_BUSY_TIMEOUT_MS");
+  Model::Store::SetLockTimeout(HostCtl::Session::kDefaultLockTimeoutMs);
   (void)!::write(release[1], &c, 1);
   int status = 0;
   ::waitpid(pid, &status, 0);
@@ -330,8 +328,9 @@ std::pair<std::string, int64_t> Durability(Model::Store& store) {
   return {mode.Text(0), sync.Int(0)};
 }
 
-TEST_F(StoreTest, EveryWritePathCommitsInWalModeWithFullSync) {
-  const std::pair<std::string, int64_t> durable{"wal", 2};
+TEST_F(StoreTest, EveryWritePathCommitsToTheFileWithFullSync) {
+  // A rollback journal: a committed change is in the database file itself.
+  const std::pair<std::string, int64_t> durable{"delete", 2};
   // A new store, and the import that fills it.
   auto created = Model::Store::Create(path_);
   EXPECT_EQ(created->Write([&] { return Durability(*created); }), durable) << "Create";
@@ -345,23 +344,51 @@ TEST_F(StoreTest, EveryWritePathCommitsInWalModeWithFullSync) {
   // The process's host store, one command at a time and as a batch.
   Model::Store::SetPath(path_);
   Model::Store& host = Model::Store::Host();
-  EXPECT_EQ(host.Write([&] { return Durability(host); }), durable) << "host store";
+  HostCtl::Session::BeginCommand(true);
+  EXPECT_EQ(host.Write([&] { return Durability(host); }), durable) << "command";
+  HostCtl::Session::EndCommand(true);
   HostCtl::Session::BeginBatch();
   EXPECT_EQ(host.Write([&] { return Durability(host); }), durable) << "batch";
   HostCtl::Session::EndBatch(true);
   Model::Store::CloseHost();
   // The default host, created from the demo profile on first use.
-  Model::Store::SetPath("");
-  const char* env = std::getenv("OSTRACLI_HOST");
-  const std::string saved = env ? env : "";
-  ::setenv("XDG_STATE_HOME", (dir_ + "/state").c_str(), 1);
-  ::unsetenv("OSTRACLI_HOST");
+  Model::Store::SetPath(dir_ + "/state/ostracli/host.db", /*createDemo=*/true);
   Model::Store& fresh = Model::Store::Host();
-  EXPECT_EQ(fresh.GetPath(), dir_ + "/state/ostracli/host.db");
   EXPECT_EQ(fresh.Write([&] { return Durability(fresh); }), durable) << "default host";
-  ::unsetenv("XDG_STATE_HOME");
-  if (!saved.empty())
-    ::setenv("OSTRACLI_HOST", saved.c_str(), 1);
+  Model::Store::CloseHost();
+}
+
+} // namespace
+
+namespace {
+
+std::vector<std::string> Column(Model::Store& store, const char* sql) {
+  std::vector<std::string> values;
+  Model::Statement rows = store.Prepare(sql);
+  while (rows.Step())
+    values.push_back(rows.Text(0));
+  return values;
+}
+
+// A host written by the release before layout 2 (a write-ahead log, resolver
+// tables that SQLite 3.40's integrity check misreads) is brought up to date
+// when it is first opened, and stays the same host.
+TEST_F(StoreTest, UpgradesAFileOfTheLayoutBefore) {
+  std::system(("cp " HOSTCTL_FIXTURES "/layout1.db " + path_).c_str());
+  {
+    Model::Store old(path_);
+    EXPECT_EQ(Column(old, "PRAGMA user_version"), std::vector<std::string>{"2"});
+    EXPECT_EQ(Column(old, "PRAGMA journal_mode"), std::vector<std::string>{"delete"});
+    EXPECT_EQ(Column(old, "PRAGMA integrity_check"), std::vector<std::string>{"ok"});
+    EXPECT_TRUE(Column(old, "PRAGMA foreign_key_check").empty());
+    // The same host as a demo host made now, resolver order included.
+    auto fresh = Model::Store::Create(dir_ + "/fresh.db");
+    Model::ImportHost(*fresh, Model::Profile("demo"));
+    EXPECT_EQ(Model::ExportHost(old), Model::ExportHost(*fresh));
+  }
+  // A second open finds nothing left to do.
+  Model::Store again(path_);
+  EXPECT_EQ(Column(again, "PRAGMA integrity_check"), std::vector<std::string>{"ok"});
 }
 
 } // namespace

@@ -2,8 +2,12 @@
 #include "Host.h"
 #include "Options.h"
 
+#include "../support/ScratchHost.h"
 #include "Fabrik/AutoCli.h"
 #include "HostCtl/Lib.h"
+#include "HostCtl/Session.h"
+#include "model/CoreModel.h"
+#include "model/Store.h"
 
 #include <gtest/gtest.h>
 
@@ -171,16 +175,53 @@ protected:
       return;
     case 2:
       throw std::runtime_error("boom");
+    case 4: // A first step done; a later one refused unless the key says "ok".
+      Put(input->GetParameter("nic-name"));
+      if (input->GetParameter("nic-name") != "ok")
+        output->AddErrorMessage("the second step was refused");
+      output->SetRootObject(MetaObj::MetaBool::New(true));
+      return;
     default:
       throw 42;
     }
+  }
+
+  /// One change of the host: a setting named \p key.
+  static void Put(const std::string& key) {
+    Model::Store& store = Model::Store::Host();
+    store.Write([&] { Model::PutSetting(store, key, "1"); });
   }
 
 private:
   int mode_; ///< Which behaviour to show.
 };
 
+/// A command whose result is no boolean, so it runs in a read transaction,
+/// but that tries to change the host anyway.
+class SneakyReader : public Probe {
+public:
+  SneakyReader() : Probe(0) {}
+
+protected:
+  std::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+    auto spec = CallSpec::OutputSpec::New();
+    spec->SetRootObject(MetaObj::MetaString::New());
+    return spec;
+  }
+  void ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
+                       const std::shared_ptr<CallSpec::Output>& output) override {
+    Put(input->GetParameter("nic-name"));
+    output->SetRootObject(MetaObj::MetaString::New("changed"));
+  }
+};
+
+bool HasSetting(const std::string& key) {
+  Model::Store& store = Model::Store::Host();
+  return store.Read([&] { return Model::GetSetting(store, key).has_value(); });
+}
+
 TEST(HostTest, ExitStatusesAndEscapingExceptions) {
+  TestSupport::ScratchHost host("host-test", "{}");
   auto root = AutoCli::Namespace::New();
   auto probes = AutoCli::Namespace::New();
   for (int mode = 0; mode < 4; ++mode)
@@ -207,6 +248,64 @@ TEST(HostTest, ExitStatusesAndEscapingExceptions) {
   EXPECT_EQ(out, "");
   EXPECT_EQ(run({"probe"}, out, err), 0);
   EXPECT_NE(out.find("Available Commands:"), std::string::npos);
+}
+
+TEST(HostTest, ACommandIsOneTransaction) {
+  TestSupport::ScratchHost host("host-transaction", "{}");
+  auto root = AutoCli::Namespace::New();
+  auto probes = AutoCli::Namespace::New();
+  probes->RegisterNamespaceNode(std::make_shared<Probe>(4), "partly");
+  probes->RegisterNamespaceNode(std::make_shared<SneakyReader>(), "sneaky");
+  root->RegisterNamespaceNode(probes, "probe");
+  Ostra::CommandTree tree(root);
+  auto run = [&](const std::string& key, const Ostra::RunMode& mode) {
+    std::string out, err;
+    int status = Ostra::RunCommandLine(tree, {"probe", "partly", "-n", key}, out, err, mode);
+    EXPECT_EQ(err, key == "ok" ? "" : "the second step was refused\n");
+    return status;
+  };
+
+  // The steps before a refused one stay, as the command's order promises...
+  EXPECT_EQ(run("plain", {}), 1);
+  EXPECT_TRUE(HasSetting("plain"));
+  // ...unless --atomic asks for all or nothing.
+  Ostra::RunMode atomic;
+  atomic.atomic = true;
+  EXPECT_EQ(run("atomic", atomic), 1);
+  EXPECT_FALSE(HasSetting("atomic"));
+
+  // A failed batch line is undone whole; the lines around it stay.
+  Ostra::RunMode line;
+  line.inBatch = true;
+  HostCtl::Session::BeginBatch();
+  EXPECT_EQ(run("ok", line), 0);
+  EXPECT_EQ(run("line", line), 1);
+  HostCtl::Session::EndBatch(true);
+  EXPECT_TRUE(HasSetting("ok"));
+  EXPECT_FALSE(HasSetting("line"));
+
+  // A command that only reads runs in a read transaction: a change is refused
+  // and leaves nothing behind.
+  std::string out, err;
+  EXPECT_EQ(Ostra::RunCommandLine(tree, {"probe", "sneaky", "-n", "sneaky"}, out, err), 1);
+  EXPECT_EQ(err, "Internal error: a change was attempted inside a read\n");
+  EXPECT_FALSE(HasSetting("sneaky"));
+}
+
+TEST(HostTest, LongEchoedValuesAreShortened) {
+  const std::string word(200, 'x');
+  const std::string accented = std::string(70, 'a') + "\xc3\xa9";
+  std::string shortened =
+      Ostra::ShortenEchoes("Error: \"" + word + "\" and \"" + accented + "\" are refused; " + word,
+                           {word, accented, "x"});
+  const std::string cut = std::string(64, 'x') + "\xe2\x80\xa6 (200 bytes)";
+  EXPECT_EQ(shortened, "Error: \"" + cut + "\" and \"" + std::string(64, 'a') +
+                           "\xe2\x80\xa6 (72 bytes)\" are refused; " + cut);
+  // A multi-byte character is never cut in two.
+  const std::string wide = std::string(63, 'a') + "\xc3\xa9" + std::string(10, 'b');
+  EXPECT_EQ(Ostra::ShortenEchoes(wide, {wide}),
+            std::string(63, 'a') + "\xc3\xa9\xe2\x80\xa6 (75 bytes)");
+  EXPECT_EQ(Ostra::ShortenEchoes("short", {"short"}), "short");
 }
 
 } // namespace

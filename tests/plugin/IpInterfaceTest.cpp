@@ -12,6 +12,8 @@
 #include "HostCtl/Network/TvkNic.h"
 #include "TvkCtl/Network/NetstackInstanceImpl.h"
 
+#include "HostCtl/Session.h"
+
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -26,7 +28,7 @@ using Fabrik::CallSpec::Output;
 
 class IpInterfaceTest : public ::testing::Test {
 protected:
-  void SetUp() override { ::setenv("OSTRACLI_HOST", "/nonexistent/ip-interface-test.db", 1); }
+  void SetUp() override { HostCtl::Session::SetHost("/nonexistent/ip-interface-test.db"); }
 
   /// Runs \p command with \p input; expects exactly \p errors and no result.
   void ExpectRefused(Fabrik::AutoCli::Command& command, const std::shared_ptr<Input>& input,

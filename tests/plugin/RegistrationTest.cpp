@@ -6,6 +6,7 @@
 // the children, and the names that the default output settings refer to.
 //
 //===----------------------------------------------------------------------===//
+#include "Host.h"
 #include "entry/Register.h"
 
 #include "datapath.h"
@@ -1160,6 +1161,39 @@ TEST_F(RegistrationTest, OutputParametersNameStructuresAndFieldsOfTheResult) {
         EXPECT_EQ(structure->second.count(field), 1u) << key << " names no field " << field;
     }
   }
+}
+
+} // namespace
+
+namespace {
+
+/// Commands whose last word is no "get" or "list" although they only read:
+/// they print what the NIC holds or reports.
+const std::set<std::string> kVerbExceptions = {
+    "network nic eeprom dump",
+    "network nic register dump",
+    "network nic selftest run",
+    "network sriovnic vf stats",
+};
+
+// The command host runs a command whose result is a boolean in a write
+// transaction and every other command in a read transaction, where a change
+// is refused. Across the whole tree, that must agree with what each command
+// is for: "get" and "list" commands read, every other command acts.
+TEST_F(RegistrationTest, EveryActionAndOnlyActionsRunInAWriteTransaction) {
+  std::size_t actions = 0;
+  for (const auto& [path, node] : nodes) {
+    auto command = std::dynamic_pointer_cast<CommandSpec>(node);
+    if (!command)
+      continue;
+    const std::string verb = path.substr(path.find_last_of(' ') + 1);
+    const bool reads = verb == "get" || verb == "list";
+    const bool changes = Ostra::ChangesHost(*command);
+    actions += changes ? 1 : 0;
+    EXPECT_EQ(changes, !reads != (kVerbExceptions.count(path) > 0)) << path;
+  }
+  EXPECT_GT(actions, 0u);
+  EXPECT_LT(actions, commandCount);
 }
 
 } // namespace

@@ -264,8 +264,8 @@ def check_store(path):
         if lonely:
             problems.append("port groups without their policy row: %s" % lonely[:10])
         mode = db.execute("PRAGMA journal_mode").fetchone()[0]
-        if mode != "wal":
-            problems.append("journal mode is %s, not wal" % mode)
+        if mode != "delete":
+            problems.append("journal mode is %s, not delete" % mode)
     finally:
         db.close()
     return problems

@@ -41,7 +41,7 @@ public:
 
 private:
   void Remove() {
-    for (const char* suffix : {"", "-wal", "-shm"})
+    for (const char* suffix : {"", "-journal"})
       std::filesystem::remove(path_.string() + suffix);
   }
 

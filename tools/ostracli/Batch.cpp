@@ -6,8 +6,12 @@
 // on one host. Blank lines and lines starting with "#" are skipped. Each
 // command prints what it would print alone. The batch stops at the first line
 // that fails unless --keep-going is given; the exit status is the worst of the
-// lines. All changes of the batch are committed together, durably, when it
-// ends: a failed line's own changes are undone, the others' are kept.
+// lines. Messages name their line ("ostracli: FILE:N: ..."), and a summary
+// line counts the lines applied and failed. All changes of the batch are
+// committed together, durably, when it ends: each line is a savepoint, so a
+// failed line is undone whole while the others are kept (with --atomic,
+// nothing is kept unless every line succeeded). A batch whose transaction is
+// lost, or whose output cannot be written, stops at once and keeps nothing.
 //
 //===----------------------------------------------------------------------===//
 #include "Host.h"
@@ -15,11 +19,13 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
 
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
 #include <cstdio>
-#include <cstdlib>
-#include <fstream>
-#include <iostream>
+#include <cstring>
 #include <string>
+#include <sys/stat.h>
 
 namespace Ostra {
 
@@ -67,80 +73,153 @@ bool SplitWords(const std::string& line, std::vector<std::string>& words) {
   return true;
 }
 
-int RunBatch(const CommandTree& tree, const std::string& file,
-             const std::vector<std::string>& defaults, bool keepGoing) {
-  std::ifstream stream;
-  std::istream* in = &std::cin;
-  if (file != "-") {
-    stream.open(file);
-    if (!stream) {
-      std::fprintf(stderr, "Error: cannot read the batch file %s\n", file.c_str());
-      return ExitUsage;
+namespace {
+
+/// Reads the batch: a file, a FIFO or standard input, never a directory.
+class BatchInput {
+public:
+  /// Opens \p file; "" on success, else the refusal.
+  std::string Open(const std::string& file) {
+    if (file == "-") {
+      stream_ = stdin;
+      return "";
     }
-    in = &stream;
+    stream_ = std::fopen(file.c_str(), "r");
+    if (!stream_)
+      return "Error: cannot read the batch file " + file + ": " + std::strerror(errno) + "\n";
+    owned_ = true;
+    struct stat st {};
+    if (::fstat(::fileno(stream_), &st) == 0 && S_ISDIR(st.st_mode))
+      return "Error: the batch file " + file + " is a directory\n";
+    return "";
   }
-  // The host is the one named in front of --batch (or the default); a line
-  // cannot switch hosts.
-  GlobalOptions global;
-  std::string err;
-  ParseGlobalOptions(defaults, global, err);
-  if (!global.hostPath.empty()) {
-    ::setenv("OSTRACLI_HOST", global.hostPath.c_str(), 1);
+  ~BatchInput() {
+    if (owned_)
+      std::fclose(stream_);
   }
+  /// The next line without its line end; false at the end or on a read
+  /// error (Failed() tells which).
+  bool Next(std::string& line) {
+    line.clear();
+    int c;
+    while ((c = std::getc(stream_)) != EOF) {
+      if (c == '\n')
+        return true;
+      line += static_cast<char>(c);
+    }
+    return !line.empty() && !std::ferror(stream_);
+  }
+  bool Failed() const { return std::ferror(stream_) != 0; }
+
+private:
+  std::FILE* stream_ = nullptr; ///< The batch.
+  bool owned_ = false;          ///< Opened here.
+};
+
+/// "ostracli: FILE:N: " in front of every line of \p messages.
+std::string NameLine(const std::string& messages, const std::string& where) {
+  std::string named;
+  for (std::size_t pos = 0; pos < messages.size();) {
+    std::size_t end = messages.find('\n', pos);
+    if (end == std::string::npos)
+      end = messages.size();
+    named += where + messages.substr(pos, end - pos) + "\n";
+    pos = end + 1;
+  }
+  return named;
+}
+
+} // namespace
+
+int RunBatch(const CommandTree& tree, const std::string& file,
+             const std::vector<std::string>& defaults, bool keepGoing, bool atomic) {
+  BatchInput input;
+  if (std::string problem = input.Open(file); !problem.empty()) {
+    std::fputs(problem.c_str(), stderr);
+    return ExitUsage;
+  }
+  // A reader that goes away (a batch piped into head) must not end the
+  // process halfway through: the failed write stops the batch instead, and
+  // nothing of it is kept.
+  std::signal(SIGPIPE, SIG_IGN);
+  const std::string name = file == "-" ? "-" : file;
   try {
-    if (!global.hostPath.empty())
-      HostCtl::Session::SetHost(global.hostPath);
     HostCtl::Session::BeginBatch();
   } catch (const HostCtl::Lib::HostCtlException& e) {
-    std::fprintf(stderr, "%s\n", e.what());
+    std::fprintf(stderr, "ostracli: %s\n", e.what());
     return ExitCommandError;
   }
 
+  RunMode mode;
+  mode.inBatch = true;
   int worst = ExitOk;
+  long applied = 0, failed = 0, stoppedAt = 0;
+  std::string fatal; // Why the batch cannot be kept, or "".
   std::string line;
-  for (long number = 1; std::getline(*in, line); ++number) {
+  for (long number = 1; input.Next(line); ++number) {
     std::size_t start = line.find_first_not_of(" \t\r");
     if (start == std::string::npos || line[start] == '#')
       continue;
     std::vector<std::string> words;
     int status;
-    std::string out;
-    err.clear();
-    if (!SplitWords(line, words)) {
+    std::string out, err;
+    if (line.find('\0') != std::string::npos) {
+      err = "Error: the line holds a NUL byte\n";
+      status = ExitUsage;
+    } else if (!SplitWords(line, words)) {
       err = "Error: unterminated quote\n";
       status = ExitUsage;
     } else {
       if (!words.empty() && words[0] == "ostracli")
         words.erase(words.begin());
-      bool switchesHost = false;
-      for (const std::string& word : words) {
-        if (word.empty() || word[0] != '-')
-          break;
-        switchesHost |= word == "--host" || word.rfind("--host=", 0) == 0;
-      }
-      if (switchesHost) {
-        err = "Error: a line of a batch cannot name another host\n";
-        status = ExitUsage;
-      } else {
-        words.insert(words.begin(), defaults.begin(), defaults.end());
-        status = RunCommandLine(tree, words, out, err);
-      }
+      words.insert(words.begin(), defaults.begin(), defaults.end());
+      status = RunCommandLine(tree, words, out, err, mode);
     }
-    std::fwrite(out.data(), 1, out.size(), stdout);
-    std::fflush(stdout);
-    std::fwrite(err.data(), 1, err.size(), stderr);
+    const std::string where = "ostracli: " + name + ":" + std::to_string(number) + ": ";
+    if (!WriteAll(stdout, out)) {
+      fatal = "cannot write the output: " + std::string(std::strerror(errno));
+      stoppedAt = number;
+      break;
+    }
+    WriteAll(stderr, NameLine(err, where));
     worst = std::max(worst, status);
+    (status == ExitOk ? applied : failed) += 1;
+    if (HostCtl::Session::BatchLost()) {
+      fatal = "the batch's transaction was lost";
+      stoppedAt = number;
+      break;
+    }
     if (status != ExitOk && !keepGoing) {
-      std::fprintf(stderr, "Batch stopped at line %ld (exit status %d)\n", number, status);
+      stoppedAt = number;
       break;
     }
   }
-  try {
-    HostCtl::Session::EndBatch(true);
-  } catch (const HostCtl::Lib::HostCtlException& e) {
-    std::fprintf(stderr, "%s\nNo change of the batch was kept.\n", e.what());
-    return ExitCommandError;
+  if (fatal.empty() && input.Failed()) {
+    fatal = "cannot read the batch: " + std::string(std::strerror(errno));
+    worst = std::max(worst, static_cast<int>(ExitUsage));
   }
+  bool kept = fatal.empty() && !(atomic && failed > 0);
+  try {
+    HostCtl::Session::EndBatch(kept);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    if (fatal.empty())
+      fatal = e.what();
+    kept = false;
+  }
+  std::string summary = "ostracli: " + name + ": " + std::to_string(applied) +
+                        (applied == 1 ? " line" : " lines") + " applied, " +
+                        std::to_string(failed) + " failed";
+  if (stoppedAt > 0)
+    summary += "; stopped at line " + std::to_string(stoppedAt);
+  if (!fatal.empty())
+    summary += "; " + fatal;
+  if (!kept)
+    summary += "; no change of the batch was kept";
+  // A batch that applied every line is as quiet as each line was.
+  if (failed > 0 || !kept)
+    WriteAll(stderr, summary + "\n");
+  if (!fatal.empty())
+    worst = std::max(worst, static_cast<int>(ExitCommandError));
   return worst;
 }
 

@@ -19,6 +19,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <climits>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -28,6 +29,7 @@
 #include <sstream>
 #include <stdexcept>
 #include <streambuf>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #ifndef OSTRA_VERSION
@@ -78,14 +80,108 @@ std::string ExecutableDirectory() {
   return slash == std::string::npos ? "." : path.substr(0, slash);
 }
 
-/// Where the host state lives, for help texts.
-std::string HostStateText() {
-  if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
-    return std::string(env) + " (from OSTRACLI_HOST)";
-  return HostCtl::Session::DefaultHostPath() + " (created from the demo profile on first use)";
+/// The host state the run works on (SelectHost).
+struct HostChoice {
+  std::string path;       ///< --host value (a database file, linux or netns:NAME); "" before SelectHost.
+  bool isDefault = false; ///< The default host, created on first use.
+  std::string problem;    ///< Why the host cannot be used (no backend serves it), or "".
+};
+
+HostChoice& Chosen() {
+  static HostChoice choice;
+  return choice;
 }
 
+/// Where the host state lives, for help texts.
+std::string HostStateText() {
+  const HostChoice& host = Chosen();
+  if (host.path.empty())
+    return HostCtl::Session::DefaultHostPath() + " (created from the demo profile on first use)";
+  return host.path + (host.isDefault ? " (created from the demo profile on first use)" : "");
+}
+
+/// The refusal of a host state that is missing or unreadable, or "".
+std::string HostProblem() {
+  const HostChoice& host = Chosen();
+  if (!host.problem.empty())
+    return host.problem;
+  if (host.path.empty() || host.isDefault || !HostCtl::Session::IsSimulatedHost(host.path))
+    return "";
+  struct stat st {};
+  if (::stat(host.path.c_str(), &st) != 0 && errno == ENOENT)
+    return "ostracli: no host state at " + host.path + " (create one with: ostrahost init " +
+           host.path + ")\n";
+  if (S_ISDIR(st.st_mode))
+    return "ostracli: " + host.path + " is a directory, not a host state\n";
+  if (::access(host.path.c_str(), R_OK) != 0)
+    return "ostracli: cannot read the host state at " + host.path + ": " + std::strerror(errno) +
+           "\n";
+  return "";
+}
+
+/// Reads a lock timeout in milliseconds; -1 when \p text is not one.
+int ParseTimeout(const std::string& text) {
+  if (text.empty() || text.size() > 7 || text.find_first_not_of("0123456789") != std::string::npos)
+    return -1;
+  return std::stoi(text);
+}
+
+/// Values echoed in messages are cut to this many characters.
+constexpr std::size_t kEchoLimit = 64;
+
 } // namespace
+
+void SelectHost(const std::string& path, bool isDefault) {
+  Chosen() = {path, isDefault, ""};
+  try {
+    HostCtl::Session::SetHost(path, isDefault);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    // Reported before anything runs (HostProblem); the session refuses every
+    // operation on this host meanwhile.
+    Chosen().problem = std::string("ostracli: ") + e.what() + "\n";
+  }
+}
+
+bool ChangesHost(AutoCli::CommandSpec& command) {
+  // A command whose result is a boolean is an action; every other command
+  // reports what it reads. The walk of the whole tree in the registration
+  // test keeps this true.
+  std::shared_ptr<CallSpec::OutputSpec> spec = command.GetOutputSpec();
+  return spec && spec->GetRootObject() && spec->GetRootObject()->GetType() == MetaObj::Boolean;
+}
+
+std::string ShortenEchoes(std::string text, const std::vector<std::string>& words) {
+  std::vector<const std::string*> longWords;
+  for (const std::string& word : words)
+    if (word.size() > kEchoLimit)
+      longWords.push_back(&word);
+  // The longest first, so that a word that holds another is shortened whole.
+  std::sort(longWords.begin(), longWords.end(),
+            [](const std::string* a, const std::string* b) { return a->size() > b->size(); });
+  for (const std::string* word : longWords) {
+    std::size_t cut = 0;
+    for (std::size_t chars = 0; cut < word->size() && chars < kEchoLimit; ++chars) {
+      ++cut;
+      while (cut < word->size() && (static_cast<unsigned char>((*word)[cut]) & 0xC0) == 0x80)
+        ++cut;
+    }
+    std::string shortened =
+        word->substr(0, cut) + "\u2026 (" + std::to_string(word->size()) + " bytes)";
+    for (std::size_t pos = text.find(*word); pos != std::string::npos;
+         pos = text.find(*word, pos + shortened.size()))
+      text.replace(pos, word->size(), shortened);
+  }
+  return text;
+}
+
+bool WriteAll(std::FILE* stream, const std::string& text) {
+  errno = 0;
+  if (!text.empty() && std::fwrite(text.data(), 1, text.size(), stream) != text.size())
+    return false;
+  if (std::fflush(stream) != 0 || std::ferror(stream))
+    return false;
+  return true;
+}
 
 std::string DefaultPluginDirectory() {
   if (const char* env = std::getenv("OSTRACLI_PLUGIN_DIR"); env && *env)
@@ -155,6 +251,18 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
       options.version = true;
     } else if (name == "--keep-going") {
       options.keepGoing = true;
+    } else if (name == "--atomic") {
+      options.atomic = true;
+    } else if (name == "--lock-timeout") {
+      std::string text;
+      if (!value(name, text))
+        return -1;
+      options.lockTimeoutMs = ParseTimeout(text);
+      if (options.lockTimeoutMs < 0) {
+        err += "Error: option --lock-timeout takes milliseconds from 0 to 9999999, got \"" + text +
+               "\"\n";
+        return -1;
+      }
     } else if (name == "--reference") {
       options.reference = true;
     } else if (name == "--complete") {
@@ -196,15 +304,22 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
   return static_cast<int>(i);
 }
 
-int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
-                   std::string& err) {
+namespace {
+
+int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
+           std::string& err, const RunMode& mode) {
   GlobalOptions global;
   int first = ParseGlobalOptions(args, global, err);
   if (first < 0)
     return ExitUsage;
-  if (global.complete || global.reference || !global.batch.empty() || global.keepGoing) {
-    err += "Error: --batch, --keep-going, --complete and --reference are options of a whole "
-           "ostracli run, not of one command\n";
+  if (global.complete || global.reference || !global.batch.empty() || global.keepGoing ||
+      (mode.inBatch && global.lockTimeoutMs >= 0)) {
+    err += "Error: --batch, --keep-going, --lock-timeout, --complete and --reference are options "
+           "of a whole ostracli run, not of one command\n";
+    return ExitUsage;
+  }
+  if (mode.inBatch && !global.hostPath.empty()) {
+    err += "Error: a line of a batch cannot name another host\n";
     return ExitUsage;
   }
   if (!global.formatter.empty() && !Format::MakeFormatter(global.formatter)) {
@@ -222,18 +337,8 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     }
     return ExitOk;
   }
-  if (!global.hostPath.empty())
-    ::setenv("OSTRACLI_HOST", global.hostPath.c_str(), 1);
-  // A host that cannot be used (the Linux host without its module) is one
-  // clear error before anything runs.
-  if (const char* host = std::getenv("OSTRACLI_HOST"); host && *host) {
-    try {
-      HostCtl::Session::SetHost(host);
-    } catch (const HostCtl::Lib::HostCtlException& e) {
-      err += std::string("Error: ") + e.what() + "\n";
-      return ExitCommandError;
-    }
-  }
+  if (!global.hostPath.empty() && global.hostPath != Chosen().path)
+    SelectHost(global.hostPath, false);
 
   // Resolve the command path: words up to the first option.
   std::vector<std::string> words;
@@ -287,16 +392,45 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     return ExitUsage;
   }
 
+  // The command runs in one transaction, taken before its first step: a
+  // write one for a command that changes the host, so that it either waits
+  // for the lock or changes nothing at all.
+  if (!mode.inBatch) {
+    if (std::string problem = HostProblem(); !problem.empty()) {
+      err += problem;
+      return ExitCommandError;
+    }
+  }
+  try {
+    HostCtl::Session::BeginCommand(ChangesHost(*command));
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    err += (mode.inBatch ? "" : "ostracli: ") + std::string(e.what()) + "\n";
+    return ExitCommandError;
+  }
   auto output = CallSpec::Output::New();
   HostCtl::Session::ClearNotAvailable();
   try {
     command->Execute(input, output);
   } catch (const HostCtl::Lib::HostCtlException& e) {
     output->AddErrorMessage(e.what());
+  } catch (const std::bad_alloc&) {
+    output->AddErrorMessage("Not enough memory to run the command");
   } catch (const std::exception& e) {
     output->AddErrorMessage(std::string("Internal error: ") + e.what());
   } catch (...) {
     output->AddErrorMessage("Internal error: unknown exception");
+  }
+  // The steps a command completed before the host refused a later one stay,
+  // as each command's documented order promises; --atomic and a batch line
+  // keep nothing of a command that reported an error.
+  const bool keep = !(output->HasError() && (mode.atomic || mode.inBatch));
+  try {
+    HostCtl::Session::EndCommand(keep);
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    for (const std::string& message : output->GetErrorMessages())
+      err += message + "\n";
+    err += std::string(e.what()) + "\n";
+    return ExitCommandError;
   }
 
   if (const MetaObj::MetaObjectPtr& root = output->GetRootObject()) {
@@ -330,6 +464,16 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   return output->HasError() ? ExitCommandError : ExitOk;
 }
 
+} // namespace
+
+int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
+                   std::string& err, const RunMode& mode) {
+  std::string messages;
+  int status = RunOne(tree, args, out, messages, mode);
+  err += ShortenEchoes(std::move(messages), args);
+  return status;
+}
+
 int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
   std::vector<std::string> args(argv + 1, argv + argc);
   try {
@@ -353,29 +497,54 @@ int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
     std::fwrite(out.data(), 1, out.size(), stdout);
     return ExitOk;
   }
-  if (first >= 0 && !global.batch.empty()) {
-    // The global options in front of --batch apply to every line.
-    std::vector<std::string> defaults;
-    for (std::size_t i = 0; i < static_cast<std::size_t>(first); ++i) {
-      if (args[i] == "--batch" || args[i] == "--keep-going") {
-        i += args[i] == "--batch" ? 1 : 0;
-        continue;
-      }
-      if (args[i].rfind("--batch=", 0) == 0)
-        continue;
-      defaults.push_back(args[i]);
+  // The environment is read here, once; the host library is handed the
+  // settings.
+  const char* hostEnv = std::getenv("OSTRACLI_HOST");
+  if (first >= 0 && !global.hostPath.empty())
+    SelectHost(global.hostPath, false);
+  else if (hostEnv && *hostEnv)
+    SelectHost(hostEnv, false);
+  else
+    SelectHost(HostCtl::Session::DefaultHostPath(), true);
+  int timeout = global.lockTimeoutMs;
+  for (const char* name : {"OSTRACLI_LOCK_TIMEOUT_MS", "OSTRACLI_BUSY_TIMEOUT_MS"}) {
+    const char* env = std::getenv(name);
+    if (timeout >= 0 || !env || !*env)
+      continue;
+    timeout = ParseTimeout(env);
+    if (timeout < 0) {
+      std::fprintf(stderr, "Error: %s takes milliseconds from 0 to 9999999, got \"%s\"\n", name,
+                   env);
+      return ExitUsage;
     }
+  }
+  if (timeout >= 0)
+    HostCtl::Session::SetLockTimeout(timeout);
+
+  if (first >= 0 && !global.batch.empty()) {
+    // The formatter options in front of --batch apply to every line.
+    std::vector<std::string> defaults;
+    if (!global.formatter.empty())
+      defaults.insert(defaults.end(), {"--formatter", global.formatter});
+    for (const auto& [key, value] : global.params)
+      defaults.insert(defaults.end(), {"--format-param", key + "=" + value});
     if (static_cast<std::size_t>(first) < args.size()) {
       std::fprintf(stderr, "Error: --batch takes its commands from the file, not from the "
                            "command line\n");
       return ExitUsage;
     }
-    return RunBatch(*tree, global.batch, defaults, global.keepGoing);
+    return RunBatch(*tree, global.batch, defaults, global.keepGoing, global.atomic);
   }
-  int status = RunCommandLine(*tree, args, out, err);
-  std::fwrite(out.data(), 1, out.size(), stdout);
-  std::fflush(stdout);
-  std::fwrite(err.data(), 1, err.size(), stderr);
+  RunMode mode;
+  mode.atomic = first >= 0 && global.atomic;
+  int status = RunCommandLine(*tree, args, out, err, mode);
+  if (!WriteAll(stdout, out)) {
+    // The command's changes, if any, are committed: only its report is lost.
+    std::fprintf(stderr, "ostracli: cannot write the output: %s\n", std::strerror(errno));
+    WriteAll(stderr, err);
+    return std::max(status, static_cast<int>(ExitCommandError));
+  }
+  WriteAll(stderr, err);
   return status;
 }
 

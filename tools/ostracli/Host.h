@@ -10,6 +10,7 @@
 
 #include "Fabrik/AutoCli.h"
 
+#include <cstdio>
 #include <iosfwd>
 #include <memory>
 #include <string>
@@ -53,6 +54,8 @@ struct GlobalOptions {
   std::string hostPath;                                    ///< --host, or "".
   std::string batch;                                       ///< --batch FILE, or "".
   bool keepGoing = false;                                  ///< --keep-going.
+  bool atomic = false;                                     ///< --atomic.
+  int lockTimeoutMs = -1;                                  ///< --lock-timeout MS, or -1.
   bool help = false;                                       ///< --help or -h.
   bool version = false;                                    ///< --version.
   bool complete = false;                                   ///< --complete WORD...
@@ -65,10 +68,30 @@ struct GlobalOptions {
 int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& options,
                        std::string& err);
 
+/// How a command line runs.
+struct RunMode {
+  bool inBatch = false; ///< A line of a batch: a savepoint of the batch's transaction.
+  bool atomic = false;  ///< --atomic: a command that reports an error changes nothing.
+};
+
 /// Runs one command per line of \p file ("-" for standard input) with the
-/// global options \p defaults in front of each; see docs/cli.md.
+/// global options \p defaults in front of each; see docs/cli.md. With
+/// \p atomic the batch keeps its changes only when every line succeeds.
 int RunBatch(const CommandTree& tree, const std::string& file,
-             const std::vector<std::string>& defaults, bool keepGoing);
+             const std::vector<std::string>& defaults, bool keepGoing, bool atomic);
+
+/// The host state the run works on: \p path, created from the demo profile
+/// on first use when \p isDefault. Commands check that it exists before they
+/// run.
+void SelectHost(const std::string& path, bool isDefault);
+
+/// Whether \p command changes the host, and so runs in a write transaction
+/// (every other command runs in one read transaction).
+bool ChangesHost(Fabrik::AutoCli::CommandSpec& command);
+
+/// \p text with every word of \p words longer than 64 bytes shortened, where
+/// it is echoed, to its first 64 characters, "…" and its length.
+std::string ShortenEchoes(std::string text, const std::vector<std::string>& words);
 
 /// Splits a command line into words as a POSIX shell would for plain words,
 /// single and double quotes and backslashes; false for an unterminated quote.
@@ -88,7 +111,11 @@ std::string DefaultPluginDirectory();
 /// Runs one command line (without the program name) on \p tree; writes the
 /// result to \p out and messages to \p err; returns the exit status.
 int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args, std::string& out,
-                   std::string& err);
+                   std::string& err, const RunMode& mode = {});
+
+/// Writes \p text to \p stream and flushes it; false, with errno set, when
+/// the output could not be written.
+bool WriteAll(std::FILE* stream, const std::string& text);
 
 /// The whole program: loads the tree into \p tree, runs argv, prints, returns
 /// the status. The caller owns the tree, so it decides whether tearing it down

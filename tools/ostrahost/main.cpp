@@ -1,7 +1,8 @@
 //===- main.cpp - ostrahost: create, import and export host states --------===//
 //
 //   ostrahost init PATH [--profile NAME]
-//   ostrahost import FILE [--host PATH]      (FILE "-" reads standard input)
+//   ostrahost import FILE [--host PATH] [--max-size SIZE]
+//                                            (FILE "-" reads standard input)
 //   ostrahost export [--host PATH]
 //   ostrahost profile NAME
 //   ostrahost generate PATH [--routes N] [--portgroups N] [--vms N]
@@ -11,18 +12,20 @@
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
+#include "HostCtl/Session.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
 #include "model/Store.h"
 
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
-#include <fstream>
-#include <iostream>
-#include <iterator>
-#include <sstream>
+#include <cstring>
+#include <fcntl.h>
+#include <new>
 #include <string>
 #include <sys/stat.h>
+#include <unistd.h>
 #include <utility>
 #include <vector>
 
@@ -32,8 +35,10 @@ const char* const kUsage =
     "Usage:\n"
     "  ostrahost init PATH [--profile demo|empty]   create a host state file\n"
     "  ostrahost import FILE [--host PATH]          replace a host by a JSON host description\n"
-    "                                               (FILE - reads standard input; PATH is\n"
-    "                                               created when it does not exist)\n"
+    "                  [--max-size SIZE]            (FILE - reads standard input; PATH is\n"
+    "                                               created when it does not exist; FILE may\n"
+    "                                               hold at most SIZE bytes, suffix K, M or G,\n"
+    "                                               default 256M)\n"
     "  ostrahost export [--host PATH]               print the host as a JSON host description\n"
     "  ostrahost profile NAME                       print a built-in profile (demo, empty)\n"
     "  ostrahost generate PATH [SIZES]              create a large host: the demo host grown to\n"
@@ -53,6 +58,13 @@ int Fail(const std::string& message) {
   return 1;
 }
 
+/// Writes \p text to standard output; a failed write or flush is an error.
+int Write(const std::string& text) {
+  if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size() || std::fflush(stdout) != 0)
+    return Fail(std::string("cannot write the output: ") + std::strerror(errno));
+  return 0;
+}
+
 int Usage(const std::string& message) {
   std::fprintf(stderr, "ostrahost: %s\n%s", message.c_str(), kUsage);
   return 2;
@@ -68,23 +80,106 @@ std::string HostPath(const std::string& given) {
     return given;
   if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
     return env;
-  return Model::Store::DefaultPath();
+  return HostCtl::Session::DefaultHostPath();
 }
 
-/// Creates \p path and fills it with \p fill; a failure leaves no file
-/// behind. The host ends up in the database file itself, not only in its
-/// write-ahead log, so that copying the file alone copies the host.
+/// The largest host description import reads unless --max-size says
+/// otherwise: far above the description of the largest generated host's
+/// demo part, and small enough that parsing it fits in memory.
+constexpr int64_t kDefaultMaxImport = int64_t{256} << 20;
+
+/// Reads a size in bytes with an optional K, M or G suffix; -1 when \p text
+/// is not one.
+int64_t ParseSize(const std::string& text) {
+  std::size_t digits = text.find_first_not_of("0123456789");
+  if (digits == 0 || text.empty() || (digits != std::string::npos && digits + 1 != text.size()) ||
+      text.size() > 12)
+    return -1;
+  int64_t value = std::stoll(text.substr(0, digits));
+  if (digits == std::string::npos)
+    return value;
+  switch (text[digits]) {
+  case 'K':
+  case 'k':
+    return value << 10;
+  case 'M':
+    return value << 20;
+  case 'G':
+    return value << 30;
+  default:
+    return -1;
+  }
+}
+
+/// Reads \p file ("-": standard input) into \p text, at most \p limit bytes;
+/// "" on success, else the reason.
+std::string ReadLimited(const std::string& file, int64_t limit, std::string& text) {
+  int fd = file == "-" ? 0 : ::open(file.c_str(), O_RDONLY | O_CLOEXEC);
+  if (fd < 0)
+    return "cannot read " + file + ": " + std::strerror(errno);
+  std::string problem;
+  char buffer[1 << 16];
+  for (;;) {
+    ssize_t got = ::read(fd, buffer, sizeof buffer);
+    if (got < 0 && errno == EINTR)
+      continue;
+    if (got < 0) {
+      problem = "cannot read " + file + ": " + std::strerror(errno);
+      break;
+    }
+    if (got == 0)
+      break;
+    if (static_cast<int64_t>(text.size()) + got > limit) {
+      problem = (file == "-" ? std::string("the standard input") : file) +
+                " holds more than the import limit of " + std::to_string(limit) +
+                " bytes (raise it with --max-size)";
+      break;
+    }
+    text.append(buffer, static_cast<std::size_t>(got));
+  }
+  if (fd != 0)
+    ::close(fd);
+  return problem;
+}
+
+/// Makes \p path's directory entry durable.
+void SyncDirectory(const std::string& path) {
+  std::size_t slash = path.find_last_of('/');
+  std::string dir = slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
+  int fd = ::open(dir.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+  if (fd >= 0) {
+    ::fsync(fd);
+    ::close(fd);
+  }
+}
+
+/// Creates \p path and fills it with \p fill. The host is built beside its
+/// final name and linked into place whole, so that no process ever sees a
+/// half-made host, whatever kills this one; of two processes that create
+/// one path at once, exactly one succeeds and the other finds the host made.
 template <typename Fill> void CreateHost(const std::string& path, Fill&& fill) {
-  std::unique_ptr<Model::Store> store = Model::Store::Create(path);
+  const std::string temp = path + ".new." + std::to_string(::getpid());
+  auto discard = [&temp] {
+    for (const char* suffix : {"", "-journal", "-wal", "-shm"})
+      ::unlink((temp + suffix).c_str());
+  };
+  discard();
   try {
+    std::unique_ptr<Model::Store> store = Model::Store::Create(temp);
     fill(*store);
-    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
   } catch (...) {
-    store.reset();
-    for (const char* suffix : {"", "-wal", "-shm"})
-      std::remove((path + suffix).c_str());
+    discard();
     throw;
   }
+  if (::link(temp.c_str(), path.c_str()) != 0) {
+    int error = errno;
+    discard();
+    if (error == EEXIST)
+      throw HostCtl::Lib::HostCtlException("the file " + path + " exists already");
+    throw HostCtl::Lib::HostCtlException("cannot create " + path + ": " + std::strerror(error));
+  }
+  discard();
+  SyncDirectory(path);
 }
 
 /// Creates \p path from \p host, or replaces the host it holds.
@@ -92,7 +187,6 @@ void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
   if (Exists(path)) {
     Model::Store store(path);
     Model::ImportHost(store, host);
-    store.Exec("PRAGMA wal_checkpoint(TRUNCATE)");
     return;
   }
   CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
@@ -133,6 +227,8 @@ int main(int argc, char** argv) {
       {"--hosts-entries", &sizes.hostsEntries},
   };
   bool sized = false;
+  int64_t maxImport = kDefaultMaxImport;
+  bool limited = false;
   for (std::size_t i = 1; i < args.size(); ++i) {
     const std::string& arg = args[i];
     int64_t* size = nullptr;
@@ -149,6 +245,14 @@ int main(int argc, char** argv) {
       if (i + 1 >= args.size())
         return Usage("option " + arg + " requires a value");
       (arg == "--host" ? host : profile) = args[++i];
+    } else if (arg == "--max-size") {
+      if (i + 1 >= args.size())
+        return Usage("option " + arg + " requires a value");
+      maxImport = ParseSize(args[++i]);
+      if (maxImport < 0)
+        return Usage("option --max-size takes a size in bytes with an optional K, M or G, not \"" +
+                     args[i] + "\"");
+      limited = true;
     } else if (arg.size() > 1 && arg[0] == '-' && arg != "-") {
       return Usage("unknown option " + arg);
     } else {
@@ -157,6 +261,8 @@ int main(int argc, char** argv) {
   }
   if (sized && command != "generate")
     return Usage("only generate takes sizes");
+  if (limited && command != "import")
+    return Usage("only import takes --max-size");
   try {
     if (command == "init") {
       if (positional.size() != 1)
@@ -178,20 +284,10 @@ int main(int argc, char** argv) {
       if (positional.size() != 1)
         return Usage("import takes one FILE");
       std::string text;
-      if (positional[0] == "-") {
-        text.assign(std::istreambuf_iterator<char>(std::cin), std::istreambuf_iterator<char>());
-      } else {
-        std::ifstream file(positional[0], std::ios::binary);
-        if (!file)
-          return Fail("cannot read " + positional[0]);
-        text.assign(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
-      }
-      nlohmann::ordered_json doc;
-      try {
-        doc = nlohmann::ordered_json::parse(text);
-      } catch (const nlohmann::json::exception& e) {
-        return Fail("invalid host description: not JSON (" + std::string(e.what()) + ")");
-      }
+      if (std::string problem = ReadLimited(positional[0], maxImport, text); !problem.empty())
+        return Fail(problem);
+      nlohmann::ordered_json doc = Model::ParseDescription(text);
+      text = std::string();
       WriteHost(HostPath(host), doc);
       return 0;
     }
@@ -200,22 +296,22 @@ int main(int argc, char** argv) {
         return Usage("export takes no arguments");
       Model::Store store(HostPath(host));
       std::string text = Model::ExportHost(store).dump(2) + "\n";
-      std::fwrite(text.data(), 1, text.size(), stdout);
-      return 0;
+      return Write(text);
     }
     if (command == "profile") {
       if (positional.size() != 1)
         return Usage("profile takes one NAME");
-      std::string text = Model::Profile(positional[0]).dump(2) + "\n";
-      std::fwrite(text.data(), 1, text.size(), stdout);
-      return 0;
+      return Write(Model::Profile(positional[0]).dump(2) + "\n");
     }
     return Usage("unknown command " + command);
   } catch (const Model::ImportError& e) {
     return Fail(std::string("invalid host description: ") + e.what());
   } catch (const HostCtl::Lib::HostCtlException& e) {
     return Fail(e.what());
-  } catch (const std::exception& e) {
-    return Fail(e.what());
+  } catch (const std::bad_alloc&) {
+    return Fail("not enough memory");
+  } catch (const std::exception&) {
+    // A library's own words would tell the user nothing.
+    return Fail("internal error while running " + command);
   }
 }

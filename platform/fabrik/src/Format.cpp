@@ -350,6 +350,56 @@ std::string ValidUtf8(const std::string& text) {
   return valid;
 }
 
+std::string EscapeControls(const std::string& text, Escapes which) {
+  static const char* const kHex = "0123456789abcdef";
+  std::string escaped;
+  escaped.reserve(text.size());
+  std::size_t pos = 0;
+  while (pos < text.size()) {
+    const auto c = static_cast<unsigned char>(text[pos]);
+    const std::size_t length = std::max<std::size_t>(Utf8SequenceLength(text, pos), 1);
+    unsigned code = c; // The code point of a well-formed sequence of up to 3 bytes.
+    if (length == 2)
+      code = ((c & 0x1Fu) << 6) | (static_cast<unsigned char>(text[pos + 1]) & 0x3Fu);
+    else if (length == 3)
+      code = ((c & 0x0Fu) << 12) | ((static_cast<unsigned char>(text[pos + 1]) & 0x3Fu) << 6) |
+             (static_cast<unsigned char>(text[pos + 2]) & 0x3Fu);
+    bool escape;
+    if (which == Escapes::Controls)
+      escape = code < 0x20 || code == 0x7F || (length == 2 && code >= 0x80 && code <= 0x9F);
+    else
+      escape = (length == 1 && (c == '\\' || c == '\n' || c == '\r' || c == '\v' || c == '\f' ||
+                                (c >= 0x1C && c <= 0x1E))) ||
+               (length == 2 && code == 0x85) || (length == 3 && (code == 0x2028 || code == 0x2029));
+    if (!escape) {
+      escaped.append(text, pos, length);
+    } else if (code == '\n') {
+      escaped += "\\n";
+    } else if (code == '\r') {
+      escaped += "\\r";
+    } else if (code == '\t') {
+      escaped += "\\t";
+    } else if (code == '\v') {
+      escaped += "\\v";
+    } else if (code == '\f') {
+      escaped += "\\f";
+    } else if (code == '\\') {
+      escaped += "\\\\";
+    } else if (length == 1) {
+      escaped += {'\\', 'x', kHex[code >> 4], kHex[code & 15]};
+    } else {
+      escaped += {'\\',
+                  'u',
+                  kHex[(code >> 12) & 15],
+                  kHex[(code >> 8) & 15],
+                  kHex[(code >> 4) & 15],
+                  kHex[code & 15]};
+    }
+    pos += length;
+  }
+  return escaped;
+}
+
 const char* TypeName(MetaObj::MetaType type) {
   switch (type) {
   case MetaObj::Boolean:

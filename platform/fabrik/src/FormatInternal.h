@@ -84,6 +84,22 @@ std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos);
 /// replaced by U+FFFD.
 std::string ValidUtf8(const std::string& text);
 
+/// Which characters EscapeControls writes as escapes.
+enum class Escapes {
+  /// Every C0 control character, DEL and every C1 control character
+  /// (U+0080 to U+009F): text that can neither add a line nor reach a
+  /// terminal as an escape sequence ("simple", "table").
+  Controls,
+  /// Every character a line-splitting reader may take as a line end: line
+  /// feed, carriage return, VT, FF, FS, GS, RS, NEL, U+2028 and U+2029, and
+  /// the backslash itself, so that the text can be read back ("keyvalue").
+  LineEnds,
+};
+
+/// \p text with the characters \p which selects written as "\n", "\r",
+/// "\t", "\v", "\f", "\xHH" (other single bytes) or "\uHHHH".
+std::string EscapeControls(const std::string& text, Escapes which = Escapes::Controls);
+
 /// The name of a type in the machine formats: "boolean", "integer",
 /// "string", "structure" or "list".
 const char* TypeName(MetaObj::MetaType type);

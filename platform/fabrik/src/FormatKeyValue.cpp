@@ -17,23 +17,26 @@ using MetaObj::MetaStruct;
 
 namespace {
 
-/// \p text as valid UTF-8 with the backslash and line breaks escaped, and
-/// with a backslash before each character of \p special.
+/// \p text as valid UTF-8 with the backslash and every character a
+/// line-splitting reader could take as a line end escaped, and with a
+/// backslash before each character of \p special.
 std::string Escape(const std::string& text, const char* special) {
-  std::string escaped;
-  escaped.reserve(text.size());
-  for (char c : ValidUtf8(text)) {
-    if (c == '\n') {
-      escaped += "\\n";
-    } else if (c == '\r') {
-      escaped += "\\r";
-    } else {
-      if (c == '\\' || (c != '\0' && std::strchr(special, c)))
-        escaped += '\\';
-      escaped += c;
+  std::string escaped = EscapeControls(ValidUtf8(text), Escapes::LineEnds);
+  if (!*special)
+    return escaped;
+  std::string marked;
+  marked.reserve(escaped.size());
+  for (std::size_t i = 0; i < escaped.size(); ++i) {
+    if (escaped[i] == '\\') { // An escape made above: keep it whole.
+      marked.append(escaped, i, 2);
+      ++i;
+      continue;
     }
+    if (escaped[i] != '\0' && std::strchr(special, escaped[i]))
+      marked += '\\';
+    marked += escaped[i];
   }
-  return escaped;
+  return marked;
 }
 
 /// A structure or field name as one segment of a path.

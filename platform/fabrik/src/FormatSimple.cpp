@@ -119,8 +119,10 @@ public:
 void WriteSimple(std::ostream& out, const MetaObjectPtr& root, const Parameters& params) {
   SimpleWriter writer(params);
   writer.Root(root);
+  // The layout itself holds no control characters: any a line holds come
+  // from stored text, which must neither forge lines nor reach the terminal.
   for (const std::string& line : writer.Lines())
-    out << line << '\n';
+    out << EscapeControls(line) << '\n';
 }
 
 std::unique_ptr<Formatter> MakeSimpleFormatter() {

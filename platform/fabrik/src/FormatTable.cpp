@@ -39,16 +39,6 @@ std::size_t TerminalWidth() {
   return static_cast<std::size_t>(value);
 }
 
-/// A cell on one line: line breaks, tabs and other control characters
-/// would break the alignment and become blanks.
-std::string OneLine(std::string text) {
-  for (char& c : text) {
-    if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F)
-      c = ' ';
-  }
-  return text;
-}
-
 /// Splits \p text at blanks into lines of at most \p width characters; a word
 /// longer than \p width gets a line of its own. Empty text gives one empty
 /// line.
@@ -133,8 +123,8 @@ void TableFormatter::Write(std::ostream& out, const MetaObjectPtr& root,
     std::vector<std::string>& line = cells.emplace_back();
     for (const std::string& column : columns) {
       const MetaObjectPtr* value = row->GetField(column);
-      line.push_back(value ? OneLine(WithUnit(CompactText(*value, params), *row, column, params))
-                           : "");
+      line.push_back(
+          value ? EscapeControls(WithUnit(CompactText(*value, params), *row, column, params)) : "");
     }
   }
 

@@ -80,6 +80,54 @@ std::string Escape(const std::string& text) {
   return escaped;
 }
 
+/// True when \p text holds something XML 1.0 cannot carry: a control
+/// character other than tab, line feed and carriage return, U+FFFE, U+FFFF or
+/// a byte that is not well-formed UTF-8.
+bool NeedsBackslashes(const std::string& text) {
+  for (std::size_t pos = 0; pos < text.size();) {
+    const std::size_t length = Utf8SequenceLength(text, pos);
+    if (length == 0)
+      return true;
+    const auto c = static_cast<unsigned char>(text[pos]);
+    if (length == 1 && c < 0x20 && c != '\t' && c != '\n' && c != '\r')
+      return true;
+    if (text.compare(pos, length, "\xEF\xBF\xBE") == 0 ||
+        text.compare(pos, length, "\xEF\xBF\xBF") == 0)
+      return true;
+    pos += length;
+  }
+  return false;
+}
+
+/// \p text with the backslash written "\\" and each byte XML cannot carry
+/// written "\xHH", so that a reader gets every byte back.
+std::string Backslashed(const std::string& text) {
+  static const char* const kHex = "0123456789abcdef";
+  std::string escaped;
+  for (std::size_t pos = 0; pos < text.size();) {
+    std::size_t length = Utf8SequenceLength(text, pos);
+    const auto c = static_cast<unsigned char>(text[pos]);
+    const bool bad = length == 0 ||
+                     (length == 1 && c < 0x20 && c != '\t' && c != '\n' && c != '\r') ||
+                     text.compare(pos, length, "\xEF\xBF\xBE") == 0 ||
+                     text.compare(pos, length, "\xEF\xBF\xBF") == 0;
+    if (length == 0)
+      length = 1;
+    if (c == '\\') {
+      escaped += "\\\\";
+    } else if (bad) {
+      for (std::size_t i = 0; i < length; ++i) {
+        const auto byte = static_cast<unsigned char>(text[pos + i]);
+        escaped += {'\\', 'x', kHex[byte >> 4], kHex[byte & 15]};
+      }
+    } else {
+      escaped.append(text, pos, length);
+    }
+    pos += length;
+  }
+  return escaped;
+}
+
 /// True for a boolean, integer or string, which is written on one line.
 bool IsScalar(const MetaObjectPtr& value) {
   const MetaObj::MetaType type = value->GetType();
@@ -113,9 +161,16 @@ public:
 
 private:
   /// Writes <boolean>, <integer> or <string> with its text, on the current line.
+  /// A string XML cannot carry as it stands is written with backslash
+  /// escapes and marked escaped="backslash".
   void Scalar(const MetaObj::MetaObject& value) {
     const char* name = TypeName(value.GetType());
-    out_ << '<' << name << '>' << Escape(ScalarText(value)) << "</" << name << '>';
+    std::string text = ScalarText(value);
+    if (NeedsBackslashes(text))
+      out_ << '<' << name << " escaped=\"backslash\">" << Escape(Backslashed(text));
+    else
+      out_ << '<' << name << '>' << Escape(text);
+    out_ << "</" << name << '>';
   }
 
   void List(const MetaList& list, std::size_t indent, bool atRoot) {

@@ -751,12 +751,18 @@ int Backend::Exec(const std::string&, bool, bool, bool) {
 bool Backend::HasTransactions() const {
   return false;
 }
+void Backend::SetLockTimeout(int milliseconds) {}
+void Backend::BeginCommand(bool changes) {}
+void Backend::EndCommand(bool keep) {}
 void Backend::BeginBatch() {}
 void Backend::EndBatch(bool commit) {
   if (!commit)
     throw HostCtl::Lib::HostCtlException(
         "Cannot undo the batch: " + Describe() +
         " has no transactions, so the changes of the lines that ran are kept");
+}
+bool Backend::BatchLost() const {
+  return false;
 }
 
 } // namespace HostCtl::Backend

@@ -429,12 +429,20 @@ public:
   /// Runs a host command line; see TvkCtl::Util::TvkCtl_Exec.
   virtual int Exec(const std::string& command, bool background, bool wait, bool captureOutput);
 
-  // --- Batches. A backend with transactions runs a batch in one; the
-  // default has none: BeginBatch does nothing, every line's changes are kept
-  // as it runs, and EndBatch(false) is refused.
+  // --- Transactions (HostCtl/Session.h). A backend with transactions runs a
+  // command, and a batch, in one; the default has none: every change is kept
+  // as it is made, BeginCommand and BeginBatch do nothing, EndCommand cannot
+  // undo a command's changes, and EndBatch(false) is refused.
   virtual bool HasTransactions() const;
+  /// How long a change waits for another process's lock (no effect without
+  /// transactions).
+  virtual void SetLockTimeout(int milliseconds);
+  virtual void BeginCommand(bool changes);
+  virtual void EndCommand(bool keep);
   virtual void BeginBatch();
   virtual void EndBatch(bool commit);
+  /// Whether the batch's transaction was lost (never without transactions).
+  virtual bool BatchLost() const;
 };
 
 /// Makes the backend for a --host value that the factory was registered for.
@@ -447,15 +455,18 @@ using Factory = std::unique_ptr<Backend> (*)(const std::string& spec);
 void RegisterFactory(const std::string& scheme, Factory factory);
 
 /// The session's backend, made from the host chosen with
-/// HostCtl::Session::SetHost (else $OSTRACLI_HOST, else the default path) on
-/// first use. Throws HostCtlException when that host cannot be used.
+/// HostCtl::Session::SetHost (else the simulated host whose store was pointed
+/// at its database, as unit tests do) on first use. Throws HostCtlException
+/// when that host cannot be used.
 Backend& Current();
 
 /// Drops the session's backend and its choice of host: the next use makes
 /// the backend again as if nothing had been chosen (tests).
 void ResetCurrent();
 
-/// Makes the simulated host's backend for database \p path (sim/).
-std::unique_ptr<Backend> MakeSimulatedHost(const std::string& path);
+/// Makes the simulated host's backend for database \p path (sim/): with
+/// \p createDemo a missing database is created from the demo profile on first
+/// use. An empty \p path keeps the store's current choice.
+std::unique_ptr<Backend> MakeSimulatedHost(const std::string& path, bool createDemo);
 
 } // namespace HostCtl::Backend

@@ -98,6 +98,8 @@ CREATE TABLE portgroup(
   ord INTEGER NOT NULL
 );
 CREATE INDEX portgroup_by_portset ON portgroup(portset_id);
+-- A new port group goes after the last one: found by index, in O(log n).
+CREATE INDEX portgroup_by_ord ON portgroup(ord);
 
 -- Ports of distributed switches, by their port key (a string).
 CREATE TABLE dvport(
@@ -240,6 +242,12 @@ void ExportCore(ordered_json& host, Store& store) {
     host["faults"] = std::move(faults);
 }
 
+/// Layout 1 found the last port group by reading them all.
+void UpgradeCore(Store& store, int64_t from) {
+  if (from < 2)
+    store.Exec("CREATE INDEX IF NOT EXISTS portgroup_by_ord ON portgroup(ord)");
+}
+
 } // namespace
 
 extern const Part kCorePart;
@@ -253,6 +261,7 @@ const Part kCorePart = {
      {"faults", {"operation", "object", "message"}}},
     ImportCore,
     ExportCore,
+    UpgradeCore,
 };
 
 int64_t AllocatePortId(Store& store) {

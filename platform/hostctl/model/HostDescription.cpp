@@ -157,25 +157,24 @@ void CreateDemoHost(const std::string& path) {
   try {
     std::unique_ptr<Store> store = Store::Create(temp);
     ImportHost(*store, Profile("demo"));
-    store->Exec("PRAGMA wal_checkpoint(TRUNCATE)");
   } catch (const ImportError& error) {
-    for (const char* suffix : {"", "-wal", "-shm"})
+    for (const char* suffix : {"", "-journal"})
       ::unlink((temp + suffix).c_str());
     throw HostCtl::Lib::HostCtlException(std::string("The demo host cannot be built: ") +
                                          error.what());
   } catch (...) {
-    for (const char* suffix : {"", "-wal", "-shm"})
+    for (const char* suffix : {"", "-journal"})
       ::unlink((temp + suffix).c_str());
     throw;
   }
   if (::link(temp.c_str(), path.c_str()) != 0 && errno != EEXIST) {
     int error = errno;
-    for (const char* suffix : {"", "-wal", "-shm"})
+    for (const char* suffix : {"", "-journal"})
       ::unlink((temp + suffix).c_str());
     throw HostCtl::Lib::HostCtlException("Cannot create the host state at " + path + ": " +
                                          std::strerror(error));
   }
-  for (const char* suffix : {"", "-wal", "-shm"})
+  for (const char* suffix : {"", "-journal"})
     ::unlink((temp + suffix).c_str());
 }
 

@@ -321,6 +321,39 @@ void SaveDns(Store& store, const std::string& netstack, const std::vector<std::s
         .Run();
 }
 
+bool HasDnsEntry(Store& store, const std::string& netstack, bool domain, const std::string& value) {
+  RequireNetstack(store, netstack);
+  Statement find =
+      domain ? store.Prepare("SELECT 1 FROM ipsvc_dns_search WHERE netstack = ? AND "
+                             "domain = ? COLLATE NOCASE")
+             : store.Prepare("SELECT 1 FROM ipsvc_dns_server WHERE netstack = ? AND address = ?");
+  return find.BindAll(netstack, value).Step();
+}
+
+void AppendDnsEntry(Store& store, const std::string& netstack, bool domain,
+                    const std::string& value) {
+  Statement insert =
+      domain
+          ? store.Prepare("INSERT INTO ipsvc_dns_search(netstack, domain, ord) SELECT ?1, ?2, "
+                          "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_search WHERE netstack = ?1")
+          : store.Prepare("INSERT INTO ipsvc_dns_server(netstack, address, ord) SELECT ?1, ?2, "
+                          "coalesce(max(ord), -1) + 1 FROM ipsvc_dns_server WHERE netstack = ?1");
+  insert.BindAll(netstack, value).Run();
+}
+
+void RemoveDnsEntry(Store& store, const std::string& netstack, bool domain,
+                    const std::string& value) {
+  Statement remove =
+      domain ? store.Prepare("DELETE FROM ipsvc_dns_search WHERE netstack = ? AND "
+                             "domain = ? COLLATE NOCASE")
+             : store.Prepare("DELETE FROM ipsvc_dns_server WHERE netstack = ? AND address = ?");
+  remove.BindAll(netstack, value).Run();
+}
+
+void ClearDnsServers(Store& store, const std::string& netstack) {
+  store.Prepare("DELETE FROM ipsvc_dns_server WHERE netstack = ?").Bind(1, netstack).Run();
+}
+
 void CheckSearchDomain(const std::string& domain) {
   if (!TvkCtl::Network::HostsFile::IsValidHostName(domain))
     throw HostCtlException("Invalid search domain '" + domain +

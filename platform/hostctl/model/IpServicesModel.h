@@ -60,6 +60,18 @@ void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>
 void SaveDns(Store& store, const std::string& netstack, const std::vector<std::string>& servers,
              const std::vector<std::string>& domains);
 /// Refuses a malformed search domain.
+/// Whether the resolver of \p netstack lists \p value: a server address, or
+/// with \p domain a search domain in any case. Refuses a missing netstack.
+bool HasDnsEntry(Store& store, const std::string& netstack, bool domain, const std::string& value);
+/// Appends a server (or, with \p domain, a search domain) to the resolver of
+/// \p netstack; an index keeps this O(log n).
+void AppendDnsEntry(Store& store, const std::string& netstack, bool domain,
+                    const std::string& value);
+/// Removes a server (or, with \p domain, a search domain in any case).
+void RemoveDnsEntry(Store& store, const std::string& netstack, bool domain,
+                    const std::string& value);
+/// Removes every server of \p netstack.
+void ClearDnsServers(Store& store, const std::string& netstack);
 void CheckSearchDomain(const std::string& domain);
 
 /// Stores a hosts entry after checking it (see HostsFile::AddEntryFromUser).

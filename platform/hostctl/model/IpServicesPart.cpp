@@ -48,6 +48,29 @@ using TvkCtl::Network::RoutingInfoImpl;
 
 namespace {
 
+// The resolver tables, shared by the schema and the upgrade from layout 1.
+// The key columns come first: SQLite 3.40's integrity check misreads a
+// NOT NULL column placed between the key columns of a WITHOUT ROWID table.
+// The order index makes an addition at the end cost O(log n); the domain
+// index finds a domain in any case.
+#define DNS_TABLES                                                                                 \
+  "CREATE TABLE ipsvc_dns_server(\n"                                                               \
+  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
+  "  address TEXT NOT NULL,\n"                                                                     \
+  "  ord INTEGER NOT NULL,\n"                                                                      \
+  "  PRIMARY KEY(netstack, address)\n"                                                             \
+  ") WITHOUT ROWID;\n"                                                                             \
+  "CREATE UNIQUE INDEX ipsvc_dns_server_by_ord ON ipsvc_dns_server(netstack, ord);\n"              \
+  "CREATE TABLE ipsvc_dns_search(\n"                                                               \
+  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
+  "  domain TEXT NOT NULL,\n"                                                                      \
+  "  ord INTEGER NOT NULL,\n"                                                                      \
+  "  PRIMARY KEY(netstack, domain)\n"                                                              \
+  ") WITHOUT ROWID;\n"                                                                             \
+  "CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);\n"              \
+  "CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE "          \
+  "NOCASE);\n"
+
 const char* const kIpServicesSchema = R"sql(
 -- Static and default routes of a netstack, one row each; the routes of the
 -- interfaces' own subnets are not stored (they follow the interfaces).
@@ -76,18 +99,7 @@ CREATE TABLE ipsvc_gateway(
 ) WITHOUT ROWID;
 
 -- Resolver configuration of a netstack, in order.
-CREATE TABLE ipsvc_dns_server(
-  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
-  ord INTEGER NOT NULL,
-  address TEXT NOT NULL,
-  PRIMARY KEY(netstack, address)
-) WITHOUT ROWID;
-CREATE TABLE ipsvc_dns_search(
-  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
-  ord INTEGER NOT NULL,
-  domain TEXT NOT NULL,
-  PRIMARY KEY(netstack, domain)
-) WITHOUT ROWID;
+)sql" DNS_TABLES R"sql(
 
 -- The hosts table; `aliases` are separated by blanks. System entries are the
 -- host's own and are not shown to or removable by users.
@@ -572,6 +584,21 @@ void ExportIpServices(ordered_json& host, Store& store) {
   PutArray(host, "ipsecSPs", std::move(sps));
 }
 
+/// Layout 1 had the resolver tables' order column between their key
+/// columns, and no order index.
+void UpgradeIpServices(Store& store, int64_t from) {
+  if (from >= 2)
+    return;
+  store.Exec("ALTER TABLE ipsvc_dns_server RENAME TO ipsvc_dns_server_1;"
+             "ALTER TABLE ipsvc_dns_search RENAME TO ipsvc_dns_search_1;" DNS_TABLES
+             "INSERT INTO ipsvc_dns_server(netstack, address, ord) "
+             "  SELECT netstack, address, ord FROM ipsvc_dns_server_1;"
+             "INSERT INTO ipsvc_dns_search(netstack, domain, ord) "
+             "  SELECT netstack, domain, ord FROM ipsvc_dns_search_1;"
+             "DROP TABLE ipsvc_dns_server_1;"
+             "DROP TABLE ipsvc_dns_search_1;");
+}
+
 } // namespace
 
 extern const Part kIpServicesPart;
@@ -598,6 +625,7 @@ const Part kIpServicesPart = {
        "action", "mode", "saName"}}},
     ImportIpServices,
     ExportIpServices,
+    UpgradeIpServices,
 };
 
 } // namespace Model

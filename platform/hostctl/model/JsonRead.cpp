@@ -1,9 +1,75 @@
 //===- model/JsonRead.cpp - Validated reading of the host description -----===//
 #include "model/JsonRead.h"
 
+#include <set>
+
 namespace Model {
 
 using nlohmann::ordered_json;
+
+ordered_json ParseDescription(const std::string& text) {
+  // The parser keeps the last of repeated keys without a word; a description
+  // that says two things about one field is refused instead.
+  struct Frame {
+    bool object;                ///< An object, else an array.
+    std::set<std::string> keys; ///< Keys seen so far (objects).
+    std::string key;            ///< The latest key (objects).
+    std::size_t count = 0;      ///< Elements begun so far (arrays).
+  };
+  std::vector<Frame> frames;
+  auto path = [&frames] {
+    std::string text;
+    for (const Frame& frame : frames) {
+      if (frame.object && !frame.key.empty())
+        text += (text.empty() ? "" : ".") + frame.key;
+      else if (!frame.object && frame.count > 0)
+        text += "[" + std::to_string(frame.count - 1) + "]";
+    }
+    return text;
+  };
+  using Event = nlohmann::ordered_json::parse_event_t;
+  auto callback = [&](int, Event event, ordered_json& parsed) {
+    switch (event) {
+    case Event::object_start:
+    case Event::array_start:
+      if (!frames.empty() && !frames.back().object)
+        ++frames.back().count;
+      frames.push_back({event == Event::object_start, {}, {}, 0});
+      break;
+    case Event::object_end:
+    case Event::array_end:
+      if (!frames.empty())
+        frames.pop_back();
+      break;
+    case Event::key: {
+      Frame& frame = frames.back();
+      std::string key = parsed.get<std::string>();
+      frame.key.clear();
+      if (!frame.keys.insert(key).second) {
+        std::string where = path();
+        throw ImportError((where.empty() ? "" : where + ": ") + "duplicate key \"" + key + "\"");
+      }
+      frame.key = std::move(key);
+      break;
+    }
+    case Event::value:
+      if (!frames.empty() && !frames.back().object)
+        ++frames.back().count;
+      break;
+    }
+    return true;
+  };
+  try {
+    return ordered_json::parse(text, callback);
+  } catch (const nlohmann::json::parse_error& e) {
+    // "[json.exception.parse_error.101] parse error at line 1, ...": the
+    // reader wants the part after the library's own tag.
+    std::string message = e.what();
+    if (std::size_t tag = message.find("] "); tag != std::string::npos)
+      message.erase(0, tag + 2);
+    throw ImportError("not JSON: " + message);
+  }
+}
 
 JsonObject::JsonObject(const ordered_json& value, std::string path)
     : value_(&value), path_(std::move(path)) {

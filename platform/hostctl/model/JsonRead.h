@@ -23,6 +23,11 @@ public:
   using std::runtime_error::runtime_error;
 };
 
+/// Parses the text of a host description. Throws ImportError for text that
+/// is not JSON (naming the line and column) and for an object that repeats a
+/// key (naming the object: "nics[0]: duplicate key \"name\"").
+nlohmann::ordered_json ParseDescription(const std::string& text);
+
 /// One JSON object of the host description, with its path for messages.
 class JsonObject {
 public:

@@ -2,6 +2,7 @@
 #include "model/Store.h"
 
 #include "HostCtl/Lib.h"
+#include "HostCtl/Session.h"
 #include "model/HostDescription.h"
 #include "model/Part.h"
 
@@ -24,7 +25,7 @@ namespace {
 
 /// Identifies our files ("OSTR") and the layout of their tables.
 constexpr int kApplicationId = 0x4f535452;
-constexpr int kSchemaVersion = 1;
+constexpr int kSchemaVersion = 2;
 
 std::unique_ptr<Store>& HostSlot() {
   static std::unique_ptr<Store> store;
@@ -36,14 +37,16 @@ std::string& PathSlot() {
   return path;
 }
 
-int BusyTimeoutMs() {
-  if (const char* env = std::getenv("OSTRACLI_BUSY_TIMEOUT_MS")) {
-    char* end = nullptr;
-    long value = std::strtol(env, &end, 10);
-    if (end != env && *end == '\0' && value >= 0 && value <= 600000)
-      return static_cast<int>(value);
-  }
-  return 5000;
+/// Whether Host() creates a missing file from the demo profile.
+bool& CreateDemoSlot() {
+  static bool create = false;
+  return create;
+}
+
+/// How long a statement waits for another connection's lock, in milliseconds.
+int& LockTimeoutSlot() {
+  static int timeout = HostCtl::Session::kDefaultLockTimeoutMs;
+  return timeout;
 }
 
 bool FileExists(const std::string& path) {
@@ -139,20 +142,16 @@ std::optional<std::string> Statement::OptText(int column) const {
 
 // --- Store ---------------------------------------------------------------
 
-std::string Store::DefaultPath() {
-  std::string base;
-  if (const char* xdg = std::getenv("XDG_STATE_HOME"); xdg && *xdg)
-    base = xdg;
-  else if (const char* home = std::getenv("HOME"); home && *home)
-    base = std::string(home) + "/.local/state";
-  else
-    base = "/tmp";
-  return base + "/ostracli/host.db";
+void Store::SetPath(const std::string& path, bool createDemo) {
+  PathSlot() = path;
+  CreateDemoSlot() = createDemo;
+  HostSlot().reset();
 }
 
-void Store::SetPath(const std::string& path) {
-  PathSlot() = path;
-  HostSlot().reset();
+void Store::SetLockTimeout(int milliseconds) {
+  LockTimeoutSlot() = milliseconds;
+  if (HostSlot())
+    sqlite3_busy_timeout(HostSlot()->db_, milliseconds);
 }
 
 void Store::CloseHost() {
@@ -163,15 +162,11 @@ Store& Store::Host() {
   std::unique_ptr<Store>& slot = HostSlot();
   if (slot)
     return *slot;
-  std::string path = PathSlot();
+  const std::string& path = PathSlot();
   if (path.empty())
-    if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
-      path = env;
-  if (path.empty()) {
-    path = DefaultPath();
-    if (!FileExists(path))
-      CreateDemoHost(path);
-  }
+    throw HostCtlException("Internal error: no host state was chosen");
+  if (CreateDemoSlot() && !FileExists(path))
+    CreateDemoHost(path);
   slot = std::make_unique<Store>(path);
   return *slot;
 }
@@ -189,21 +184,22 @@ Store::Store(const std::string& path) : path_(path), cache_(std::make_unique<Cac
     throw HostCtlException("Cannot open the host state at " + path + ": " + message);
   }
   sqlite3_extended_result_codes(db_, 1);
-  sqlite3_busy_timeout(db_, BusyTimeoutMs());
-  // A one-shot process would otherwise checkpoint the whole log when it
-  // closes; checkpoints happen automatically as the log grows.
-  sqlite3_db_config(db_, SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 1, nullptr);
+  sqlite3_busy_timeout(db_, LockTimeoutSlot());
   try {
     Exec("PRAGMA synchronous=FULL; PRAGMA foreign_keys=ON");
     Statement check = Prepare("PRAGMA application_id");
     check.Step();
     int64_t app = check.Int(0);
+    check.Reset();
     Statement version = Prepare("PRAGMA user_version");
     version.Step();
     int64_t schema = version.Int(0);
+    version.Reset();
     if (app != kApplicationId)
       throw HostCtlException("The file " + path + " is not a host state database");
-    if (schema != kSchemaVersion)
+    if (schema >= 1 && schema < kSchemaVersion)
+      Upgrade(schema);
+    else if (schema != kSchemaVersion)
       throw HostCtlException("The host state at " + path + " has layout version " +
                              std::to_string(schema) + "; this tool reads version " +
                              std::to_string(kSchemaVersion));
@@ -213,6 +209,41 @@ Store::Store(const std::string& path) : path_(path), cache_(std::make_unique<Cac
     cache_->statements.clear();
     sqlite3_close(db_);
     db_ = nullptr;
+    throw;
+  }
+}
+
+void Store::Upgrade(int64_t from) {
+  // Layout 1 kept changes in a write-ahead log beside the file; the rollback
+  // journal keeps every committed change in the file itself. Leaving the log
+  // needs the file to ourselves, which may take a moment.
+  Statement mode = Prepare("PRAGMA journal_mode");
+  std::string journal = mode.Step() ? mode.Text(0) : std::string();
+  mode.Reset();
+  if (journal == "wal") {
+    Statement change = Prepare("PRAGMA journal_mode=DELETE");
+    journal = change.Step() ? change.Text(0) : std::string();
+    change.Reset();
+    if (journal == "wal")
+      throw HostCtlException("The host state at " + path_ +
+                             " is locked by another process; try again");
+  }
+  Exec("BEGIN IMMEDIATE");
+  try {
+    Statement version = Prepare("PRAGMA user_version");
+    version.Step();
+    int64_t current = version.Int(0);
+    version.Reset();
+    if (current == from) {
+      for (const Part* part : AllParts())
+        if (part->upgrade)
+          part->upgrade(*this, from);
+      Exec(("PRAGMA user_version=" + std::to_string(kSchemaVersion)).c_str());
+    }
+    Exec("COMMIT");
+  } catch (...) {
+    if (!sqlite3_get_autocommit(db_))
+      sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
     throw;
   }
 }
@@ -236,9 +267,8 @@ std::unique_ptr<Store> Store::Create(const std::string& path) {
     sqlite3_close(db);
     throw HostCtlException("Cannot create the host state at " + path + ": " + message);
   }
-  std::string sql =
-      "PRAGMA journal_mode=WAL; PRAGMA application_id=" + std::to_string(kApplicationId) +
-      "; PRAGMA user_version=" + std::to_string(kSchemaVersion) + "; BEGIN;";
+  std::string sql = "PRAGMA application_id=" + std::to_string(kApplicationId) +
+                    "; PRAGMA user_version=" + std::to_string(kSchemaVersion) + "; BEGIN;";
   for (const Part* part : AllParts())
     sql += part->schema;
   sql += "COMMIT;";
@@ -286,25 +316,38 @@ int Store::Changes() const {
 void Store::Fail(int rc, std::string_view doing) const {
   int primary = rc & 0xff;
   std::string where = "The host state at " + path_;
+  std::string message;
   switch (primary) {
   case SQLITE_BUSY:
   case SQLITE_LOCKED:
-    throw HostCtlException(where + " is locked by another process; try again");
+    message = where + " is locked by another process; try again";
+    break;
   case SQLITE_READONLY:
-    throw HostCtlException(where + " cannot be changed: it is read-only");
+    message = where + " cannot be changed: it is read-only";
+    lastFailure_ = "it is read-only";
+    break;
   case SQLITE_FULL:
-    throw HostCtlException(where + " cannot be changed: the disk is full");
+    message = where + " cannot be changed: the disk is full";
+    lastFailure_ = "the disk is full";
+    break;
   case SQLITE_NOTADB:
-    throw HostCtlException("The file " + path_ + " is not a host state database");
+    message = "The file " + path_ + " is not a host state database";
+    break;
   case SQLITE_CORRUPT:
-    throw HostCtlException(where + " is corrupt");
+    message = where + " is corrupt";
+    lastFailure_ = "it is corrupt";
+    break;
   case SQLITE_IOERR:
   case SQLITE_CANTOPEN:
-    throw HostCtlException(where + " cannot be read or written: " + sqlite3_errstr(rc));
+    message = where + " cannot be read or written: " + sqlite3_errstr(rc);
+    lastFailure_ = sqlite3_errstr(rc);
+    break;
   default:
-    throw HostCtlException(where + ": error " + std::string(doing) + ": " +
-                           (db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(rc)));
+    message = where + ": error " + std::string(doing) + ": " +
+              (db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(rc));
+    break;
   }
+  throw HostCtlException(message);
 }
 
 void Store::LoadFaults() {
@@ -323,10 +366,27 @@ void Store::CheckFault(std::string_view operation, std::string_view object) {
       throw HostCtlException(fault.message);
 }
 
+void Store::CheckTransaction() {
+  if (!lost_ && (depth_ == 0 || !sqlite3_get_autocommit(db_)))
+    return;
+  // SQLite ends a transaction by itself after some failures (a full disk, an
+  // I/O error). What follows would then run outside it, each statement
+  // committing on its own: refuse everything until the outermost unit ends.
+  lost_ = true;
+  throw HostCtlException(LostMessage());
+}
+
+std::string Store::LostMessage() const {
+  return "The host state at " + path_ + " lost its open transaction" +
+         (lastFailure_.empty() ? std::string() : " (" + lastFailure_ + ")") +
+         "; none of its changes were kept";
+}
+
 // Transaction control goes through the statement cache: a batch opens and
 // releases a savepoint per operation, and parsing those statements each time
 // was a tenth of the cost of a batch of route additions.
 Store::Scope::Scope(Store& store, bool write) : store_(store), outer_(store.depth_ == 0) {
+  store_.CheckTransaction();
   if (outer_) {
     store_.Prepare(write ? "BEGIN IMMEDIATE" : "BEGIN").Run();
     store_.writing_ = write;
@@ -340,6 +400,7 @@ Store::Scope::Scope(Store& store, bool write) : store_(store), outer_(store.dept
 }
 
 void Store::Scope::Commit() {
+  store_.CheckTransaction();
   if (outer_)
     store_.Prepare("COMMIT").Run();
   else if (savepoint_)
@@ -352,33 +413,61 @@ Store::Scope::~Scope() {
   if (done_)
     return;
   --store_.depth_;
+  if (store_.lost_ || sqlite3_get_autocommit(store_.db_))
+    return;
   if (outer_)
     sqlite3_exec(store_.db_, "ROLLBACK", nullptr, nullptr, nullptr);
   else if (savepoint_)
     sqlite3_exec(store_.db_, "ROLLBACK TO operation; RELEASE operation", nullptr, nullptr, nullptr);
 }
 
-void Store::BeginBatch() {
-  if (depth_ != 0)
-    throw HostCtlException("Internal error: a batch was started inside a transaction");
-  Exec("BEGIN IMMEDIATE");
-  writing_ = true;
-  depth_ = 1;
+void Store::BeginUnit(bool write) {
+  CheckTransaction();
+  const bool outer = depth_ == 0;
+  if (outer) {
+    lastFailure_.clear();
+    Prepare(write ? "BEGIN IMMEDIATE" : "BEGIN").Run();
+    writing_ = write;
+  } else if (write && !writing_) {
+    throw HostCtlException("Internal error: a change was attempted inside a read");
+  } else {
+    Prepare("SAVEPOINT unit").Run();
+  }
+  units_.push_back(outer);
+  ++depth_;
 }
 
-void Store::EndBatch(bool commit) {
-  if (depth_ != 1)
-    return;
-  depth_ = 0;
-  if (commit) {
-    try {
-      Exec("COMMIT");
-    } catch (...) {
+void Store::EndUnit(bool keep) {
+  if (units_.empty())
+    throw HostCtlException("Internal error: no unit of work is open");
+  const bool outer = units_.back();
+  units_.pop_back();
+  --depth_;
+  if (lost_ || sqlite3_get_autocommit(db_)) {
+    // An inner unit leaves the loss in place for the units around it; the
+    // outermost one reports it last and starts afresh.
+    lost_ = !outer;
+    throw HostCtlException(LostMessage());
+  }
+  if (outer) {
+    if (!keep) {
       sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+      return;
+    }
+    try {
+      Prepare("COMMIT").Run();
+    } catch (...) {
+      if (!sqlite3_get_autocommit(db_))
+        sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
       throw;
     }
+    return;
+  }
+  if (keep) {
+    Prepare("RELEASE unit").Run();
   } else {
-    sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+    Prepare("ROLLBACK TO unit").Run();
+    Prepare("RELEASE unit").Run();
   }
 }
 

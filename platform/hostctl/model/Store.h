@@ -19,6 +19,7 @@
 #include <string>
 #include <string_view>
 #include <type_traits>
+#include <vector>
 
 struct sqlite3;
 struct sqlite3_stmt;
@@ -78,15 +79,14 @@ private:
 /// The open store of the host this process works on.
 class Store {
 public:
-  /// The host store of this process, opened on first use. Its path is
-  /// SetPath's, else $OSTRACLI_HOST, else DefaultPath(); the default path is
-  /// created from the demo profile when it does not exist, any other path must
-  /// exist.
+  /// The host store of this process, opened on first use at SetPath's path.
+  /// The store reads no environment: the command host chooses the path.
   static Store& Host();
-  /// Chooses the host database before first use (the --host option).
-  static void SetPath(const std::string& path);
-  /// ${XDG_STATE_HOME:-$HOME/.local/state}/ostracli/host.db
-  static std::string DefaultPath();
+  /// Chooses the host database before first use (closing the one open). With
+  /// \p createDemo, a missing file is created from the demo profile first.
+  static void SetPath(const std::string& path, bool createDemo = false);
+  /// How long statements wait for another connection's lock.
+  static void SetLockTimeout(int milliseconds);
   /// Closes the process's host store (the next Host() opens it again).
   static void CloseHost();
 
@@ -126,11 +126,20 @@ public:
     }
   }
 
-  /// Starts a batch: the host operations that follow run inside one write
-  /// transaction (each as a savepoint, so a failed operation still changes
-  /// nothing) until EndBatch commits or rolls back the whole batch.
-  void BeginBatch();
-  void EndBatch(bool commit);
+  /// Starts a unit of work that host operations join until EndUnit: outside
+  /// any transaction a transaction (a write one, taking the lock now and
+  /// waiting for it up to the lock timeout, when \p write; otherwise one
+  /// consistent read), inside one a savepoint. Operations inside keep their
+  /// own savepoints, so a refused operation is still undone alone.
+  void BeginUnit(bool write);
+  /// Ends the innermost unit: \p keep commits it (or releases its savepoint),
+  /// otherwise rolls it back. Throws HostCtlException when the commit fails or
+  /// the transaction was lost; nothing of the unit is kept then.
+  void EndUnit(bool keep);
+  /// True when SQLite rolled back the open transaction on its own (a full
+  /// disk, an I/O error): nothing of it is kept, and every host operation
+  /// fails until the outermost unit ends.
+  bool Lost() const { return lost_; }
 
   /// A statement from the cache (prepared on first use).
   Statement Prepare(const char* sql);
@@ -166,13 +175,21 @@ private:
   };
 
   void LoadFaults();
+  /// Brings a file of an older layout to the current one, in one transaction.
+  void Upgrade(int64_t from);
+  /// Throws when the open transaction has gone away underneath us.
+  void CheckTransaction();
+  std::string LostMessage() const;
 
   struct Cache;
-  std::string path_;             ///< Database file.
-  sqlite3* db_ = nullptr;        ///< Connection.
-  std::unique_ptr<Cache> cache_; ///< Prepared statements and faults.
-  int depth_ = 0;                ///< Nesting of transaction scopes.
-  bool writing_ = false;         ///< The open transaction is a write.
+  std::string path_;                ///< Database file.
+  sqlite3* db_ = nullptr;           ///< Connection.
+  std::unique_ptr<Cache> cache_;    ///< Prepared statements and faults.
+  int depth_ = 0;                   ///< Nesting of transaction scopes.
+  bool writing_ = false;            ///< The open transaction is a write.
+  bool lost_ = false;               ///< SQLite rolled back the open transaction.
+  mutable std::string lastFailure_; ///< Text of the last failure, for a lost transaction.
+  std::vector<bool> units_;         ///< Open units, innermost last; true: began the transaction.
 };
 
 /// Shorthand for Store::Host().CheckFault(...).

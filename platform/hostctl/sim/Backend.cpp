@@ -114,8 +114,12 @@ public:
   }
 
   bool HasTransactions() const override { return true; }
-  void BeginBatch() override { Model::Store::Host().BeginBatch(); }
-  void EndBatch(bool commit) override { Model::Store::Host().EndBatch(commit); }
+  void SetLockTimeout(int milliseconds) override { Model::Store::SetLockTimeout(milliseconds); }
+  void BeginCommand(bool changes) override { Model::Store::Host().BeginUnit(changes); }
+  void EndCommand(bool keep) override { Model::Store::Host().EndUnit(keep); }
+  void BeginBatch() override { Model::Store::Host().BeginUnit(true); }
+  void EndBatch(bool commit) override { Model::Store::Host().EndUnit(commit); }
+  bool BatchLost() const override { return Model::Store::Host().Lost(); }
 };
 
 } // namespace
@@ -124,10 +128,9 @@ public:
 
 namespace HostCtl::Backend {
 
-std::unique_ptr<Backend> MakeSimulatedHost(const std::string& path) {
-  // Without a path the store finds its database as it always has.
+std::unique_ptr<Backend> MakeSimulatedHost(const std::string& path, bool createDemo) {
   if (!path.empty())
-    Model::Store::SetPath(path);
+    Model::Store::SetPath(path, createDemo);
   return std::make_unique<Sim::SimulatedHost>();
 }
 

@@ -39,11 +39,6 @@ void DnsConfigImpl::Refresh() {
   loaded_ = true;
 }
 
-void DnsConfigImpl::EnsureLoaded() {
-  if (!loaded_)
-    Refresh();
-}
-
 void DnsConfigImpl::Apply(const Change& change, std::vector<std::string>& servers,
                           std::vector<std::string>& domains) const {
   switch (change.kind) {
@@ -83,57 +78,85 @@ void DnsConfigImpl::Apply(const Change& change, std::vector<std::string>& server
   }
 }
 
+bool DnsConfigImpl::Has(bool domain, const std::string& value) {
+  // The latest change not yet saved that concerns the value decides; else the
+  // store, by index, so that adding to a long list costs no more than to a
+  // short one.
+  for (auto it = changes_.rbegin(); it != changes_.rend(); ++it) {
+    switch (it->kind) {
+    case Change::AddServer:
+    case Change::RemoveServer:
+      if (!domain && it->value == value)
+        return it->kind == Change::AddServer;
+      break;
+    case Change::RemoveAllServers:
+      if (!domain)
+        return false;
+      break;
+    case Change::AddDomain:
+    case Change::RemoveDomain:
+      if (domain && SameDomain(it->value, value))
+        return it->kind == Change::AddDomain;
+      break;
+    }
+  }
+  Store& store = Store::Host();
+  return store.Read([&] { return Model::IpSvc::HasDnsEntry(store, netstack_, domain, value); });
+}
+
+void DnsConfigImpl::Record(Change change) {
+  bool domain = change.kind == Change::AddDomain || change.kind == Change::RemoveDomain;
+  if (change.kind == Change::RemoveAllServers) {
+    Has(false, ""); // Refuses a missing netstack.
+  } else if (bool present = Has(domain, change.value);
+             change.kind == Change::AddServer || change.kind == Change::AddDomain) {
+    if (present)
+      throw HostCtlException(std::string(domain ? "The search domain " : "The DNS server ") +
+                             change.value + " is already configured for netstack " + netstack_);
+  } else if (!present) {
+    throw HostCtlException(std::string(domain ? "The search domain " : "The DNS server ") +
+                           change.value + " is not configured for netstack " + netstack_);
+  }
+  changes_.push_back(std::move(change));
+  loaded_ = false;
+}
+
 void DnsConfigImpl::AddUserNameServer(const HostCtl::Network::IpAddress& address) {
   Store::Host().CheckFault("AddUserNameServer", netstack_);
-  EnsureLoaded();
-  Change change{Change::AddServer, address.GetStringAddress()};
-  Apply(change, servers_, domains_);
-  changes_.push_back(std::move(change));
+  Record({Change::AddServer, address.GetStringAddress()});
 }
 
 void DnsConfigImpl::RemoveNameServer(const HostCtl::Network::IpAddress& address) {
   Store::Host().CheckFault("RemoveNameServer", netstack_);
-  EnsureLoaded();
-  Change change{Change::RemoveServer, address.GetStringAddress()};
-  Apply(change, servers_, domains_);
-  changes_.push_back(std::move(change));
+  Record({Change::RemoveServer, address.GetStringAddress()});
 }
 
 void DnsConfigImpl::RemoveNameServers() {
   Store::Host().CheckFault("RemoveNameServers", netstack_);
-  EnsureLoaded();
-  Change change{Change::RemoveAllServers, ""};
-  Apply(change, servers_, domains_);
-  changes_.push_back(std::move(change));
+  Record({Change::RemoveAllServers, ""});
 }
 
 std::vector<std::string> DnsConfigImpl::GetNameServers() {
   Store::Host().CheckFault("GetNameServers", netstack_);
-  if (changes_.empty() || !loaded_)
+  if (!loaded_)
     Refresh();
   return servers_;
 }
 
 void DnsConfigImpl::AddUserSearchDomain(const std::string& domain) {
   Store::Host().CheckFault("AddUserSearchDomain", netstack_);
-  EnsureLoaded();
   Model::IpSvc::CheckSearchDomain(domain);
-  Change change{Change::AddDomain, domain};
-  Apply(change, servers_, domains_);
-  changes_.push_back(std::move(change));
+  Record({Change::AddDomain, domain});
 }
 
 void DnsConfigImpl::RemoveSearchDomain(const std::string& domain) {
   Store::Host().CheckFault("RemoveSearchDomain", netstack_);
-  EnsureLoaded();
-  Change change{Change::RemoveDomain, domain};
-  Apply(change, servers_, domains_);
-  changes_.push_back(std::move(change));
+  Record({Change::RemoveDomain, domain});
 }
 
 std::string DnsConfigImpl::GetSearchDomainsString() {
   Store::Host().CheckFault("GetSearchDomainsString", netstack_);
-  if (changes_.empty() || !loaded_)
+  if (!loaded_)
     Refresh();
   std::string text;
   for (const std::string& domain : domains_)
@@ -146,18 +169,33 @@ void DnsConfigImpl::SaveConfig() {
   store.CheckFault("SaveConfig", netstack_);
   if (changes_.empty())
     return;
+  // Each change is checked again against the stored configuration and
+  // applied as one row operation.
   store.Write([&] {
-    std::vector<std::string> servers;
-    std::vector<std::string> domains;
-    Model::IpSvc::LoadDns(store, netstack_, servers, domains);
-    for (const Change& change : changes_)
-      Apply(change, servers, domains);
-    Model::IpSvc::SaveDns(store, netstack_, servers, domains);
-    servers_ = std::move(servers);
-    domains_ = std::move(domains);
+    namespace IpSvc = Model::IpSvc;
+    for (const Change& change : changes_) {
+      const bool domain = change.kind == Change::AddDomain || change.kind == Change::RemoveDomain;
+      if (change.kind == Change::RemoveAllServers) {
+        IpSvc::ClearDnsServers(store, netstack_);
+        continue;
+      }
+      const bool present = IpSvc::HasDnsEntry(store, netstack_, domain, change.value);
+      const bool add = change.kind == Change::AddServer || change.kind == Change::AddDomain;
+      const char* what = domain ? "The search domain " : "The DNS server ";
+      if (add && present)
+        throw HostCtlException(what + change.value + " is already configured for netstack " +
+                               netstack_);
+      if (!add && !present)
+        throw HostCtlException(what + change.value + " is not configured for netstack " +
+                               netstack_);
+      if (add)
+        IpSvc::AppendDnsEntry(store, netstack_, domain, change.value);
+      else
+        IpSvc::RemoveDnsEntry(store, netstack_, domain, change.value);
+    }
   });
   changes_.clear();
-  loaded_ = true;
+  loaded_ = false;
 }
 
 } // namespace Sim

@@ -52,7 +52,11 @@ private:
     std::string value; ///< Server address text or domain.
   };
 
-  void EnsureLoaded();
+  /// Whether the list (the search domains with \p domain) holds \p value,
+  /// changes not yet saved included.
+  bool Has(bool domain, const std::string& value);
+  /// Checks \p change against the list and keeps it for SaveConfig.
+  void Record(Change change);
   /// Applies \p change to \p servers and \p domains; throws when it is refused.
   void Apply(const Change& change, std::vector<std::string>& servers,
              std::vector<std::string>& domains) const;

@@ -1,8 +1,8 @@
 //===- Session.cpp - The host a process works on ---------------------------===//
 //
 // The session owns the process's backend. It is made on first use from the
-// host chosen with SetHost, else $OSTRACLI_HOST, else the default simulated
-// host. "linux" and "netns:NAME" are served by a backend that a separately
+// host chosen with SetHost (else the simulated host's store decides, as in
+// unit tests). "linux" and "netns:NAME" are served by a backend that a separately
 // loaded module registers (so that libnl loads only when the Linux host is
 // used); the module is looked for at $OSTRACLI_LINUX_MODULE, else at
 // lib/ostracli/host-linux.so beside the executable's directory.
@@ -12,7 +12,6 @@
 
 #include "HostCtl/Lib.h"
 #include "backend/Backend.h"
-#include "model/Store.h"
 
 #include <climits>
 #include <cstdlib>
@@ -31,6 +30,8 @@ struct State {
   std::map<std::string, Backend::Factory> factories; ///< By scheme.
   std::string missingOperation;                      ///< Last operation not available, or "".
   std::string missingHost;                           ///< The host that lacked it.
+  int lockTimeoutMs = -1;                            ///< SetLockTimeout's, or -1.
+  std::string failure; ///< Why the host chosen last cannot be used, or "".
 };
 
 State& TheState() {
@@ -73,10 +74,10 @@ bool LoadLinuxModule() {
   return true; // The module stays loaded: the backend's code lives in it.
 }
 
-std::unique_ptr<Backend::Backend> MakeBackend(const std::string& spec, bool chosen) {
+std::unique_ptr<Backend::Backend> MakeBackend(const std::string& spec, bool createDemo) {
   std::string scheme = SchemeOf(spec);
   if (scheme.empty())
-    return Backend::MakeSimulatedHost(chosen ? spec : std::string());
+    return Backend::MakeSimulatedHost(spec, createDemo);
   State& state = TheState();
   auto found = state.factories.find(scheme);
   if (found == state.factories.end() && LoadLinuxModule())
@@ -101,15 +102,17 @@ void RegisterFactory(const std::string& scheme, Factory factory) {
 
 Backend& Current() {
   State& state = TheState();
+  // A host that was chosen but cannot be used stays refused: no command may
+  // fall back to another host.
+  if (!state.failure.empty())
+    throw Lib::HostCtlException(state.failure);
   if (!state.backend) {
-    // Without SetHost the simulated host finds its own database as it
-    // always has ($OSTRACLI_HOST, else the default made from the demo
-    // profile); only a kernel host named by $OSTRACLI_HOST needs a factory.
-    std::string spec;
-    if (const char* env = std::getenv("OSTRACLI_HOST"); env && *env)
-      spec = env;
-    state.backend = MakeBackend(spec, !SchemeOf(spec).empty());
-    state.spec = spec;
+    // Without SetHost (unit tests) the simulated host uses the database its
+    // store was pointed at.
+    state.backend = MakeSimulatedHost(std::string(), false);
+    state.spec.clear();
+    if (state.lockTimeoutMs >= 0)
+      state.backend->SetLockTimeout(state.lockTimeoutMs);
   }
   return *state.backend;
 }
@@ -118,6 +121,7 @@ void ResetCurrent() {
   State& state = TheState();
   state.backend.reset();
   state.spec.clear();
+  state.failure.clear();
 }
 
 [[noreturn]] void Unavailable(const char* operation) {
@@ -141,28 +145,56 @@ NotAvailableException::NotAvailableException(const std::string& operation, const
 namespace Session {
 
 std::string DefaultHostPath() {
-  return Model::Store::DefaultPath();
+  std::string base;
+  if (const char* xdg = std::getenv("XDG_STATE_HOME"); xdg && *xdg)
+    base = xdg;
+  else if (const char* home = std::getenv("HOME"); home && *home)
+    base = std::string(home) + "/.local/state";
+  else
+    base = "/tmp";
+  return base + "/ostracli/host.db";
 }
 
-void SetHost(const std::string& spec) {
+bool IsSimulatedHost(const std::string& spec) {
+  return SchemeOf(spec).empty();
+}
+
+void SetHost(const std::string& spec, bool createDemo) {
   State& state = TheState();
-  if (state.backend && state.spec == spec)
+  if ((state.backend || !state.failure.empty()) && state.spec == spec)
     return;
-  std::unique_ptr<Backend::Backend> backend = MakeBackend(spec, true);
-  state.backend = std::move(backend);
+  state.backend.reset();
   state.spec = spec;
+  std::unique_ptr<Backend::Backend> backend;
+  try {
+    backend = MakeBackend(spec, createDemo);
+  } catch (const Lib::HostCtlException& e) {
+    state.failure = e.what();
+    throw;
+  }
+  state.failure.clear();
+  if (state.lockTimeoutMs >= 0)
+    backend->SetLockTimeout(state.lockTimeoutMs);
+  state.backend = std::move(backend);
 }
 
-void SetHostPath(const std::string& path) {
+void SetLockTimeout(int milliseconds) {
   State& state = TheState();
-  if (state.backend && state.spec == path)
-    return;
-  state.backend = Backend::MakeSimulatedHost(path);
-  state.spec = path;
+  state.lockTimeoutMs = milliseconds;
+  if (state.backend)
+    state.backend->SetLockTimeout(milliseconds);
 }
 
 bool HasTransactions() {
   return Backend::Current().HasTransactions();
+}
+
+void BeginCommand(bool changes) {
+  Backend::Current().BeginCommand(changes);
+}
+
+void EndCommand(bool keep) {
+  Backend::Current().EndCommand(keep);
 }
 
 void BeginBatch() {
@@ -171,6 +203,10 @@ void BeginBatch() {
 
 void EndBatch(bool commit) {
   Backend::Current().EndBatch(commit);
+}
+
+bool BatchLost() {
+  return Backend::Current().BatchLost();
 }
 
 void ClearNotAvailable() {
