@@ -1,0 +1,37 @@
+//===- EthtoolWire.h - Shared pieces of the ethtool parsers (internal) ----===//
+#pragma once
+
+#include <netlink/attr.h>
+
+#include <cstdint>
+#include <span>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace LinuxNet::Detail {
+
+/// A generic netlink reply copied to aligned storage, its attributes parsed.
+class GenlReply {
+public:
+  /// Throws Error(EPROTO) when \p bytes is not a whole, well-formed message.
+  GenlReply(std::span<const uint8_t> bytes, int max);
+  std::vector<nlattr*> tb; ///< Top-level attributes by type.
+
+private:
+  std::vector<uint64_t> storage_; ///< The message, 8-byte aligned.
+};
+
+/// An ethtool bitset in either of its forms.
+struct Bitset {
+  uint32_t size = 0;                ///< Number of bits.
+  bool noMask = false;              ///< A plain list (no mask).
+  std::vector<uint32_t> value;      ///< Bits set.
+  std::vector<uint32_t> mask;       ///< Bits present (verbose: listed).
+  std::vector<std::pair<uint32_t, std::string>> names; ///< Verbose form: bit and name.
+};
+Bitset ParseBitset(const nlattr* a);
+bool TestBit(const std::vector<uint32_t>& words, uint32_t bit);
+std::vector<uint32_t> SetBits(const std::vector<uint32_t>& words);
+
+} // namespace LinuxNet::Detail
