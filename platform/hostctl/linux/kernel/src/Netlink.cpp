@@ -192,6 +192,9 @@ NlSocket::NlSocket(int protocol) {
   // which is what the kernel fills dumps up to.
   nl_socket_set_msg_buf_size(sk_, 32768);
   nl_socket_disable_msg_peek(sk_);
+  // Replies are matched to requests by the receive loop; libnl's own check
+  // does not see the requests that loop sends.
+  nl_socket_disable_seq_check(sk_);
   const int fd = nl_socket_get_fd(sk_);
   SetFlag(fd, NETLINK_EXT_ACK);
   SetFlag(fd, NETLINK_CAP_ACK);

@@ -1,0 +1,50 @@
+//===- Lab.h - A throwaway network namespace for one test -----------------===//
+//
+// LabTest builds, for each test, a namespace named after the process and the
+// test, with two veth pairs (vmnic0/peer0 in a bridge br0, vmnic1/peer1
+// free), IPv4 and IPv6 addresses, routes, neighbours and /etc/netns files,
+// and deletes it afterwards whatever happened. Its oracle runs ip, bridge,
+// ethtool and ss in that namespace.
+//
+//===----------------------------------------------------------------------===//
+#pragma once
+
+#include "LinuxNet/Namespace.h"
+
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include <string>
+
+namespace LinuxNetTest {
+
+/// Output and exit status of a shell command.
+struct Output {
+  std::string out;
+  int status = 0;
+};
+/// Runs \p command with /bin/sh; standard error goes to the output too when
+/// \p withErrors.
+Output Shell(const std::string& command, bool withErrors = false);
+
+/// A test that needs root and its own namespace.
+class LabTest : public ::testing::Test {
+protected:
+  void SetUp() override;
+  void TearDown() override;
+
+  /// Runs "ip -n NS ARGS" and fails the test when it fails.
+  std::string Ip(const std::string& args);
+  /// Runs "ip -n NS -json ARGS" and parses its output.
+  nlohmann::json IpJson(const std::string& args);
+  /// Runs COMMAND inside the namespace (ip netns exec).
+  Output Exec(const std::string& command);
+
+  std::string name_;                      ///< The namespace's name.
+  std::unique_ptr<LinuxNet::Namespace> ns_; ///< The library's handle to it.
+};
+
+/// The inode of the calling thread's network namespace.
+unsigned long ThreadNamespace();
+
+} // namespace LinuxNetTest
