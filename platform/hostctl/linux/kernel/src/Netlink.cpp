@@ -138,8 +138,12 @@ void Fail(int err, const Subject& subject, const std::string& kernelText) {
               (subject.driver.empty() ? "" : subject.driver + " ") + "does not support " +
               subject.feature;
   } else {
-    std::string reason = kernelText.empty() ? Reason(err) : kernelText;
-    if (!kernelText.empty() && reason.size() > 1 && isupper(static_cast<unsigned char>(reason[0])) &&
+    // The kernel's words where they say more than the errno; plain ones for
+    // the everyday refusals.
+    const bool plain = err == EEXIST || err == ENOENT || err == ESRCH || err == EADDRNOTAVAIL ||
+                       err == ENODEV;
+    std::string reason = kernelText.empty() || plain ? Reason(err) : kernelText;
+    if (!plain && !kernelText.empty() && reason.size() > 1 && isupper(static_cast<unsigned char>(reason[0])) &&
         islower(static_cast<unsigned char>(reason[1])))
       reason[0] = static_cast<char>(tolower(static_cast<unsigned char>(reason[0])));
     message = subject.object + ": " + reason;
