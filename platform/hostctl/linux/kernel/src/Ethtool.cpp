@@ -273,9 +273,27 @@ void RestartNegotiation(Namespace& ns, const std::string& dev) {
 }
 
 std::vector<Feature> GetFeatures(Namespace& ns, const std::string& dev) {
-  // Verbose bitsets: the kernel names each feature.
-  return Query(ns, dev, ETHTOOL_MSG_FEATURES_GET, 0, "offload features",
-             EthtoolWire::ParseFeatures);
+  return Guarded(ns, dev, "offload features", false, [&](const Subject& s) {
+    // The names of every feature the kernel knows, so that fixed features
+    // that are off are listed too.
+    auto info = IoctlBuffer<ethtool_sset_info>(ETHTOOL_GSSET_INFO, sizeof(uint32_t));
+    reinterpret_cast<ethtool_sset_info*>(info.data())->sset_mask = 1ULL << ETH_SS_FEATURES;
+    Ioctl(ns, dev, info.data(), s);
+    uint32_t count = 0;
+    memcpy(&count, reinterpret_cast<const uint8_t*>(info.data()) + sizeof(ethtool_sset_info),
+           sizeof count);
+    const auto strings = ReadStrings(ns, dev, ETH_SS_FEATURES, count, s);
+    std::vector<std::string> names;
+    const auto* p = reinterpret_cast<const char*>(strings.data()) + sizeof(ethtool_gstrings);
+    for (uint32_t i = 0; i < count; ++i)
+      names.emplace_back(p + i * ETH_GSTRING_LEN, strnlen(p + i * ETH_GSTRING_LEN, ETH_GSTRING_LEN));
+    MsgPtr msg = Request(ns, ETHTOOL_MSG_FEATURES_GET, dev, ETHTOOL_FLAG_COMPACT_BITSETS);
+    std::vector<Feature> features;
+    ns.Internals().Genl().Request(msg.get(), s, [&](nlmsghdr* h) {
+      features = EthtoolWire::ParseFeatures(Bytes(h), names);
+    });
+    return features;
+  });
 }
 
 void SetFeatures(Namespace& ns, const std::string& dev,

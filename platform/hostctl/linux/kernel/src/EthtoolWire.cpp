@@ -190,23 +190,25 @@ LinkInfo ParseLinkInfo(std::span<const uint8_t> message) {
   return info;
 }
 
-std::vector<Feature> ParseFeatures(std::span<const uint8_t> message) {
+std::vector<Feature> ParseFeatures(std::span<const uint8_t> message,
+                                   const std::vector<std::string>& names) {
   GenlReply r(message, ETHTOOL_A_FEATURES_MAX);
   const Bitset hw = ParseBitset(r.tb[ETHTOOL_A_FEATURES_HW]);
   const Bitset wanted = ParseBitset(r.tb[ETHTOOL_A_FEATURES_WANTED]);
   const Bitset active = ParseBitset(r.tb[ETHTOOL_A_FEATURES_ACTIVE]);
   const Bitset nochange = ParseBitset(r.tb[ETHTOOL_A_FEATURES_NOCHANGE]);
-  // Every feature named in any of the four sets, by bit.
-  std::map<uint32_t, std::string> names;
+  // Every feature of the string set, or else every one a set names, by bit.
+  std::map<uint32_t, std::string> byBit;
+  for (std::size_t bit = 0; bit < names.size(); ++bit)
+    byBit.emplace(static_cast<uint32_t>(bit), names[bit]);
   for (const Bitset* b : {&hw, &wanted, &active, &nochange})
     for (const auto& [bit, name] : b->names)
-      names.emplace(bit, name);
-  if (names.empty())
-    for (const Bitset* b : {&hw, &wanted, &active})
-      for (uint32_t bit : SetBits(b->value))
-        names.emplace(bit, "bit " + std::to_string(bit));
+      byBit.emplace(bit, name);
+  for (const Bitset* b : {&hw, &wanted, &active})
+    for (uint32_t bit : SetBits(b->value))
+      byBit.emplace(bit, "bit " + std::to_string(bit));
   std::vector<Feature> features;
-  for (const auto& [bit, name] : names) {
+  for (const auto& [bit, name] : byBit) {
     Feature f;
     f.name = name;
     f.active = TestBit(active.value, bit);

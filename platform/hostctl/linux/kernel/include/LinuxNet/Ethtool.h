@@ -203,7 +203,10 @@ std::vector<std::pair<std::string, uint64_t>> GetDriverStats(Namespace& ns, cons
 namespace EthtoolWire {
 LinkModes ParseLinkModes(std::span<const uint8_t> message);
 LinkInfo ParseLinkInfo(std::span<const uint8_t> message);
-std::vector<Feature> ParseFeatures(std::span<const uint8_t> message);
+/// \p names are the kernel's feature names by bit (its "features" string
+/// set); without them only the features a verbose reply names are listed.
+std::vector<Feature> ParseFeatures(std::span<const uint8_t> message,
+                                   const std::vector<std::string>& names = {});
 Channels ParseChannels(std::span<const uint8_t> message);
 Rings ParseRings(std::span<const uint8_t> message);
 Coalesce ParseCoalesce(std::span<const uint8_t> message);
