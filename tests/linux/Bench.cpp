@@ -101,7 +101,9 @@ double TimeCall(int runs, const std::function<void()>& body) {
   return Median(times);
 }
 
-int Sh(const std::string& command) { return system(command.c_str()); }
+int Sh(const std::string& command) {
+  return system(command.c_str());
+}
 
 /// The child: lists one kind of object and prints it, as a command would.
 int Child(const std::string& what, const std::string& name) {
@@ -251,14 +253,22 @@ int main(int argc, char** argv) {
     double target;
   };
   const Row rows[] = {
-      {"links", {exe, "--child", "links", name}, {"ip", "-n", name, "-json", "link", "show"},
-       "ip -json link show", 1.5},
-      {"links + ethtool (nic list)", {exe, "--child", "nics", name},
-       {"ip", "-n", name, "-json", "link", "show"}, "ip -json link show", 1.5},
-      {"routes", {exe, "--child", "routes", name}, {"ip", "-n", name, "-json", "route", "show"},
-       "ip -json route show", 1.2},
-      {"sockets", {exe, "--child", "sockets", name}, {"ss", "-N", name, "-tuna"}, "ss -tuna",
+      {"links",
+       {exe, "--child", "links", name},
+       {"ip", "-n", name, "-json", "link", "show"},
+       "ip -json link show",
        1.5},
+      {"links + ethtool (nic list)",
+       {exe, "--child", "nics", name},
+       {"ip", "-n", name, "-json", "link", "show"},
+       "ip -json link show",
+       1.5},
+      {"routes",
+       {exe, "--child", "routes", name},
+       {"ip", "-n", name, "-json", "route", "show"},
+       "ip -json route show",
+       1.2},
+      {"sockets", {exe, "--child", "sockets", name}, {"ss", "-N", name, "-tuna"}, "ss -tuna", 1.5},
   };
   printf("| whole process | ours (ms) | peer | peer (ms) | ratio | target |\n");
   printf("|---|---|---|---|---|---|\n");

@@ -165,17 +165,27 @@ TEST_F(EthtoolTest, WhatVethLacksIsRefusedNamingTheDriver) {
   const std::string dev = "vmnic0";
   const Case cases[] = {
       {"ring parameters", [&] { GetRings(*ns_, dev); }},
-      {"ring parameters", [&] { SetRings(*ns_, dev, Rings{0, 0, 0, 0, 512, {}, {}, 512}); }},
+      {"ring parameters",
+       [&] {
+         SetRings(*ns_, dev, Rings{0, 0, 0, 0, 512, {}, {}, 512});
+       }},
       {"interrupt coalescing", [&] { GetCoalesce(*ns_, dev); }},
-      {"interrupt coalescing", [&] {
+      {"interrupt coalescing",
+       [&] {
          Coalesce c;
          c.rxUsecs = 10;
          SetCoalesce(*ns_, dev, c);
        }},
       {"pause parameters", [&] { GetPause(*ns_, dev); }},
-      {"pause parameters", [&] { SetPause(*ns_, dev, Pause{false, true, true}); }},
+      {"pause parameters",
+       [&] {
+         SetPause(*ns_, dev, Pause{false, true, true});
+       }},
       {"EEPROM access", [&] { ReadEeprom(*ns_, dev, 0, 16); }},
-      {"EEPROM access", [&] { WriteEeprom(*ns_, dev, 0x1234, 0, {1, 2}); }},
+      {"EEPROM access",
+       [&] {
+         WriteEeprom(*ns_, dev, 0x1234, 0, {1, 2});
+       }},
       {"register dumps", [&] { DumpRegisters(*ns_, dev); }},
       {"self tests", [&] { RunSelfTest(*ns_, dev, false); }},
       {"restarting autonegotiation", [&] { RestartNegotiation(*ns_, dev); }},
@@ -188,8 +198,8 @@ TEST_F(EthtoolTest, WhatVethLacksIsRefusedNamingTheDriver) {
       ADD_FAILURE() << c.what << ": no error";
     } catch (const Error& e) {
       EXPECT_EQ(e.Code(), EOPNOTSUPP) << e.what();
-      EXPECT_EQ(std::string(e.what()), "vmnic0: the driver veth does not support " +
-                                           std::string(c.what));
+      EXPECT_EQ(std::string(e.what()),
+                "vmnic0: the driver veth does not support " + std::string(c.what));
     }
   }
   // The same requests on a link that does not exist say so.

@@ -19,7 +19,9 @@ namespace {
 
 #include "EthtoolReplies.inc"
 
-template <std::size_t N> std::span<const uint8_t> Bytes(const uint8_t (&a)[N]) { return {a, N}; }
+template <std::size_t N> std::span<const uint8_t> Bytes(const uint8_t (&a)[N]) {
+  return {a, N};
+}
 
 TEST(EthtoolWire, RingsChannelsPauseAndCoalescingOfANic) {
   const Rings rings = ParseRings(Bytes(kRings));

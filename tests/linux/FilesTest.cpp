@@ -105,8 +105,8 @@ TEST_F(FilesTest, HostsEditsKeepEveryLineTheyDidNotWrite) {
                                      "10.1.0.5   web web.lab   # the web server\n");
   const auto entries = hosts.Entries();
   ASSERT_EQ(entries.size(), 3u);
-  EXPECT_EQ(entries[1].names, (std::vector<std::string>{"localhost", "ip6-localhost",
-                                                         "ip6-loopback"}));
+  EXPECT_EQ(entries[1].names,
+            (std::vector<std::string>{"localhost", "ip6-localhost", "ip6-loopback"}));
   EXPECT_EQ(entries[2].address, "10.1.0.5");
   EXPECT_EQ(entries[2].comment, "the web server");
   hosts.Add("2001:db8::6", {"db", "db.lab"}, "database");
@@ -151,8 +151,7 @@ TEST_F(FilesTest, RewritesKeepModeAndSymlinkAndCreateDirectories) {
   ASSERT_EQ(stat(real.c_str(), &st), 0);
   EXPECT_EQ(st.st_ino, before);
   // A refused edit writes nothing.
-  EXPECT_THROW(UpdateResolvConf(real, [](ResolvConf& c) { c.AddNameserver("192.0.2.1"); }),
-               Error);
+  EXPECT_THROW(UpdateResolvConf(real, [](ResolvConf& c) { c.AddNameserver("192.0.2.1"); }), Error);
   EXPECT_EQ(ReadTextFile(real), "nameserver 192.0.2.1");
   UpdateHostsFile(dir_ + "/netns/lab/hosts", [](HostsFile& h) { h.Add("10.0.0.1", {"a"}); });
   EXPECT_EQ(ReadTextFile(dir_ + "/netns/lab/hosts"), "10.0.0.1\ta\n");
@@ -164,8 +163,7 @@ TEST_F(FilesTest, AProcessKilledMidRewriteLeavesTheOldOrTheNewFile) {
   std::string a, b;
   for (int i = 0; i < 6000; ++i) {
     a += "nameserver 192.0.2." + std::to_string(i % 250) + "  # old " + std::to_string(i) + "\n";
-    b += "nameserver 198.51.100." + std::to_string(i % 250) + "  # new " + std::to_string(i) +
-         "\n";
+    b += "nameserver 198.51.100." + std::to_string(i % 250) + "  # new " + std::to_string(i) + "\n";
   }
   WriteFileAtomically(path, a);
   const unsigned seed = static_cast<unsigned>(
@@ -227,8 +225,9 @@ TEST_F(NamespaceFilesTest, ChangesAreWhatIpNetnsExecShowsTheNamespace) {
     c.AddSearchDomain("lab.example");
   });
   UpdateHostsFile(ns_->HostsPath(), [](HostsFile& h) { h.Add("10.1.0.5", {"web.lab", "web"}); });
-  EXPECT_EQ(Exec("cat /etc/resolv.conf").out,
-            "# lab resolver\nnameserver 192.0.2.53\nnameserver 198.51.100.53\nsearch lab.example\n");
+  EXPECT_EQ(
+      Exec("cat /etc/resolv.conf").out,
+      "# lab resolver\nnameserver 192.0.2.53\nnameserver 198.51.100.53\nsearch lab.example\n");
   EXPECT_EQ(Exec("cat /etc/hosts").out, "127.0.0.1\tlocalhost\n10.1.0.5\tweb.lab web\n");
   EXPECT_EQ(ResolvConf::Load(ns_->ResolvConfPath()).Nameservers(),
             (std::vector<std::string>{"192.0.2.53", "198.51.100.53"}));

@@ -30,15 +30,19 @@ template <typename F> void ExpectError(F&& body, int code, const std::string& me
 }
 
 /// ifname, address, prefix, scope, label, nodad, dynamic, valid lifetime.
-using AddressKey = std::tuple<std::string, std::string, int, std::string, std::string, bool, bool,
-                              uint32_t>;
+using AddressKey =
+    std::tuple<std::string, std::string, int, std::string, std::string, bool, bool, uint32_t>;
 
 std::string ScopeText(uint8_t scope) {
   switch (scope) {
-  case 0: return "global";
-  case 253: return "link";
-  case 254: return "host";
-  default: return std::to_string(scope);
+  case 0:
+    return "global";
+  case 253:
+    return "link";
+  case 254:
+    return "host";
+  default:
+    return std::to_string(scope);
   }
 }
 
@@ -143,10 +147,8 @@ TEST_F(RouteTest, MainTableMatchesIpRouteShow) {
   Ip("route add blackhole 203.0.113.0/24");
   Ip("route add 10.9.9.9 dev br0 metric 7");
   Ip("route add default via 10.1.0.1 proto dhcp");
-  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv4)),
-            OracleRoutes(IpJson("-4 route show"), 4));
-  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv6)),
-            OracleRoutes(IpJson("-6 route show"), 6));
+  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv4)), OracleRoutes(IpJson("-4 route show"), 4));
+  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv6)), OracleRoutes(IpJson("-6 route show"), 6));
   // The local table is not the main one.
   for (const Route& r : ListRoutes(*ns_))
     EXPECT_EQ(r.table, kMainTable);
@@ -249,7 +251,8 @@ TEST_F(NeighbourTest, AddAndDeleteReachTheKernel) {
   EXPECT_EQ(j[0]["state"][0], "STALE");
   EXPECT_TRUE(j[0].contains("router"));
 
-  ExpectError([&] { AddNeighbour(*ns_, spec); }, EEXIST, "neighbour 10.1.0.20 on br0: already exists");
+  ExpectError([&] { AddNeighbour(*ns_, spec); }, EEXIST,
+              "neighbour 10.1.0.20 on br0: already exists");
   spec.lladdr = ParseHwAddress("02:00:00:00:00:22");
   AddNeighbour(*ns_, spec, true);
   EXPECT_EQ(IpJson("neigh show 10.1.0.20")[0]["lladdr"], "02:00:00:00:00:22");

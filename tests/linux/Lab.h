@@ -40,7 +40,7 @@ protected:
   /// Runs COMMAND inside the namespace (ip netns exec).
   Output Exec(const std::string& command);
 
-  std::string name_;                      ///< The namespace's name.
+  std::string name_;                        ///< The namespace's name.
   std::unique_ptr<LinuxNet::Namespace> ns_; ///< The library's handle to it.
 };
 

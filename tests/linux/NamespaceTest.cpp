@@ -32,8 +32,8 @@ TEST(NamespaceNames, MissingAndMalformedNamesAreRefusedWithOneLine) {
       FAIL() << "opened " << bad;
     } catch (const Error& e) {
       EXPECT_EQ(e.Code(), EINVAL) << bad;
-      EXPECT_EQ(std::string(e.what()), "'" + std::string(bad) +
-                                           "' is not a valid network namespace name");
+      EXPECT_EQ(std::string(e.what()),
+                "'" + std::string(bad) + "' is not a valid network namespace name");
     }
   }
   const Namespace own = Namespace::Open("");

@@ -48,8 +48,9 @@ protected:
 /// "addr:port" as ss prints it, with wildcards as "*".
 std::string Endpoint(const IpAddress& a, uint16_t port) {
   const bool any = std::all_of(a.bytes.begin(), a.bytes.end(), [](uint8_t b) { return b == 0; });
-  const std::string host = any ? "*" : a.family == Family::Ipv6 ? "[" + a.ToString() + "]"
-                                                                 : a.ToString();
+  const std::string host = any                        ? "*"
+                           : a.family == Family::Ipv6 ? "[" + a.ToString() + "]"
+                                                      : a.ToString();
   return host + ":" + (port ? std::to_string(port) : "*");
 }
 

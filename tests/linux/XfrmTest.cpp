@@ -104,8 +104,8 @@ TEST_F(XfrmTest, StatesAddListAndDeleteAgreeWithIpXfrm) {
   } catch (const Error& e) {
     // Kernels without the ESP module refuse every state; the refusal must
     // name the state, and nothing may be left behind.
-    EXPECT_EQ(std::string(e.what()).rfind("the IPsec state esp spi 0x00000100 to 198.51.100.1: ", 0),
-              0u)
+    EXPECT_EQ(
+        std::string(e.what()).rfind("the IPsec state esp spi 0x00000100 to 198.51.100.1: ", 0), 0u)
         << e.what();
     EXPECT_TRUE(ListXfrmStates(*ns_).empty());
     EXPECT_EQ(Flat(Ip("xfrm state")), "");

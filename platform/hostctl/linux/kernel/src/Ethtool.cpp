@@ -39,8 +39,8 @@ std::span<const uint8_t> Bytes(const nlmsghdr* h) {
 MsgPtr Request(Namespace& ns, uint8_t cmd, const std::string& dev, uint32_t flags) {
   const int family = ns.Internals().EthtoolFamily();
   MsgPtr msg(nlmsg_alloc());
-  if (!msg || !genlmsg_put(msg.get(), NL_AUTO_PORT, NL_AUTO_SEQ, family, 0, 0, cmd,
-                           ETHTOOL_GENL_VERSION))
+  if (!msg ||
+      !genlmsg_put(msg.get(), NL_AUTO_PORT, NL_AUTO_SEQ, family, 0, 0, cmd, ETHTOOL_GENL_VERSION))
     throw Error(ENOMEM, "out of memory building an ethtool request");
   nlattr* header = nla_nest_start(msg.get(), kHeaderAttr);
   if (!header)
@@ -206,24 +206,23 @@ DriverInfo GetDriverInfo(Namespace& ns, const std::string& dev) {
 LinkSettings GetLinkSettings(Namespace& ns, const std::string& dev) {
   LinkSettings settings;
   settings.modes = Query(ns, dev, ETHTOOL_MSG_LINKMODES_GET, ETHTOOL_FLAG_COMPACT_BITSETS,
-                       "link settings", EthtoolWire::ParseLinkModes);
+                         "link settings", EthtoolWire::ParseLinkModes);
   try {
-    settings.info = Query(ns, dev, ETHTOOL_MSG_LINKINFO_GET, 0, "link information",
-                        EthtoolWire::ParseLinkInfo);
+    settings.info =
+        Query(ns, dev, ETHTOOL_MSG_LINKINFO_GET, 0, "link information", EthtoolWire::ParseLinkInfo);
   } catch (const Error& e) {
     if (e.Code() != EOPNOTSUPP)
       throw;
   }
   try {
-    settings.link = Query(ns, dev, ETHTOOL_MSG_LINKSTATE_GET, 0, "link state",
-                        [](std::span<const uint8_t> bytes) {
-                          GenlReply r(bytes, ETHTOOL_A_LINKSTATE_MAX);
-                          uint8_t link = 0;
-                          return r.tb[ETHTOOL_A_LINKSTATE_LINK] &&
-                                         Detail::Get(r.tb[ETHTOOL_A_LINKSTATE_LINK], link)
-                                     ? std::optional<bool>(link != 0)
-                                     : std::optional<bool>();
-                        });
+    settings.link = Query(
+        ns, dev, ETHTOOL_MSG_LINKSTATE_GET, 0, "link state", [](std::span<const uint8_t> bytes) {
+          GenlReply r(bytes, ETHTOOL_A_LINKSTATE_MAX);
+          uint8_t link = 0;
+          return r.tb[ETHTOOL_A_LINKSTATE_LINK] && Detail::Get(r.tb[ETHTOOL_A_LINKSTATE_LINK], link)
+                     ? std::optional<bool>(link != 0)
+                     : std::optional<bool>();
+        });
   } catch (const Error& e) {
     if (e.Code() != EOPNOTSUPP)
       throw;
@@ -258,9 +257,8 @@ void SetLinkSettings(Namespace& ns, const std::string& dev, const LinkSettingsCh
       }
     });
   if (change.port)
-    Set(ns, dev, ETHTOOL_MSG_LINKINFO_SET, "changing the port", [&](nl_msg* msg) {
-      Put(nla_put_u8(msg, ETHTOOL_A_LINKINFO_PORT, *change.port));
-    });
+    Set(ns, dev, ETHTOOL_MSG_LINKINFO_SET, "changing the port",
+        [&](nl_msg* msg) { Put(nla_put_u8(msg, ETHTOOL_A_LINKINFO_PORT, *change.port)); });
 }
 
 void RestartNegotiation(Namespace& ns, const std::string& dev) {
@@ -286,12 +284,12 @@ std::vector<Feature> GetFeatures(Namespace& ns, const std::string& dev) {
     std::vector<std::string> names;
     const auto* p = reinterpret_cast<const char*>(strings.data()) + sizeof(ethtool_gstrings);
     for (uint32_t i = 0; i < count; ++i)
-      names.emplace_back(p + i * ETH_GSTRING_LEN, strnlen(p + i * ETH_GSTRING_LEN, ETH_GSTRING_LEN));
+      names.emplace_back(p + i * ETH_GSTRING_LEN,
+                         strnlen(p + i * ETH_GSTRING_LEN, ETH_GSTRING_LEN));
     MsgPtr msg = Request(ns, ETHTOOL_MSG_FEATURES_GET, dev, ETHTOOL_FLAG_COMPACT_BITSETS);
     std::vector<Feature> features;
-    ns.Internals().Genl().Request(msg.get(), s, [&](nlmsghdr* h) {
-      features = EthtoolWire::ParseFeatures(Bytes(h), names);
-    });
+    ns.Internals().Genl().Request(
+        msg.get(), s, [&](nlmsghdr* h) { features = EthtoolWire::ParseFeatures(Bytes(h), names); });
     return features;
   });
 }
@@ -338,8 +336,7 @@ void SetFeatures(Namespace& ns, const std::string& dev,
     for (const auto& [name, on] : changes)
       if (f.name == name && f.active != on)
         throw Error(EOPNOTSUPP, dev + ": " + name + " stayed " + (on ? "off" : "on") +
-                                    " (it depends on a feature that is " +
-                                    (on ? "off)" : "on)"));
+                                    " (it depends on a feature that is " + (on ? "off)" : "on)"));
 }
 
 Offloads SummarizeOffloads(const std::vector<Feature>& features) {
@@ -402,7 +399,7 @@ void SetRings(Namespace& ns, const std::string& dev, const Rings& change) {
 
 Coalesce GetCoalesce(Namespace& ns, const std::string& dev) {
   return Query(ns, dev, ETHTOOL_MSG_COALESCE_GET, 0, "interrupt coalescing",
-             EthtoolWire::ParseCoalesce);
+               EthtoolWire::ParseCoalesce);
 }
 
 void SetCoalesce(Namespace& ns, const std::string& dev, const Coalesce& change) {
@@ -446,24 +443,22 @@ void SetPause(Namespace& ns, const std::string& dev, const Pause& change) {
 
 WakeOnLan GetWakeOnLan(Namespace& ns, const std::string& dev) {
   return Query(ns, dev, ETHTOOL_MSG_WOL_GET, ETHTOOL_FLAG_COMPACT_BITSETS, "wake-on-LAN",
-             EthtoolWire::ParseWakeOnLan);
+               EthtoolWire::ParseWakeOnLan);
 }
 
 void SetWakeOnLan(Namespace& ns, const std::string& dev, uint32_t modes) {
-  Set(ns, dev, ETHTOOL_MSG_WOL_SET, "wake-on-LAN", [&](nl_msg* msg) {
-    PutBitset(msg, ETHTOOL_A_WOL_MODES, WOL_MODE_COUNT, {modes});
-  });
+  Set(ns, dev, ETHTOOL_MSG_WOL_SET, "wake-on-LAN",
+      [&](nl_msg* msg) { PutBitset(msg, ETHTOOL_A_WOL_MODES, WOL_MODE_COUNT, {modes}); });
 }
 
 uint32_t GetMessageLevel(Namespace& ns, const std::string& dev) {
   return Query(ns, dev, ETHTOOL_MSG_DEBUG_GET, ETHTOOL_FLAG_COMPACT_BITSETS, "message levels",
-             EthtoolWire::ParseMessageLevel);
+               EthtoolWire::ParseMessageLevel);
 }
 
 void SetMessageLevel(Namespace& ns, const std::string& dev, uint32_t level) {
-  Set(ns, dev, ETHTOOL_MSG_DEBUG_SET, "message levels", [&](nl_msg* msg) {
-    PutBitset(msg, ETHTOOL_A_DEBUG_MSGMASK, 32, {level});
-  });
+  Set(ns, dev, ETHTOOL_MSG_DEBUG_SET, "message levels",
+      [&](nl_msg* msg) { PutBitset(msg, ETHTOOL_A_DEBUG_MSGMASK, 32, {level}); });
 }
 
 std::vector<uint8_t> ReadEeprom(Namespace& ns, const std::string& dev, uint32_t offset,

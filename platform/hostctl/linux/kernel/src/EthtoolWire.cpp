@@ -23,9 +23,11 @@ using namespace Detail;
 
 namespace Detail {
 
-GenlReply::GenlReply(std::span<const uint8_t> bytes, int max) : tb(static_cast<std::size_t>(max) + 1) {
+GenlReply::GenlReply(std::span<const uint8_t> bytes, int max)
+    : tb(static_cast<std::size_t>(max) + 1) {
   if (bytes.size() < NLMSG_HDRLEN + GENL_HDRLEN)
-    throw Error(EPROTO, "an ethtool reply of " + std::to_string(bytes.size()) + " bytes is too short");
+    throw Error(EPROTO,
+                "an ethtool reply of " + std::to_string(bytes.size()) + " bytes is too short");
   storage_.resize((bytes.size() + 7) / 8);
   memcpy(storage_.data(), bytes.data(), bytes.size());
   auto* h = reinterpret_cast<nlmsghdr*>(storage_.data());
@@ -140,7 +142,9 @@ template <typename T> T Head(std::span<const uint8_t> bytes, const char* what) {
   return t;
 }
 
-std::string Text(const char* p, std::size_t n) { return std::string(p, strnlen(p, n)); }
+std::string Text(const char* p, std::size_t n) {
+  return std::string(p, strnlen(p, n));
+}
 
 /// The names of a string set reply (struct ethtool_gstrings and its data).
 std::vector<std::string> Names(std::span<const uint8_t> bytes) {
@@ -326,7 +330,8 @@ std::vector<std::pair<std::string, uint64_t>> ParseStats(std::span<const uint8_t
   const auto s = Head<ethtool_stats>(stats, "statistics");
   const std::vector<std::string> labels = Names(names);
   std::vector<std::pair<std::string, uint64_t>> values;
-  const std::size_t n = std::min<std::size_t>(s.n_stats, (stats.size() - sizeof(ethtool_stats)) / 8);
+  const std::size_t n =
+      std::min<std::size_t>(s.n_stats, (stats.size() - sizeof(ethtool_stats)) / 8);
   for (std::size_t i = 0; i < n; ++i) {
     uint64_t value = 0;
     memcpy(&value, stats.data() + sizeof(ethtool_stats) + i * 8, 8);

@@ -24,10 +24,10 @@ private:
 
 /// An ethtool bitset in either of its forms.
 struct Bitset {
-  uint32_t size = 0;                ///< Number of bits.
-  bool noMask = false;              ///< A plain list (no mask).
-  std::vector<uint32_t> value;      ///< Bits set.
-  std::vector<uint32_t> mask;       ///< Bits present (verbose: listed).
+  uint32_t size = 0;                                   ///< Number of bits.
+  bool noMask = false;                                 ///< A plain list (no mask).
+  std::vector<uint32_t> value;                         ///< Bits set.
+  std::vector<uint32_t> mask;                          ///< Bits present (verbose: listed).
   std::vector<std::pair<uint32_t, std::string>> names; ///< Verbose form: bit and name.
 };
 Bitset ParseBitset(const nlattr* a);

@@ -1,6 +1,6 @@
 //===- Files.cpp - resolv.conf, hosts and atomic rewrites -----------------===//
-#include "LinuxNet/Error.h"
 #include "LinuxNet/Files.h"
+#include "LinuxNet/Error.h"
 #include "LinuxNet/Ip.h"
 
 #include <cerrno>
@@ -109,10 +109,14 @@ std::string DirOf(const std::string& path) {
   return slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
 }
 
-std::string BaseOf(const std::string& path) { return path.substr(path.find_last_of('/') + 1); }
+std::string BaseOf(const std::string& path) {
+  return path.substr(path.find_last_of('/') + 1);
+}
 
 /// Temporary files of a rewrite are named ".BASE.tmp-XXXXXX".
-std::string TempPrefix(const std::string& base) { return "." + base + ".tmp-"; }
+std::string TempPrefix(const std::string& base) {
+  return "." + base + ".tmp-";
+}
 
 } // namespace
 
@@ -124,7 +128,9 @@ ResolvConf ResolvConf::Parse(const std::string& text) {
   return conf;
 }
 
-ResolvConf ResolvConf::Load(const std::string& path) { return Parse(ReadTextFile(path)); }
+ResolvConf ResolvConf::Load(const std::string& path) {
+  return Parse(ReadTextFile(path));
+}
 
 std::vector<std::string> ResolvConf::Nameservers() const {
   std::vector<std::string> servers;
@@ -231,7 +237,9 @@ void ResolvConf::SetSearchDomains(const std::vector<std::string>& domains) {
   lines_ = std::move(kept);
 }
 
-std::string ResolvConf::Text() const { return JoinLines(lines_); }
+std::string ResolvConf::Text() const {
+  return JoinLines(lines_);
+}
 
 // --- hosts -------------------------------------------------------------------
 
@@ -261,7 +269,9 @@ HostsFile HostsFile::Parse(const std::string& text) {
   return hosts;
 }
 
-HostsFile HostsFile::Load(const std::string& path) { return Parse(ReadTextFile(path)); }
+HostsFile HostsFile::Load(const std::string& path) {
+  return Parse(ReadTextFile(path));
+}
 
 std::vector<HostsEntry> HostsFile::Entries() const {
   std::vector<HostsEntry> entries;
@@ -317,7 +327,9 @@ void HostsFile::Remove(const std::string& address, const std::string& name) {
     throw Error(ENOENT, "there is no hosts entry " + address + " " + name);
 }
 
-std::string HostsFile::Text() const { return JoinLines(lines_); }
+std::string HostsFile::Text() const {
+  return JoinLines(lines_);
+}
 
 // --- files -------------------------------------------------------------------
 

@@ -1,6 +1,6 @@
 //===- Ip.cpp - Address text and binary forms ------------------------------===//
-#include "LinuxNet/Error.h"
 #include "LinuxNet/Ip.h"
+#include "LinuxNet/Error.h"
 
 #include <arpa/inet.h>
 

@@ -139,14 +139,13 @@ Link ParseLink(nlmsghdr* h) {
   rtnl_link_stats64 s{};
   if (Get(tb[IFLA_STATS64], s)) {
     link.hasStats = true;
-    link.stats = {s.rx_packets,          s.tx_packets,         s.rx_bytes,
-                  s.tx_bytes,            s.rx_errors,          s.tx_errors,
-                  s.rx_dropped,          s.tx_dropped,         s.multicast,
-                  s.collisions,          s.rx_length_errors,   s.rx_over_errors,
-                  s.rx_crc_errors,       s.rx_frame_errors,    s.rx_fifo_errors,
-                  s.rx_missed_errors,    s.tx_aborted_errors,  s.tx_carrier_errors,
-                  s.tx_fifo_errors,      s.tx_heartbeat_errors, s.tx_window_errors,
-                  s.rx_compressed,       s.tx_compressed,      s.rx_nohandler};
+    link.stats = {
+        s.rx_packets,        s.tx_packets,        s.rx_bytes,         s.tx_bytes,
+        s.rx_errors,         s.tx_errors,         s.rx_dropped,       s.tx_dropped,
+        s.multicast,         s.collisions,        s.rx_length_errors, s.rx_over_errors,
+        s.rx_crc_errors,     s.rx_frame_errors,   s.rx_fifo_errors,   s.rx_missed_errors,
+        s.tx_aborted_errors, s.tx_carrier_errors, s.tx_fifo_errors,   s.tx_heartbeat_errors,
+        s.tx_window_errors,  s.rx_compressed,     s.tx_compressed,    s.rx_nohandler};
   }
   if (tb[IFLA_VFINFO_LIST])
     ParseVfs(tb[IFLA_VFINFO_LIST], link.address.size(), link.vfs);
@@ -168,11 +167,10 @@ MsgPtr LinkRequest(int flags, bool withVfs) {
 std::vector<Link> ListLinks(Namespace& ns, bool withVfs) {
   std::vector<Link> links;
   MsgPtr msg = LinkRequest(NLM_F_DUMP, withVfs);
-  ns.Internals().Route().Dump(msg.get(), {"the links", false},
-                              [&](nlmsghdr* h) {
-                                if (h->nlmsg_type == RTM_NEWLINK)
-                                  links.push_back(ParseLink(h));
-                              });
+  ns.Internals().Route().Dump(msg.get(), {"the links", false}, [&](nlmsghdr* h) {
+    if (h->nlmsg_type == RTM_NEWLINK)
+      links.push_back(ParseLink(h));
+  });
   return links;
 }
 

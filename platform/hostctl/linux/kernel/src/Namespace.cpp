@@ -27,7 +27,9 @@ namespace {
 
 constexpr const char* kNetnsDir = "/run/netns";
 
-std::string NamespacePath(const std::string& name) { return std::string(kNetnsDir) + "/" + name; }
+std::string NamespacePath(const std::string& name) {
+  return std::string(kNetnsDir) + "/" + name;
+}
 
 /// Refuses names that are not a single path component.
 void CheckName(const std::string& name) {
@@ -77,7 +79,9 @@ Namespace Namespace::Open(const std::string& name) {
   return Namespace(std::move(sockets));
 }
 
-const std::string& Namespace::Name() const { return sockets_->name; }
+const std::string& Namespace::Name() const {
+  return sockets_->name;
+}
 
 std::string Namespace::ResolvConfPath() const {
   return IsOwn() ? "/etc/resolv.conf" : "/etc/netns/" + Name() + "/resolv.conf";

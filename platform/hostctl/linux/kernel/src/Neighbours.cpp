@@ -1,6 +1,6 @@
 //===- Neighbours.cpp - Neighbour dumps and changes ------------------------===//
-#include "LinuxNet/Namespace.h"
 #include "LinuxNet/Neighbours.h"
+#include "LinuxNet/Namespace.h"
 
 #include "Attr.h"
 #include "Netlink.h"
@@ -39,8 +39,8 @@ void DumpFamily(Namespace& ns, Family family, const NameTable& names,
     Neighbour& n = neighbours.emplace_back();
     n.index = ndm->ndm_ifindex;
     n.device = names[n.index];
-    n.address = IpAddress::FromBytes(nla_data(tb[NDA_DST]),
-                                     static_cast<std::size_t>(nla_len(tb[NDA_DST])));
+    n.address =
+        IpAddress::FromBytes(nla_data(tb[NDA_DST]), static_cast<std::size_t>(nla_len(tb[NDA_DST])));
     if (tb[NDA_LLADDR]) {
       const auto* p = static_cast<const uint8_t*>(nla_data(tb[NDA_LLADDR]));
       n.lladdr.assign(p, p + nla_len(tb[NDA_LLADDR]));

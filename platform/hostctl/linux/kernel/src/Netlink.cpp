@@ -115,7 +115,8 @@ std::string ExtackText(const nlmsghdr* h) {
 int KeepError(sockaddr_nl*, nlmsgerr* e, void* arg) {
   auto* socket = static_cast<NlSocket*>(arg);
   socket->lastError = -e->error;
-  const auto* h = reinterpret_cast<const nlmsghdr*>(reinterpret_cast<const char*>(e) - NLMSG_HDRLEN);
+  const auto* h =
+      reinterpret_cast<const nlmsghdr*>(reinterpret_cast<const char*>(e) - NLMSG_HDRLEN);
   socket->lastText = ExtackText(h);
   return NL_STOP;
 }
@@ -140,10 +141,11 @@ void Fail(int err, const Subject& subject, const std::string& kernelText) {
   } else {
     // The kernel's words where they say more than the errno; plain ones for
     // the everyday refusals.
-    const bool plain = err == EEXIST || err == ENOENT || err == ESRCH || err == EADDRNOTAVAIL ||
-                       err == ENODEV;
+    const bool plain =
+        err == EEXIST || err == ENOENT || err == ESRCH || err == EADDRNOTAVAIL || err == ENODEV;
     std::string reason = kernelText.empty() || plain ? Reason(err) : kernelText;
-    if (!plain && !kernelText.empty() && reason.size() > 1 && isupper(static_cast<unsigned char>(reason[0])) &&
+    if (!plain && !kernelText.empty() && reason.size() > 1 &&
+        isupper(static_cast<unsigned char>(reason[0])) &&
         islower(static_cast<unsigned char>(reason[1])))
       reason[0] = static_cast<char>(tolower(static_cast<unsigned char>(reason[0])));
     message = subject.object + ": " + reason;
@@ -151,7 +153,9 @@ void Fail(int err, const Subject& subject, const std::string& kernelText) {
   throw Error(err, message);
 }
 
-void Invalid(const std::string& message) { throw Error(EINVAL, message); }
+void Invalid(const std::string& message) {
+  throw Error(EINVAL, message);
+}
 
 MsgPtr NewMsg(int type, int flags) {
   MsgPtr msg(nlmsg_alloc_simple(type, flags));
@@ -161,7 +165,8 @@ MsgPtr NewMsg(int type, int flags) {
 }
 
 AddrPtr ToNlAddr(const IpAddress& address, int prefixLength) {
-  AddrPtr a(nl_addr_build(static_cast<int>(address.family), address.bytes.data(), address.Length()));
+  AddrPtr a(
+      nl_addr_build(static_cast<int>(address.family), address.bytes.data(), address.Length()));
   if (!a)
     throw Error(ENOMEM, "out of memory building an address");
   if (prefixLength >= 0)
@@ -207,7 +212,9 @@ NlSocket::NlSocket(int protocol) {
   nl_socket_modify_err_cb(sk_, NL_CB_CUSTOM, KeepError, this);
 }
 
-NlSocket::~NlSocket() { nl_socket_free(sk_); }
+NlSocket::~NlSocket() {
+  nl_socket_free(sk_);
+}
 
 void NlSocket::Check(int rc, const Subject& subject) {
   const int err = lastError;
@@ -369,8 +376,8 @@ Entered::Entered(const Sockets& sockets) {
     return;
   saved_ = open("/proc/thread-self/ns/net", O_RDONLY | O_CLOEXEC);
   if (saved_ < 0)
-    throw Error(errno, std::string("cannot open this thread's network namespace: ") +
-                           strerror(errno));
+    throw Error(errno,
+                std::string("cannot open this thread's network namespace: ") + strerror(errno));
   if (setns(sockets.fd, CLONE_NEWNET) != 0) {
     const int err = errno;
     close(saved_);

@@ -87,10 +87,10 @@ private:
 
 /// The descriptor of a namespace and the sockets made in it.
 struct Sockets {
-  std::string name;   ///< "" for the process's own namespace.
-  int fd = -1;        ///< /run/netns/NAME, or -1 for the own namespace.
+  std::string name; ///< "" for the process's own namespace.
+  int fd = -1;      ///< /run/netns/NAME, or -1 for the own namespace.
   std::unique_ptr<NlSocket> route, genl, xfrm, diag;
-  int ioctlFd = -1;   ///< For SIOCETHTOOL.
+  int ioctlFd = -1;      ///< For SIOCETHTOOL.
   int ethtoolFamily = 0; ///< Generic netlink family id of "ethtool".
   ~Sockets();
 

@@ -1,6 +1,6 @@
 //===- Routes.cpp - Route dumps and changes --------------------------------===//
-#include "LinuxNet/Namespace.h"
 #include "LinuxNet/Routes.h"
+#include "LinuxNet/Namespace.h"
 
 #include "Attr.h"
 #include "Netlink.h"
@@ -150,10 +150,9 @@ void AddRoute(Namespace& ns, const RouteSpec& spec, bool replace) {
   rtnl_route_set_protocol(r.get(), spec.protocol);
   rtnl_route_set_type(r.get(), spec.type);
   uint8_t scope = spec.gateway.IsSet() || spec.type != RTN_UNICAST ? uint8_t{RT_SCOPE_UNIVERSE}
-                                                                    : uint8_t{RT_SCOPE_LINK};
+                                                                   : uint8_t{RT_SCOPE_LINK};
   rtnl_route_set_scope(r.get(), spec.scope.value_or(scope));
-  s.Check(rtnl_route_add(s.Get(), r.get(), replace ? NLM_F_REPLACE : NLM_F_EXCL),
-          {Describe(spec)});
+  s.Check(rtnl_route_add(s.Get(), r.get(), replace ? NLM_F_REPLACE : NLM_F_EXCL), {Describe(spec)});
 }
 
 void DeleteRoute(Namespace& ns, const RouteSpec& spec) {
@@ -168,48 +167,78 @@ void DeleteRoute(Namespace& ns, const RouteSpec& spec) {
 
 std::string RouteProtocolName(uint8_t protocol) {
   switch (protocol) {
-  case 0: return "unspec";
-  case 1: return "redirect";
-  case 2: return "kernel";
-  case 3: return "boot";
-  case 4: return "static";
-  case 8: return "gated";
-  case 9: return "ra";
-  case 10: return "mrt";
-  case 11: return "zebra";
-  case 12: return "bird";
-  case 13: return "dnrouted";
-  case 14: return "xorp";
-  case 15: return "ntk";
-  case 16: return "dhcp";
-  case 17: return "mrouted";
-  case 18: return "keepalived";
-  case 42: return "babel";
-  case 99: return "openr";
-  case 186: return "bgp";
-  case 187: return "isis";
-  case 188: return "ospf";
-  case 189: return "rip";
-  case 192: return "eigrp";
-  default: return std::to_string(protocol);
+  case 0:
+    return "unspec";
+  case 1:
+    return "redirect";
+  case 2:
+    return "kernel";
+  case 3:
+    return "boot";
+  case 4:
+    return "static";
+  case 8:
+    return "gated";
+  case 9:
+    return "ra";
+  case 10:
+    return "mrt";
+  case 11:
+    return "zebra";
+  case 12:
+    return "bird";
+  case 13:
+    return "dnrouted";
+  case 14:
+    return "xorp";
+  case 15:
+    return "ntk";
+  case 16:
+    return "dhcp";
+  case 17:
+    return "mrouted";
+  case 18:
+    return "keepalived";
+  case 42:
+    return "babel";
+  case 99:
+    return "openr";
+  case 186:
+    return "bgp";
+  case 187:
+    return "isis";
+  case 188:
+    return "ospf";
+  case 189:
+    return "rip";
+  case 192:
+    return "eigrp";
+  default:
+    return std::to_string(protocol);
   }
 }
 
 std::string RouteScopeName(uint8_t scope) {
   switch (scope) {
-  case 0: return "global";
-  case 200: return "site";
-  case 253: return "link";
-  case 254: return "host";
-  case 255: return "nowhere";
-  default: return std::to_string(scope);
+  case 0:
+    return "global";
+  case 200:
+    return "site";
+  case 253:
+    return "link";
+  case 254:
+    return "host";
+  case 255:
+    return "nowhere";
+  default:
+    return std::to_string(scope);
   }
 }
 
 std::string RouteTypeName(uint8_t type) {
-  static const char* const names[] = {"unspec",    "unicast",     "local",    "broadcast",
-                                      "anycast",   "multicast",   "blackhole", "unreachable",
-                                      "prohibit",  "throw",       "nat",      "xresolve"};
+  static const char* const names[] = {"unspec",   "unicast",   "local",     "broadcast",
+                                      "anycast",  "multicast", "blackhole", "unreachable",
+                                      "prohibit", "throw",     "nat",       "xresolve"};
   return type < std::size(names) ? names[type] : std::to_string(type);
 }
 

@@ -4,8 +4,8 @@
 // are built with libnl's message helpers and sent as SOCK_DIAG_BY_FAMILY.
 //
 //===----------------------------------------------------------------------===//
-#include "LinuxNet/Namespace.h"
 #include "LinuxNet/Sockets.h"
+#include "LinuxNet/Namespace.h"
 
 #include "Attr.h"
 #include "Netlink.h"
@@ -83,10 +83,9 @@ std::vector<Socket> ListSockets(Namespace& ns, const SocketQuery& query) {
 std::string SocketStateName(uint8_t protocol, uint8_t state) {
   if (protocol == IPPROTO_UDP && state == TcpClose)
     return "UNCONN";
-  static const char* const names[] = {"UNKNOWN",   "ESTAB",      "SYN-SENT",  "SYN-RECV",
-                                      "FIN-WAIT-1", "FIN-WAIT-2", "TIME-WAIT", "UNCONN",
-                                      "CLOSE-WAIT", "LAST-ACK",   "LISTEN",    "CLOSING",
-                                      "SYN-RECV"};
+  static const char* const names[] = {
+      "UNKNOWN", "ESTAB",      "SYN-SENT", "SYN-RECV", "FIN-WAIT-1", "FIN-WAIT-2", "TIME-WAIT",
+      "UNCONN",  "CLOSE-WAIT", "LAST-ACK", "LISTEN",   "CLOSING",    "SYN-RECV"};
   return state < std::size(names) ? names[state] : "UNKNOWN";
 }
 

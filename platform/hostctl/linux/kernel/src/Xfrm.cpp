@@ -1,6 +1,6 @@
 //===- Xfrm.cpp - IPsec states and policies through libnl-xfrm ------------===//
-#include "LinuxNet/Namespace.h"
 #include "LinuxNet/Xfrm.h"
+#include "LinuxNet/Namespace.h"
 
 #include "Netlink.h"
 
@@ -117,9 +117,8 @@ XfrmAlgorithm ReadAlgorithm(xfrmnl_sa* sa, bool integrity) {
   unsigned int bits = 0;
   unsigned int truncation = 0;
   std::vector<char> key(1024);
-  const int rc = integrity
-                     ? xfrmnl_sa_get_auth_params(sa, name, &bits, &truncation, key.data())
-                     : xfrmnl_sa_get_crypto_params(sa, name, &bits, key.data());
+  const int rc = integrity ? xfrmnl_sa_get_auth_params(sa, name, &bits, &truncation, key.data())
+                           : xfrmnl_sa_get_crypto_params(sa, name, &bits, key.data());
   XfrmAlgorithm alg;
   if (rc < 0)
     return alg;
@@ -188,9 +187,7 @@ void AddXfrmState(Namespace& ns, const XfrmState& state) {
   xfrmnl_ltime_cfg_set_soft_addexpires(life.get(), state.softLifetime);
   xfrmnl_ltime_cfg_set_hard_addexpires(life.get(), state.hardLifetime);
   xfrmnl_sa_set_lifetime_cfg(sa.get(), life.get());
-  auto keyText = [](const XfrmAlgorithm& a) {
-    return std::string(a.key.begin(), a.key.end());
-  };
+  auto keyText = [](const XfrmAlgorithm& a) { return std::string(a.key.begin(), a.key.end()); };
   if (!state.encryption.name.empty()) {
     const std::string key = keyText(state.encryption);
     xfrmnl_sa_set_crypto_params(sa.get(), state.encryption.name.c_str(),
@@ -199,8 +196,8 @@ void AddXfrmState(Namespace& ns, const XfrmState& state) {
   if (!state.integrity.name.empty()) {
     const std::string key = keyText(state.integrity);
     xfrmnl_sa_set_auth_params(sa.get(), state.integrity.name.c_str(),
-                              static_cast<unsigned>(key.size() * 8),
-                              state.integrity.truncationBits, key.data());
+                              static_cast<unsigned>(key.size() * 8), state.integrity.truncationBits,
+                              key.data());
   }
   s.Check(xfrmnl_sa_add(s.Get(), sa.get(), NLM_F_EXCL), {what});
 }

@@ -41,18 +41,18 @@ inline constexpr uint32_t kForever = 0xFFFFFFFFu;
 
 /// One address of a link.
 struct Address {
-  int index = 0;                   ///< Interface index.
-  std::string device;              ///< Interface name.
-  IpAddress local;                 ///< The address (IFA_LOCAL, else IFA_ADDRESS).
-  IpAddress peer;                  ///< Peer of a point-to-point address; unset otherwise.
-  uint8_t prefixLength = 0;        ///< Prefix length.
-  uint8_t scope = 0;               ///< 0 global, 200 site, 253 link, 254 host.
-  uint32_t flags = 0;              ///< AddressFlag bits.
-  IpAddress broadcast;             ///< IPv4 broadcast; unset when none.
-  std::string label;               ///< IPv4 label ("br0:1").
+  int index = 0;                         ///< Interface index.
+  std::string device;                    ///< Interface name.
+  IpAddress local;                       ///< The address (IFA_LOCAL, else IFA_ADDRESS).
+  IpAddress peer;                        ///< Peer of a point-to-point address; unset otherwise.
+  uint8_t prefixLength = 0;              ///< Prefix length.
+  uint8_t scope = 0;                     ///< 0 global, 200 site, 253 link, 254 host.
+  uint32_t flags = 0;                    ///< AddressFlag bits.
+  IpAddress broadcast;                   ///< IPv4 broadcast; unset when none.
+  std::string label;                     ///< IPv4 label ("br0:1").
   uint32_t validLifetime = kForever;     ///< Seconds left, or kForever.
   uint32_t preferredLifetime = kForever; ///< Seconds left, or kForever.
-  uint8_t protocol = 0;            ///< IFA_PROTO (0 unknown, 1 loopback, 2 RA, 3 link-local).
+  uint8_t protocol = 0;                  ///< IFA_PROTO (0 unknown, 1 loopback, 2 RA, 3 link-local).
 
   bool IsPermanent() const { return flags & AddrPermanent; }
   /// Expires unless renewed: set by DHCP or autoconfiguration.
@@ -64,14 +64,14 @@ std::vector<Address> ListAddresses(Namespace& ns, Family family = Family::None);
 
 /// An address to add.
 struct AddressSpec {
-  std::string device;      ///< Interface name.
-  IpPrefix prefix;         ///< Address and prefix length.
-  IpAddress broadcast;     ///< IPv4 broadcast; unset for none.
-  std::optional<uint8_t> scope; ///< Unset: the kernel's choice (global).
-  bool noDad = false;      ///< IPv6: skip duplicate address detection.
+  std::string device;                    ///< Interface name.
+  IpPrefix prefix;                       ///< Address and prefix length.
+  IpAddress broadcast;                   ///< IPv4 broadcast; unset for none.
+  std::optional<uint8_t> scope;          ///< Unset: the kernel's choice (global).
+  bool noDad = false;                    ///< IPv6: skip duplicate address detection.
   uint32_t validLifetime = kForever;     ///< Seconds.
   uint32_t preferredLifetime = kForever; ///< Seconds.
-  std::string label;       ///< IPv4 label; empty for the device name.
+  std::string label;                     ///< IPv4 label; empty for the device name.
 };
 /// Adds an address; refuses one the link has already.
 void AddAddress(Namespace& ns, const AddressSpec& spec);

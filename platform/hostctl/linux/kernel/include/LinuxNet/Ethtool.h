@@ -28,42 +28,50 @@ class Namespace;
 
 /// Driver information (ETHTOOL_GDRVINFO).
 struct DriverInfo {
-  std::string driver;          ///< Driver name ("veth", "ixgbe").
-  std::string version;         ///< Driver version.
-  std::string firmwareVersion; ///< Firmware version; empty when none.
-  std::string busInfo;         ///< Bus address ("0000:3b:00.0"); empty when none.
+  std::string driver;              ///< Driver name ("veth", "ixgbe").
+  std::string version;             ///< Driver version.
+  std::string firmwareVersion;     ///< Firmware version; empty when none.
+  std::string busInfo;             ///< Bus address ("0000:3b:00.0"); empty when none.
   std::string expansionRomVersion; ///< Expansion ROM version.
-  uint32_t statsCount = 0;     ///< Number of driver statistics.
-  uint32_t testCount = 0;      ///< Number of self-test results.
-  uint32_t eepromLength = 0;   ///< EEPROM size in bytes; 0 when none.
-  uint32_t registerLength = 0; ///< Register dump size in bytes; 0 when none.
+  uint32_t statsCount = 0;         ///< Number of driver statistics.
+  uint32_t testCount = 0;          ///< Number of self-test results.
+  uint32_t eepromLength = 0;       ///< EEPROM size in bytes; 0 when none.
+  uint32_t registerLength = 0;     ///< Register dump size in bytes; 0 when none.
 };
 DriverInfo GetDriverInfo(Namespace& ns, const std::string& dev);
 
 /// Duplex codes.
 enum : uint8_t { DuplexHalf = 0, DuplexFull = 1, DuplexUnknown = 0xff };
 /// Port codes (PORT_*).
-enum : uint8_t { PortTp = 0, PortAui = 1, PortBnc = 2, PortMii = 3, PortFibre = 4, PortDa = 5,
-                 PortNone = 0xef, PortOther = 0xff };
+enum : uint8_t {
+  PortTp = 0,
+  PortAui = 1,
+  PortBnc = 2,
+  PortMii = 3,
+  PortFibre = 4,
+  PortDa = 5,
+  PortNone = 0xef,
+  PortOther = 0xff
+};
 
 /// Speed, duplex and negotiation (ETHTOOL_MSG_LINKMODES_GET).
 struct LinkModes {
-  int ifindex = 0;                  ///< The link (filled by dumps).
-  std::string device;               ///< Its name (filled by dumps).
-  bool autoneg = false;             ///< Autonegotiation is on.
-  uint32_t speed = 0;               ///< Mbps; 0 when unknown (no link).
-  uint8_t duplex = DuplexUnknown;   ///< DuplexHalf, DuplexFull or DuplexUnknown.
-  uint32_t lanes = 0;               ///< Lanes; 0 when not reported.
-  std::vector<uint32_t> supported;  ///< Link mode bits the device supports.
-  std::vector<uint32_t> advertised; ///< Link mode bits it advertises.
+  int ifindex = 0;                      ///< The link (filled by dumps).
+  std::string device;                   ///< Its name (filled by dumps).
+  bool autoneg = false;                 ///< Autonegotiation is on.
+  uint32_t speed = 0;                   ///< Mbps; 0 when unknown (no link).
+  uint8_t duplex = DuplexUnknown;       ///< DuplexHalf, DuplexFull or DuplexUnknown.
+  uint32_t lanes = 0;                   ///< Lanes; 0 when not reported.
+  std::vector<uint32_t> supported;      ///< Link mode bits the device supports.
+  std::vector<uint32_t> advertised;     ///< Link mode bits it advertises.
   std::vector<uint32_t> peerAdvertised; ///< Bits the link partner advertises.
 };
 /// Port and transceiver (ETHTOOL_MSG_LINKINFO_GET).
 struct LinkInfo {
-  uint8_t port = PortOther;   ///< Port code.
-  uint8_t phyAddress = 0;     ///< PHY address.
-  uint8_t transceiver = 0;    ///< 0 internal, 1 external.
-  uint8_t mdix = 0;           ///< ETH_TP_MDI_* state.
+  uint8_t port = PortOther; ///< Port code.
+  uint8_t phyAddress = 0;   ///< PHY address.
+  uint8_t transceiver = 0;  ///< 0 internal, 1 external.
+  uint8_t mdix = 0;         ///< ETH_TP_MDI_* state.
 };
 /// Both, and the link state.
 struct LinkSettings {
@@ -77,11 +85,11 @@ std::vector<LinkModes> DumpLinkModes(Namespace& ns);
 
 /// What SetLinkSettings changes.
 struct LinkSettingsChange {
-  std::optional<bool> autoneg;                   ///< Autonegotiation on or off.
-  std::optional<uint32_t> speed;                 ///< Mbps (with autoneg off).
-  std::optional<uint8_t> duplex;                 ///< DuplexHalf or DuplexFull.
+  std::optional<bool> autoneg;                     ///< Autonegotiation on or off.
+  std::optional<uint32_t> speed;                   ///< Mbps (with autoneg off).
+  std::optional<uint8_t> duplex;                   ///< DuplexHalf or DuplexFull.
   std::optional<std::vector<uint32_t>> advertised; ///< Link mode bits to advertise.
-  std::optional<uint8_t> port;                   ///< Port code.
+  std::optional<uint8_t> port;                     ///< Port code.
 };
 void SetLinkSettings(Namespace& ns, const std::string& dev, const LinkSettingsChange& change);
 /// Restarts autonegotiation (ETHTOOL_NWAY_RST).
@@ -145,8 +153,7 @@ struct Coalesce {
   std::optional<uint32_t> statsBlockUsecs;
   std::optional<bool> adaptiveRx, adaptiveTx;
   std::optional<uint32_t> pktRateLow, rxUsecsLow, rxMaxFramesLow, txUsecsLow, txMaxFramesLow;
-  std::optional<uint32_t> pktRateHigh, rxUsecsHigh, rxMaxFramesHigh, txUsecsHigh,
-      txMaxFramesHigh;
+  std::optional<uint32_t> pktRateHigh, rxUsecsHigh, rxMaxFramesHigh, txUsecsHigh, txMaxFramesHigh;
   std::optional<uint32_t> sampleInterval;
 };
 Coalesce GetCoalesce(Namespace& ns, const std::string& dev);
@@ -188,7 +195,7 @@ RegisterDump DumpRegisters(Namespace& ns, const std::string& dev);
 
 /// A self-test run.
 struct SelfTestResult {
-  bool failed = false; ///< The driver reported a failure.
+  bool failed = false;                                   ///< The driver reported a failure.
   std::vector<std::pair<std::string, uint64_t>> results; ///< Test name and result (0 passed).
 };
 /// Runs the self test; \p offline also runs the tests that interrupt traffic.

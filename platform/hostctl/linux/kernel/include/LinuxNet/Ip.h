@@ -19,7 +19,7 @@ enum class Family : uint8_t { None = 0, Ipv4 = 2, Ipv6 = 10 };
 
 /// An IPv4 or IPv6 address; a default one is unset (Family::None).
 struct IpAddress {
-  Family family = Family::None;   ///< Which of the two, or None.
+  Family family = Family::None;    ///< Which of the two, or None.
   std::array<uint8_t, 16> bytes{}; ///< Network order; IPv4 uses the first 4.
 
   /// Parses dotted-quad IPv4 or RFC 4291 IPv6 text.
@@ -30,7 +30,9 @@ struct IpAddress {
   static IpAddress FromBytes(const void* data, std::size_t length);
 
   bool IsSet() const { return family != Family::None; }
-  std::size_t Length() const { return family == Family::Ipv4 ? 4 : family == Family::Ipv6 ? 16 : 0; }
+  std::size_t Length() const {
+    return family == Family::Ipv4 ? 4 : family == Family::Ipv6 ? 16 : 0;
+  }
   /// Canonical text ("10.0.0.1", "2001:db8::1"); empty when unset.
   std::string ToString() const;
   bool operator==(const IpAddress&) const = default;

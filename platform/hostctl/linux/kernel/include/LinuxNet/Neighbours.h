@@ -25,17 +25,17 @@ enum NeighbourState : uint16_t {
 
 /// One neighbour cache entry.
 struct Neighbour {
-  int index = 0;          ///< Interface index.
-  std::string device;     ///< Interface name.
-  IpAddress address;      ///< The neighbour's address.
-  HwAddress lladdr;       ///< Its link-layer address; empty while unresolved.
-  uint16_t state = 0;     ///< NeighbourState bits.
-  uint8_t flags = 0;      ///< NTF_* (0x80 router, 0x08 proxy, 0x02 self).
-  uint8_t type = 0;       ///< RTN_* of the entry.
+  int index = 0;             ///< Interface index.
+  std::string device;        ///< Interface name.
+  IpAddress address;         ///< The neighbour's address.
+  HwAddress lladdr;          ///< Its link-layer address; empty while unresolved.
+  uint16_t state = 0;        ///< NeighbourState bits.
+  uint8_t flags = 0;         ///< NTF_* (0x80 router, 0x08 proxy, 0x02 self).
+  uint8_t type = 0;          ///< RTN_* of the entry.
   uint32_t confirmedAge = 0; ///< Hundredths of a second since last confirmed.
-  uint32_t usedAge = 0;   ///< Hundredths of a second since last used.
-  uint32_t updatedAge = 0; ///< Hundredths of a second since last updated.
-  uint32_t probes = 0;    ///< Probes sent.
+  uint32_t usedAge = 0;      ///< Hundredths of a second since last used.
+  uint32_t updatedAge = 0;   ///< Hundredths of a second since last updated.
+  uint32_t probes = 0;       ///< Probes sent.
 };
 
 /// The neighbours of \p family or of both, NOARP entries (multicast,
@@ -44,11 +44,11 @@ std::vector<Neighbour> ListNeighbours(Namespace& ns, Family family = Family::Non
 
 /// A neighbour to add.
 struct NeighbourSpec {
-  std::string device;             ///< Interface name.
-  IpAddress address;              ///< Neighbour address.
-  HwAddress lladdr;               ///< Link-layer address.
-  uint16_t state = NudPermanent;  ///< State to give the entry.
-  bool router = false;            ///< IPv6: the neighbour is a router.
+  std::string device;            ///< Interface name.
+  IpAddress address;             ///< Neighbour address.
+  HwAddress lladdr;              ///< Link-layer address.
+  uint16_t state = NudPermanent; ///< State to give the entry.
+  bool router = false;           ///< IPv6: the neighbour is a router.
 };
 /// Adds an entry; refuses one that exists, unless \p replace.
 void AddNeighbour(Namespace& ns, const NeighbourSpec& spec, bool replace = false);

@@ -22,8 +22,8 @@ inline constexpr uint32_t kMainTable = 254;
 
 /// One next hop of a multipath route.
 struct NextHop {
-  IpAddress gateway; ///< Unset for a directly connected hop.
-  int index = 0;     ///< Outgoing interface index.
+  IpAddress gateway;  ///< Unset for a directly connected hop.
+  int index = 0;      ///< Outgoing interface index.
   std::string device; ///< Its name.
   uint8_t weight = 1; ///< Relative weight.
   uint8_t flags = 0;  ///< RTNH_F_* (1 dead, 4 onlink, 16 linkdown).
@@ -32,18 +32,18 @@ struct NextHop {
 /// One route.
 struct Route {
   Family family = Family::None; ///< IPv4 or IPv6.
-  IpPrefix destination;  ///< Destination; length 0 is the default route.
-  IpAddress gateway;     ///< Next hop; unset for a directly connected route.
-  int index = 0;         ///< Outgoing interface index; 0 for none (blackhole) or multipath.
-  std::string device;    ///< Its name.
-  uint8_t protocol = 0;  ///< RTPROT_* (2 kernel, 3 boot, 4 static, 16 dhcp, 9 ra).
-  uint8_t scope = 0;     ///< RT_SCOPE_* (0 universe, 253 link, 254 host).
-  uint8_t type = 0;      ///< RTN_* (1 unicast, 2 local, 3 broadcast, 6 blackhole, 7 unreachable).
-  uint32_t table = 0;    ///< Routing table.
-  uint32_t metric = 0;   ///< RTA_PRIORITY.
-  IpAddress prefSource;  ///< Preferred source address; unset when none.
-  uint32_t flags = 0;    ///< rtm_flags (RTNH_F_* of a single hop, RTM_F_*).
-  uint32_t mtu = 0;      ///< Path MTU metric; 0 when none.
+  IpPrefix destination;         ///< Destination; length 0 is the default route.
+  IpAddress gateway;            ///< Next hop; unset for a directly connected route.
+  int index = 0;                ///< Outgoing interface index; 0 for none (blackhole) or multipath.
+  std::string device;           ///< Its name.
+  uint8_t protocol = 0;         ///< RTPROT_* (2 kernel, 3 boot, 4 static, 16 dhcp, 9 ra).
+  uint8_t scope = 0;            ///< RT_SCOPE_* (0 universe, 253 link, 254 host).
+  uint8_t type = 0;     ///< RTN_* (1 unicast, 2 local, 3 broadcast, 6 blackhole, 7 unreachable).
+  uint32_t table = 0;   ///< Routing table.
+  uint32_t metric = 0;  ///< RTA_PRIORITY.
+  IpAddress prefSource; ///< Preferred source address; unset when none.
+  uint32_t flags = 0;   ///< rtm_flags (RTNH_F_* of a single hop, RTM_F_*).
+  uint32_t mtu = 0;     ///< Path MTU metric; 0 when none.
   std::vector<NextHop> nextHops; ///< Hops of a multipath route; empty otherwise.
 };
 
@@ -53,15 +53,15 @@ std::vector<Route> ListRoutes(Namespace& ns, Family family = Family::None,
 
 /// A route to add or delete. For a delete, unset members match any route.
 struct RouteSpec {
-  IpPrefix destination;   ///< Destination.
-  IpAddress gateway;      ///< Next hop; unset for a direct route.
-  std::string device;     ///< Outgoing interface; empty lets the kernel find it.
-  uint32_t metric = 0;    ///< 0: the kernel's default (0 for IPv4, 1024 for IPv6).
-  uint8_t protocol = 4;   ///< RTPROT_STATIC unless told otherwise.
-  uint8_t type = 1;       ///< RTN_UNICAST unless told otherwise.
+  IpPrefix destination;         ///< Destination.
+  IpAddress gateway;            ///< Next hop; unset for a direct route.
+  std::string device;           ///< Outgoing interface; empty lets the kernel find it.
+  uint32_t metric = 0;          ///< 0: the kernel's default (0 for IPv4, 1024 for IPv6).
+  uint8_t protocol = 4;         ///< RTPROT_STATIC unless told otherwise.
+  uint8_t type = 1;             ///< RTN_UNICAST unless told otherwise.
   std::optional<uint8_t> scope; ///< Unset: link for a direct route, universe otherwise.
-  IpAddress prefSource;   ///< Preferred source; unset for none.
-  uint32_t table = kMainTable; ///< Routing table.
+  IpAddress prefSource;         ///< Preferred source; unset for none.
+  uint32_t table = kMainTable;  ///< Routing table.
 };
 /// Adds a route; refuses one that exists, unless \p replace.
 void AddRoute(Namespace& ns, const RouteSpec& spec, bool replace = false);

@@ -27,34 +27,34 @@ enum : uint8_t { XfrmAllow = 0, XfrmBlock = 1 };
 
 /// Traffic a state or policy applies to.
 struct XfrmSelector {
-  IpPrefix source;          ///< Source network.
-  IpPrefix destination;     ///< Destination network.
-  uint16_t sourcePort = 0;  ///< 0: any.
+  IpPrefix source;              ///< Source network.
+  IpPrefix destination;         ///< Destination network.
+  uint16_t sourcePort = 0;      ///< 0: any.
   uint16_t destinationPort = 0; ///< 0: any.
-  uint8_t protocol = 0;     ///< Upper-layer protocol; 0: any.
-  int ifindex = 0;          ///< Interface; 0: any.
+  uint8_t protocol = 0;         ///< Upper-layer protocol; 0: any.
+  int ifindex = 0;              ///< Interface; 0: any.
 };
 
 /// A cipher or integrity algorithm with its key.
 struct XfrmAlgorithm {
-  std::string name;          ///< Kernel name ("cbc(aes)", "hmac(sha256)"); empty for none.
-  std::vector<uint8_t> key;  ///< Key bytes.
+  std::string name;            ///< Kernel name ("cbc(aes)", "hmac(sha256)"); empty for none.
+  std::vector<uint8_t> key;    ///< Key bytes.
   uint32_t truncationBits = 0; ///< Integrity: truncated ICV length; 0 for the default.
 };
 
 /// One security association.
 struct XfrmState {
-  IpAddress source;          ///< Outer source.
-  IpAddress destination;     ///< Outer destination.
-  uint32_t spi = 0;          ///< Security parameter index (host order).
-  uint8_t protocol = XfrmEsp; ///< XfrmEsp or XfrmAh.
+  IpAddress source;             ///< Outer source.
+  IpAddress destination;        ///< Outer destination.
+  uint32_t spi = 0;             ///< Security parameter index (host order).
+  uint8_t protocol = XfrmEsp;   ///< XfrmEsp or XfrmAh.
   uint8_t mode = XfrmTransport; ///< XfrmTransport or XfrmTunnel.
-  uint32_t reqid = 0;        ///< Request id tying it to policies.
-  XfrmAlgorithm encryption;  ///< Cipher.
-  XfrmAlgorithm integrity;   ///< Integrity algorithm.
-  uint64_t softLifetime = 0; ///< Seconds after adding until renegotiation; 0 for none.
-  uint64_t hardLifetime = 0; ///< Seconds after adding until removal; 0 for none.
-  XfrmSelector selector;     ///< Traffic; empty for any.
+  uint32_t reqid = 0;           ///< Request id tying it to policies.
+  XfrmAlgorithm encryption;     ///< Cipher.
+  XfrmAlgorithm integrity;      ///< Integrity algorithm.
+  uint64_t softLifetime = 0;    ///< Seconds after adding until renegotiation; 0 for none.
+  uint64_t hardLifetime = 0;    ///< Seconds after adding until removal; 0 for none.
+  XfrmSelector selector;        ///< Traffic; empty for any.
 };
 
 /// One template of a policy: the state traffic must pass.
@@ -69,11 +69,11 @@ struct XfrmTemplate {
 
 /// One security policy.
 struct XfrmPolicy {
-  XfrmSelector selector;     ///< Traffic.
-  uint8_t direction = XfrmOut; ///< XfrmIn, XfrmOut or XfrmFwd.
-  uint8_t action = XfrmAllow; ///< XfrmAllow or XfrmBlock.
-  uint32_t priority = 0;     ///< Lower wins.
-  uint32_t index = 0;        ///< The kernel's id (read only; set when listed).
+  XfrmSelector selector;               ///< Traffic.
+  uint8_t direction = XfrmOut;         ///< XfrmIn, XfrmOut or XfrmFwd.
+  uint8_t action = XfrmAllow;          ///< XfrmAllow or XfrmBlock.
+  uint32_t priority = 0;               ///< Lower wins.
+  uint32_t index = 0;                  ///< The kernel's id (read only; set when listed).
   std::vector<XfrmTemplate> templates; ///< States the traffic needs.
 };
 
