@@ -127,7 +127,8 @@ TEST_F(FilesTest, HostsEditsKeepEveryLineTheyDidNotWrite) {
                           "::1\tlocalhost ip6-localhost ip6-loopback\n"
                           "# lab hosts\n");
   EXPECT_TRUE(IsValidHostName("a-b.example"));
-  for (const char* bad : {"", "-a", "a-", "a..b", "a b", std::string(64, 'x').c_str()})
+  for (const std::string& bad :
+       std::vector<std::string>{"", "-a", "a-", "a..b", "a b", std::string(64, 'x')})
     EXPECT_FALSE(IsValidHostName(bad)) << bad;
 }
 

@@ -151,4 +151,51 @@ TEST_F(LinksTest, BridgesAndTheirPortsAgreeWithBridgeLink) {
   EXPECT_EQ(IpJson("link show").size(), 6u);
 }
 
+#include "LinkReplies.inc"
+
+TEST(LinkMessage, SriovFunctionsParentDeviceAndOlderCounters) {
+  const Link link = ParseLinkMessage({kSriovLink, sizeof kSriovLink});
+  EXPECT_EQ(link.name, "eth2");
+  EXPECT_EQ(link.index, 3);
+  EXPECT_EQ(link.mtu, 9000u);
+  EXPECT_TRUE(link.adminUp);
+  EXPECT_TRUE(link.lowerUp);
+  EXPECT_TRUE(link.carrier);
+  EXPECT_EQ(link.operState, OperState::Up);
+  EXPECT_EQ(FormatHwAddress(link.address), "3c:fd:fe:12:34:56");
+  EXPECT_EQ(link.permAddress, link.address);
+  EXPECT_EQ(link.parentDevice, "0000:3b:00.0");
+  EXPECT_EQ(link.parentBus, "pci");
+  EXPECT_EQ(link.kind, "");
+  EXPECT_EQ(link.altNames, std::vector<std::string>{"enp59s0f0"});
+  // 23 counters of an older kernel: those it sent, and zero for the rest.
+  ASSERT_TRUE(link.hasStats);
+  EXPECT_EQ(link.stats.rxPackets, 1000u);
+  EXPECT_EQ(link.stats.txWindowErrors, 1020u);
+  EXPECT_EQ(link.stats.txCompressed, 1022u);
+  EXPECT_EQ(link.stats.rxNoHandler, 0u);
+
+  EXPECT_EQ(link.numVfs, 2u);
+  ASSERT_EQ(link.vfs.size(), 2u);
+  const VfInfo& vf0 = link.vfs[0];
+  EXPECT_EQ(vf0.index, 0u);
+  EXPECT_EQ(FormatHwAddress(vf0.mac), "02:00:00:00:00:10");
+  EXPECT_EQ(vf0.vlan, 100u);
+  EXPECT_EQ(vf0.qos, 3u);
+  EXPECT_EQ(vf0.maxTxRate, 1000u);
+  EXPECT_EQ(vf0.spoofCheck, 1);
+  EXPECT_EQ(vf0.trust, 0);
+  EXPECT_EQ(vf0.linkState, 2u);
+  ASSERT_TRUE(vf0.hasStats);
+  EXPECT_EQ(vf0.rxPackets, 10u);
+  EXPECT_EQ(vf0.txBytes, 2000u);
+  EXPECT_EQ(link.vfs[1].index, 1u);
+  EXPECT_EQ(link.vfs[1].trust, 1);
+
+  EXPECT_THROW(ParseLinkMessage({kSriovLink, 20}), Error);
+  std::vector<uint8_t> lying(kSriovLink, kSriovLink + sizeof kSriovLink);
+  lying[1] = 0x7f; // a length beyond the bytes
+  EXPECT_THROW(ParseLinkMessage(lying), Error);
+}
+
 } // namespace

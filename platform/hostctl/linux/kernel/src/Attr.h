@@ -8,6 +8,7 @@
 
 #include <netlink/attr.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <cstring>
 #include <string>
@@ -19,6 +20,16 @@ template <typename T> bool Get(const nlattr* a, T& out) {
   if (!a || nla_len(a) < static_cast<int>(sizeof(T)))
     return false;
   memcpy(&out, nla_data(a), sizeof(T));
+  return true;
+}
+
+/// Copies a structure that grows with kernel versions: a shorter payload
+/// (older kernel) fills the front, a longer one (newer kernel) is cut.
+template <typename T> bool GetGrowing(const nlattr* a, T& out) {
+  if (!a)
+    return false;
+  out = T{};
+  memcpy(&out, nla_data(a), std::min(sizeof(T), static_cast<std::size_t>(nla_len(a))));
   return true;
 }
 

@@ -335,8 +335,7 @@ void SetFeatures(Namespace& ns, const std::string& dev,
   for (const Feature& f : GetFeatures(ns, dev))
     for (const auto& [name, on] : changes)
       if (f.name == name && f.active != on)
-        throw Error(EOPNOTSUPP, dev + ": " + name + " stayed " + (on ? "off" : "on") +
-                                    " (it depends on a feature that is " + (on ? "off)" : "on)"));
+        throw Error(EOPNOTSUPP, dev + ": the driver left " + name + (on ? " off" : " on"));
 }
 
 Offloads SummarizeOffloads(const std::vector<Feature>& features) {

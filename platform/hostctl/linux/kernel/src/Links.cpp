@@ -39,6 +39,8 @@ HwAddress HwBytes(const nlattr* a) {
   return HwAddress(p, p + nla_len(a));
 }
 
+Link ParseLink(nlmsghdr* h);
+
 void ParseVfs(const nlattr* list, std::size_t macLength, std::vector<VfInfo>& vfs) {
   int remaining = 0;
   const nlattr* vf = nullptr;
@@ -92,6 +94,23 @@ void ParseVfs(const nlattr* list, std::size_t macLength, std::vector<VfInfo>& vf
   }
 }
 
+} // namespace
+
+Link ParseLinkMessage(std::span<const uint8_t> message) {
+  if (message.size() < NLMSG_HDRLEN + sizeof(ifinfomsg) || message.size() > (1u << 20))
+    throw Error(EPROTO,
+                "a link message of " + std::to_string(message.size()) + " bytes cannot be read");
+  std::vector<uint64_t> storage((message.size() + 7) / 8);
+  std::copy(message.begin(), message.end(), reinterpret_cast<uint8_t*>(storage.data()));
+  auto* h = reinterpret_cast<nlmsghdr*>(storage.data());
+  if (h->nlmsg_type != RTM_NEWLINK || h->nlmsg_len > message.size() ||
+      h->nlmsg_len < NLMSG_HDRLEN + sizeof(ifinfomsg))
+    throw Error(EPROTO, "a link message is malformed");
+  return ParseLink(h);
+}
+
+namespace {
+
 Link ParseLink(nlmsghdr* h) {
   Link link;
   const auto* ifi = static_cast<const ifinfomsg*>(nlmsg_data(h));
@@ -137,7 +156,7 @@ Link ParseLink(nlmsghdr* h) {
     }
   }
   rtnl_link_stats64 s{};
-  if (Get(tb[IFLA_STATS64], s)) {
+  if (GetGrowing(tb[IFLA_STATS64], s)) {
     link.hasStats = true;
     link.stats = {
         s.rx_packets,        s.tx_packets,        s.rx_bytes,         s.tx_bytes,

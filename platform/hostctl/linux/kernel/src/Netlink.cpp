@@ -236,7 +236,7 @@ void NlSocket::Request(nl_msg* msg, const Subject& subject,
   int rc = nl_send(sk_, msg);
   if (rc < 0)
     Fail(errno ? errno : ErrnoOf(rc), subject);
-  Receive(seq, false, subject, onReply);
+  Receive(seq, subject, onReply);
 }
 
 void NlSocket::Dump(nl_msg* msg, const Subject& subject,
@@ -249,10 +249,10 @@ void NlSocket::Dump(nl_msg* msg, const Subject& subject,
   int rc = nl_send(sk_, msg);
   if (rc < 0)
     Fail(errno ? errno : ErrnoOf(rc), subject);
-  Receive(seq, true, subject, onReply);
+  Receive(seq, subject, onReply);
 }
 
-void NlSocket::Receive(uint32_t seq, bool dump, const Subject& subject,
+void NlSocket::Receive(uint32_t seq, const Subject& subject,
                        const std::function<void(nlmsghdr*)>& onReply) {
   // A callback that throws must not leave the rest of a dump in the socket:
   // the exception waits until the kernel has finished.
@@ -300,7 +300,6 @@ void NlSocket::Receive(uint32_t seq, bool dump, const Subject& subject,
         pending = std::current_exception();
       }
     }
-    (void)dump;
   }
   if (refusal)
     Fail(refusal, subject, refusalText);

@@ -80,8 +80,7 @@ public:
   std::string lastText;
 
 private:
-  void Receive(uint32_t seq, bool dump, const Subject& subject,
-               const std::function<void(nlmsghdr*)>& onReply);
+  void Receive(uint32_t seq, const Subject& subject, const std::function<void(nlmsghdr*)>& onReply);
   nl_sock* sk_ = nullptr;
 };
 

@@ -12,6 +12,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -120,6 +121,10 @@ void AddBridgePort(Namespace& ns, const std::string& bridge, const std::string& 
 void RemoveBridgePort(Namespace& ns, const std::string& port);
 /// The names of the ports of \p bridge, by index.
 std::vector<std::string> BridgePorts(Namespace& ns, const std::string& bridge);
+
+/// Reads one RTM_NEWLINK message (netlink header, ifinfomsg, attributes) as
+/// ListLinks does: for messages recorded from devices this host lacks.
+Link ParseLinkMessage(std::span<const uint8_t> message);
 
 /// Text of an operational state as `ip` prints it ("UP", "LOWERLAYERDOWN").
 const char* OperStateName(OperState state);
