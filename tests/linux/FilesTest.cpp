@@ -19,16 +19,6 @@ using namespace LinuxNetTest;
 
 namespace {
 
-template <typename F> void ExpectError(F&& body, int code, const std::string& message) {
-  try {
-    body();
-    ADD_FAILURE() << "no error; expected: " << message;
-  } catch (const Error& e) {
-    EXPECT_EQ(e.Code(), code) << e.what();
-    EXPECT_EQ(std::string(e.what()), message);
-  }
-}
-
 /// A directory of its own under /tmp, removed afterwards.
 class FilesTest : public ::testing::Test {
 protected:

@@ -19,16 +19,6 @@ using AddressTest = LabTest;
 using RouteTest = LabTest;
 using NeighbourTest = LabTest;
 
-template <typename F> void ExpectError(F&& body, int code, const std::string& message) {
-  try {
-    body();
-    ADD_FAILURE() << "no error; expected: " << message;
-  } catch (const Error& e) {
-    EXPECT_EQ(e.Code(), code) << e.what();
-    EXPECT_EQ(std::string(e.what()), message);
-  }
-}
-
 /// ifname, address, prefix, scope, label, nodad, dynamic, valid lifetime.
 using AddressKey =
     std::tuple<std::string, std::string, int, std::string, std::string, bool, bool, uint32_t>;

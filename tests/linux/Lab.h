@@ -9,6 +9,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include "LinuxNet/Error.h"
 #include "LinuxNet/Namespace.h"
 
 #include <gtest/gtest.h>
@@ -43,6 +44,17 @@ protected:
   std::string name_;                        ///< The namespace's name.
   std::unique_ptr<LinuxNet::Namespace> ns_; ///< The library's handle to it.
 };
+
+/// Expects \p body to throw LinuxNet::Error with \p code and \p message.
+template <typename F> void ExpectError(F&& body, int code, const std::string& message) {
+  try {
+    body();
+    ADD_FAILURE() << "no error; expected: " << message;
+  } catch (const LinuxNet::Error& e) {
+    EXPECT_EQ(e.Code(), code) << e.what();
+    EXPECT_EQ(std::string(e.what()), message);
+  }
+}
 
 /// The inode of the calling thread's network namespace.
 unsigned long ThreadNamespace();

@@ -14,17 +14,6 @@ namespace {
 
 using LinksTest = LabTest;
 
-/// Expects \p body to throw Error with \p code and \p message.
-template <typename F> void ExpectError(F&& body, int code, const std::string& message) {
-  try {
-    body();
-    ADD_FAILURE() << "no error; expected: " << message;
-  } catch (const Error& e) {
-    EXPECT_EQ(e.Code(), code) << e.what();
-    EXPECT_EQ(std::string(e.what()), message);
-  }
-}
-
 TEST_F(LinksTest, ListMatchesIpLinkShow) {
   const auto oracle = IpJson("-details -stats link show");
   const auto links = ListLinks(*ns_);

@@ -403,28 +403,10 @@ Coalesce GetCoalesce(Namespace& ns, const std::string& dev) {
 
 void SetCoalesce(Namespace& ns, const std::string& dev, const Coalesce& change) {
   Set(ns, dev, ETHTOOL_MSG_COALESCE_SET, "interrupt coalescing", [&](nl_msg* msg) {
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_USECS, change.rxUsecs);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_MAX_FRAMES, change.rxMaxFrames);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_USECS_IRQ, change.rxUsecsIrq);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_MAX_FRAMES_IRQ, change.rxMaxFramesIrq);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_USECS, change.txUsecs);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_MAX_FRAMES, change.txMaxFrames);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_USECS_IRQ, change.txUsecsIrq);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_MAX_FRAMES_IRQ, change.txMaxFramesIrq);
-    PutU32(msg, ETHTOOL_A_COALESCE_STATS_BLOCK_USECS, change.statsBlockUsecs);
+    for (const CoalesceField& field : CoalesceFields())
+      PutU32(msg, field.attr, change.*field.member);
     PutU8(msg, ETHTOOL_A_COALESCE_USE_ADAPTIVE_RX, change.adaptiveRx);
     PutU8(msg, ETHTOOL_A_COALESCE_USE_ADAPTIVE_TX, change.adaptiveTx);
-    PutU32(msg, ETHTOOL_A_COALESCE_PKT_RATE_LOW, change.pktRateLow);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_USECS_LOW, change.rxUsecsLow);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_MAX_FRAMES_LOW, change.rxMaxFramesLow);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_USECS_LOW, change.txUsecsLow);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_MAX_FRAMES_LOW, change.txMaxFramesLow);
-    PutU32(msg, ETHTOOL_A_COALESCE_PKT_RATE_HIGH, change.pktRateHigh);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_USECS_HIGH, change.rxUsecsHigh);
-    PutU32(msg, ETHTOOL_A_COALESCE_RX_MAX_FRAMES_HIGH, change.rxMaxFramesHigh);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_USECS_HIGH, change.txUsecsHigh);
-    PutU32(msg, ETHTOOL_A_COALESCE_TX_MAX_FRAMES_HIGH, change.txMaxFramesHigh);
-    PutU32(msg, ETHTOOL_A_COALESCE_RATE_SAMPLE_INTERVAL, change.sampleInterval);
   });
 }
 

@@ -91,25 +91,6 @@ std::vector<uint32_t> SetBits(const std::vector<uint32_t>& words) {
   return bits;
 }
 
-} // namespace Detail
-
-namespace {
-
-std::optional<uint32_t> U32(const nlattr* a) {
-  uint32_t v = 0;
-  return Get(a, v) ? std::optional<uint32_t>(v) : std::nullopt;
-}
-
-std::optional<bool> Flag(const nlattr* a) {
-  uint8_t v = 0;
-  return Get(a, v) ? std::optional<bool>(v != 0) : std::nullopt;
-}
-
-/// The u32 members of Coalesce and their attributes.
-struct CoalesceField {
-  int attr;
-  std::optional<uint32_t> Coalesce::*member;
-};
 constexpr CoalesceField kCoalesceFields[] = {
     {ETHTOOL_A_COALESCE_RX_USECS, &Coalesce::rxUsecs},
     {ETHTOOL_A_COALESCE_RX_MAX_FRAMES, &Coalesce::rxMaxFrames},
@@ -132,6 +113,24 @@ constexpr CoalesceField kCoalesceFields[] = {
     {ETHTOOL_A_COALESCE_TX_MAX_FRAMES_HIGH, &Coalesce::txMaxFramesHigh},
     {ETHTOOL_A_COALESCE_RATE_SAMPLE_INTERVAL, &Coalesce::sampleInterval},
 };
+
+std::span<const CoalesceField> CoalesceFields() {
+  return kCoalesceFields;
+}
+
+} // namespace Detail
+
+namespace {
+
+std::optional<uint32_t> U32(const nlattr* a) {
+  uint32_t v = 0;
+  return Get(a, v) ? std::optional<uint32_t>(v) : std::nullopt;
+}
+
+std::optional<bool> Flag(const nlattr* a) {
+  uint8_t v = 0;
+  return Get(a, v) ? std::optional<bool>(v != 0) : std::nullopt;
+}
 
 /// A fixed-size ioctl structure at the start of \p bytes.
 template <typename T> T Head(std::span<const uint8_t> bytes, const char* what) {
@@ -156,6 +155,22 @@ std::vector<std::string> Names(std::span<const uint8_t> bytes) {
   for (std::size_t i = 0; i < count; ++i)
     names.push_back(Text(p + i * ETH_GSTRING_LEN, ETH_GSTRING_LEN));
   return names;
+}
+
+/// \p count 64-bit values from \p data (fewer when it is short), each with
+/// its label, or \p fallback and its position.
+std::vector<std::pair<std::string, uint64_t>> Counters(std::span<const uint8_t> data,
+                                                       uint32_t count,
+                                                       const std::vector<std::string>& labels,
+                                                       const char* fallback) {
+  std::vector<std::pair<std::string, uint64_t>> values;
+  const std::size_t n = std::min<std::size_t>(count, data.size() / 8);
+  for (std::size_t i = 0; i < n; ++i) {
+    uint64_t value = 0;
+    memcpy(&value, data.data() + i * 8, 8);
+    values.emplace_back(i < labels.size() ? labels[i] : fallback + std::to_string(i), value);
+  }
+  return values;
 }
 
 } // namespace
@@ -254,7 +269,7 @@ Rings ParseRings(std::span<const uint8_t> message) {
 Coalesce ParseCoalesce(std::span<const uint8_t> message) {
   GenlReply r(message, ETHTOOL_A_COALESCE_MAX);
   Coalesce c;
-  for (const auto& field : kCoalesceFields)
+  for (const auto& field : CoalesceFields())
     c.*field.member = U32(r.tb[field.attr]);
   c.adaptiveRx = Flag(r.tb[ETHTOOL_A_COALESCE_USE_ADAPTIVE_RX]);
   c.adaptiveTx = Flag(r.tb[ETHTOOL_A_COALESCE_USE_ADAPTIVE_TX]);
@@ -316,12 +331,7 @@ SelfTestResult ParseSelfTest(std::span<const uint8_t> test, std::span<const uint
   const std::vector<std::string> labels = names.empty() ? std::vector<std::string>{} : Names(names);
   SelfTestResult result;
   result.failed = t.flags & ETH_TEST_FL_FAILED;
-  const std::size_t n = std::min<std::size_t>(t.len, (test.size() - sizeof(ethtool_test)) / 8);
-  for (std::size_t i = 0; i < n; ++i) {
-    uint64_t value = 0;
-    memcpy(&value, test.data() + sizeof(ethtool_test) + i * 8, 8);
-    result.results.emplace_back(i < labels.size() ? labels[i] : "test " + std::to_string(i), value);
-  }
+  result.results = Counters(test.subspan(sizeof(ethtool_test)), t.len, labels, "test ");
   return result;
 }
 
@@ -329,15 +339,7 @@ std::vector<std::pair<std::string, uint64_t>> ParseStats(std::span<const uint8_t
                                                          std::span<const uint8_t> names) {
   const auto s = Head<ethtool_stats>(stats, "statistics");
   const std::vector<std::string> labels = Names(names);
-  std::vector<std::pair<std::string, uint64_t>> values;
-  const std::size_t n =
-      std::min<std::size_t>(s.n_stats, (stats.size() - sizeof(ethtool_stats)) / 8);
-  for (std::size_t i = 0; i < n; ++i) {
-    uint64_t value = 0;
-    memcpy(&value, stats.data() + sizeof(ethtool_stats) + i * 8, 8);
-    values.emplace_back(i < labels.size() ? labels[i] : "stat " + std::to_string(i), value);
-  }
-  return values;
+  return Counters(stats.subspan(sizeof(ethtool_stats)), s.n_stats, labels, "stat ");
 }
 
 } // namespace EthtoolWire

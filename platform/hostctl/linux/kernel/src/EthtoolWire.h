@@ -1,6 +1,8 @@
 //===- EthtoolWire.h - Shared pieces of the ethtool parsers (internal) ----===//
 #pragma once
 
+#include "LinuxNet/Ethtool.h"
+
 #include <netlink/attr.h>
 
 #include <cstdint>
@@ -33,5 +35,13 @@ struct Bitset {
 Bitset ParseBitset(const nlattr* a);
 bool TestBit(const std::vector<uint32_t>& words, uint32_t bit);
 std::vector<uint32_t> SetBits(const std::vector<uint32_t>& words);
+
+/// A u32 member of Coalesce and its attribute.
+struct CoalesceField {
+  int attr;                                  ///< ETHTOOL_A_COALESCE_*.
+  std::optional<uint32_t> Coalesce::*member; ///< The record's member.
+};
+/// Every u32 coalescing parameter (the two adaptive switches are u8).
+std::span<const CoalesceField> CoalesceFields();
 
 } // namespace LinuxNet::Detail

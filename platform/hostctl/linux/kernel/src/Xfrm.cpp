@@ -112,6 +112,19 @@ std::string DescribeState(const IpAddress& dst, uint32_t spi, uint8_t protocol) 
          " to " + dst.ToString();
 }
 
+/// Lifetime limits of none: limits left at zero would expire a state or a
+/// policy at once, and the kernel's "no limit" is all ones.
+std::unique_ptr<xfrmnl_ltime_cfg, LtimeDeleter> NoLimits() {
+  std::unique_ptr<xfrmnl_ltime_cfg, LtimeDeleter> life(xfrmnl_ltime_cfg_alloc());
+  Check(life.get());
+  const unsigned long long infinity = ~0ULL;
+  xfrmnl_ltime_cfg_set_soft_bytelimit(life.get(), infinity);
+  xfrmnl_ltime_cfg_set_hard_bytelimit(life.get(), infinity);
+  xfrmnl_ltime_cfg_set_soft_packetlimit(life.get(), infinity);
+  xfrmnl_ltime_cfg_set_hard_packetlimit(life.get(), infinity);
+  return life;
+}
+
 XfrmAlgorithm ReadAlgorithm(xfrmnl_sa* sa, bool integrity) {
   char name[128] = {};
   unsigned int bits = 0;
@@ -175,15 +188,7 @@ void AddXfrmState(Namespace& ns, const XfrmState& state) {
   xfrmnl_sa_set_family(sa.get(), static_cast<unsigned>(state.destination.family));
   auto sel = BuildSelector(state.selector, state.destination.family);
   xfrmnl_sa_set_sel(sa.get(), sel.get());
-  std::unique_ptr<xfrmnl_ltime_cfg, LtimeDeleter> life(xfrmnl_ltime_cfg_alloc());
-  Check(life.get());
-  // Limits left at zero would expire the state at once: no limit is the
-  // kernel's "infinity".
-  const unsigned long long infinity = ~0ULL;
-  xfrmnl_ltime_cfg_set_soft_bytelimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_hard_bytelimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_soft_packetlimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_hard_packetlimit(life.get(), infinity);
+  auto life = NoLimits();
   xfrmnl_ltime_cfg_set_soft_addexpires(life.get(), state.softLifetime);
   xfrmnl_ltime_cfg_set_hard_addexpires(life.get(), state.hardLifetime);
   xfrmnl_sa_set_lifetime_cfg(sa.get(), life.get());
@@ -261,13 +266,7 @@ void AddXfrmPolicy(Namespace& ns, const XfrmPolicy& policy) {
   xfrmnl_sp_set_dir(sp.get(), policy.direction);
   xfrmnl_sp_set_action(sp.get(), policy.action);
   xfrmnl_sp_set_priority(sp.get(), policy.priority);
-  std::unique_ptr<xfrmnl_ltime_cfg, LtimeDeleter> life(xfrmnl_ltime_cfg_alloc());
-  Check(life.get());
-  const unsigned long long infinity = ~0ULL;
-  xfrmnl_ltime_cfg_set_soft_bytelimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_hard_bytelimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_soft_packetlimit(life.get(), infinity);
-  xfrmnl_ltime_cfg_set_hard_packetlimit(life.get(), infinity);
+  auto life = NoLimits();
   xfrmnl_sp_set_lifetime_cfg(sp.get(), life.get());
   for (const XfrmTemplate& t : policy.templates) {
     xfrmnl_user_tmpl* tmpl = xfrmnl_user_tmpl_alloc();
