@@ -109,6 +109,11 @@ TEST_F(LinksTest, RefusalsNameTheLinkAndTheReason) {
               "the link nosuch0 does not exist");
   ExpectError([&] { CreateVeth(*ns_, "vmnic0", "peer9"); }, EEXIST, "vmnic0: already exists");
   ExpectError([&] { DeleteLink(*ns_, "nosuch0"); }, ENODEV, "the link nosuch0 does not exist");
+  LinkChange rename;
+  rename.name = "peer0";
+  ExpectError([&] { ChangeLink(*ns_, "vmnic1", rename); }, EEXIST,
+              "vmnic1: the name peer0 is taken");
+  EXPECT_FALSE(GetLink(*ns_, "a-name-longer-than-fifteen").has_value());
 }
 
 TEST_F(LinksTest, BridgesAndTheirPortsAgreeWithBridgeLink) {

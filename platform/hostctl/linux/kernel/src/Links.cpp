@@ -194,6 +194,8 @@ std::vector<Link> ListLinks(Namespace& ns, bool withVfs) {
 }
 
 std::optional<Link> GetLink(Namespace& ns, const std::string& name, bool withVfs) {
+  if (name.empty() || name.size() >= IFNAMSIZ)
+    return std::nullopt;
   MsgPtr msg = LinkRequest(0, withVfs);
   if (nla_put_string(msg.get(), IFLA_IFNAME, name.c_str()) < 0)
     throw Error(ENOMEM, "out of memory building a link request");
@@ -232,7 +234,13 @@ void ChangeLink(Namespace& ns, const std::string& name, const LinkChange& change
     rtnl_link_set_master(request.get(), change.master->empty() ? 0 : IfIndex(ns, *change.master));
   if (change.name)
     rtnl_link_set_name(request.get(), change.name->c_str());
-  s.Check(rtnl_link_change(s.Get(), orig.get(), request.get(), 0), {name});
+  try {
+    s.Check(rtnl_link_change(s.Get(), orig.get(), request.get(), 0), {name});
+  } catch (const Error& e) {
+    if (e.Code() == EEXIST && change.name)
+      throw Error(EEXIST, name + ": the name " + *change.name + " is taken");
+    throw;
+  }
 }
 
 void CreateVeth(Namespace& ns, const std::string& name, const std::string& peer) {
