@@ -57,8 +57,9 @@ std::set<AddressKey> OurAddresses(const std::vector<Address>& addresses) {
 TEST_F(AddressTest, ListMatchesIpAddressShow) {
   // The IPv6 link-local addresses of links that are up come and go with
   // duplicate address detection; both reads see the same settled set.
+  ExpectAgree([&] { return OurAddresses(ListAddresses(*ns_)); },
+              [&] { return OracleAddresses(IpJson("address show")); });
   const auto ours = OurAddresses(ListAddresses(*ns_));
-  EXPECT_EQ(ours, OracleAddresses(IpJson("address show")));
   EXPECT_TRUE(ours.count({"br0", "10.1.0.2", 24, "global", "br0", false, false, 0}));
   EXPECT_TRUE(ours.count({"br0", "2001:db8::2", 64, "global", "", true, false, 0}));
   for (const Address& a : ListAddresses(*ns_, Family::Ipv6))
@@ -90,7 +91,8 @@ TEST_F(AddressTest, AddAndDeleteReachTheKernel) {
   EXPECT_EQ(oracle[1]["local"], "2001:db8:5::5");
   EXPECT_EQ(oracle[1]["prefixlen"], 80);
   EXPECT_TRUE(oracle[1].value("nodad", false));
-  EXPECT_EQ(OurAddresses(ListAddresses(*ns_)), OracleAddresses(IpJson("address show")));
+  ExpectAgree([&] { return OurAddresses(ListAddresses(*ns_)); },
+              [&] { return OracleAddresses(IpJson("address show")); });
   for (const Address& a : ListAddresses(*ns_))
     if (a.device == "vmnic1" && a.local.family == Family::Ipv4) {
       EXPECT_TRUE(a.IsDynamic());
@@ -137,8 +139,10 @@ TEST_F(RouteTest, MainTableMatchesIpRouteShow) {
   Ip("route add blackhole 203.0.113.0/24");
   Ip("route add 10.9.9.9 dev br0 metric 7");
   Ip("route add default via 10.1.0.1 proto dhcp");
-  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv4)), OracleRoutes(IpJson("-4 route show"), 4));
-  EXPECT_EQ(OurRoutes(ListRoutes(*ns_, Family::Ipv6)), OracleRoutes(IpJson("-6 route show"), 6));
+  ExpectAgree([&] { return OurRoutes(ListRoutes(*ns_, Family::Ipv4)); },
+              [&] { return OracleRoutes(IpJson("-4 route show"), 4); });
+  ExpectAgree([&] { return OurRoutes(ListRoutes(*ns_, Family::Ipv6)); },
+              [&] { return OracleRoutes(IpJson("-6 route show"), 6); });
   // The local table is not the main one.
   for (const Route& r : ListRoutes(*ns_))
     EXPECT_EQ(r.table, kMainTable);
@@ -207,16 +211,22 @@ TEST_F(RouteTest, AddReplaceAndDeleteReachTheKernel) {
 using NeighbourKey = std::tuple<std::string, std::string, std::string, std::string>;
 
 TEST_F(NeighbourTest, ListMatchesIpNeighShow) {
-  std::set<NeighbourKey> oracle;
-  for (const auto& n : IpJson("neigh show"))
-    oracle.emplace(n["dst"], n["dev"], n.value("lladdr", ""), n["state"][0]);
-  std::set<NeighbourKey> ours;
-  for (const Neighbour& n : ListNeighbours(*ns_))
-    if (!(n.state & NudNoArp))
-      ours.emplace(n.address.ToString(), n.device, FormatHwAddress(n.lladdr),
-                   NeighbourStateName(n.state));
-  EXPECT_EQ(ours, oracle);
-  EXPECT_TRUE(ours.count({"2001:db8::9", "br0", "02:00:00:00:00:0a", "PERMANENT"}));
+  auto oracle = [&] {
+    std::set<NeighbourKey> keys;
+    for (const auto& n : IpJson("neigh show"))
+      keys.emplace(n["dst"], n["dev"], n.value("lladdr", ""), n["state"][0]);
+    return keys;
+  };
+  auto ours = [&] {
+    std::set<NeighbourKey> keys;
+    for (const Neighbour& n : ListNeighbours(*ns_))
+      if (!(n.state & NudNoArp))
+        keys.emplace(n.address.ToString(), n.device, FormatHwAddress(n.lladdr),
+                     NeighbourStateName(n.state));
+    return keys;
+  };
+  ExpectAgree(ours, oracle);
+  EXPECT_TRUE(ours().count({"2001:db8::9", "br0", "02:00:00:00:00:0a", "PERMANENT"}));
 }
 
 TEST_F(NeighbourTest, AddAndDeleteReachTheKernel) {

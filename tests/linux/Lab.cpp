@@ -61,6 +61,16 @@ void LabTest::SetUp() {
                             "neigh add 2001:db8::9 lladdr 02:00:00:00:00:0a dev br0\n";
   const Output built = Shell("printf '" + batch + "' | ip -n " + name_ + " -batch -", true);
   ASSERT_EQ(built.status, 0) << built.out;
+  // Carriers come up asynchronously: wait until the links that are up say
+  // so, so that two readers never see the lab change under them.
+  for (int wait = 0; wait < 100; ++wait) {
+    int up = 0;
+    for (const auto& link : IpJson("link show"))
+      up += link["operstate"] == "UP";
+    if (up == 3)
+      break;
+    usleep(20000);
+  }
   const std::string etc = "/etc/netns/" + name_;
   ASSERT_EQ(Shell("mkdir -p " + etc + " && printf '# lab resolver\\nnameserver 192.0.2.53\\n' > " +
                   etc + "/resolv.conf && printf '127.0.0.1\\tlocalhost\\n' > " + etc + "/hosts")

@@ -16,6 +16,7 @@
 #include <nlohmann/json.hpp>
 
 #include <string>
+#include <unistd.h>
 
 namespace LinuxNetTest {
 
@@ -53,6 +54,22 @@ template <typename F> void ExpectError(F&& body, int code, const std::string& me
   } catch (const LinuxNet::Error& e) {
     EXPECT_EQ(e.Code(), code) << e.what();
     EXPECT_EQ(std::string(e.what()), message);
+  }
+}
+
+/// Expects two readers of the same kernel state to agree. The lab keeps
+/// moving for a moment after it is built (IPv6 link-local addresses and
+/// their routes appear when carriers come up), so a difference is read
+/// again for up to a second before it counts.
+template <typename A, typename B> void ExpectAgree(A ours, B oracle) {
+  for (int attempt = 0;; ++attempt) {
+    const auto a = ours();
+    const auto b = oracle();
+    if (a == b || attempt == 10) {
+      EXPECT_EQ(a, b);
+      return;
+    }
+    usleep(100000);
   }
 }
 
