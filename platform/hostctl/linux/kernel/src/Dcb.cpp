@@ -144,13 +144,7 @@ DcbInfo GetDcb(Namespace& ns, const std::string& dev) {
     DcbReply state(Ask(ns, dev, DCB_CMD_GSTATE, subject));
     info.enabled = Value<uint8_t>(state.tb[DCB_ATTR_STATE]) != 0;
   } catch (const Error& e) {
-    if (e.Code() == ENODEV)
-      throw Error(ENODEV, "the link " + dev + " does not exist");
-    if (e.Code() == EOPNOTSUPP) {
-      subject.driver = DriverName(ns, dev);
-      Fail(EOPNOTSUPP, subject);
-    }
-    throw;
+    RethrowForLink(ns, dev, subject, e);
   }
   // A driver with DCB may still lack one of the parts.
   auto optional = [&](auto read) {

@@ -61,13 +61,7 @@ auto Guarded(Namespace& ns, const std::string& dev, const char* feature, bool ch
   try {
     return body(subject);
   } catch (const Error& e) {
-    if (e.Code() == ENODEV)
-      throw Error(ENODEV, "the link " + dev + " does not exist");
-    if (e.Code() == EOPNOTSUPP) {
-      subject.driver = DriverName(ns, dev);
-      Fail(EOPNOTSUPP, subject);
-    }
-    throw;
+    RethrowForLink(ns, dev, subject, e);
   }
 }
 

@@ -427,4 +427,14 @@ std::string DriverName(Namespace& ns, const std::string& name) {
   return std::string(info.driver, strnlen(info.driver, sizeof info.driver));
 }
 
+void RethrowForLink(Namespace& ns, const std::string& dev, Subject subject, const Error& e) {
+  if (e.Code() == ENODEV)
+    throw Error(ENODEV, "the link " + dev + " does not exist");
+  if (e.Code() == EOPNOTSUPP && !subject.feature.empty()) {
+    subject.driver = DriverName(ns, dev);
+    Fail(EOPNOTSUPP, subject);
+  }
+  throw e;
+}
+
 } // namespace LinuxNet::Detail

@@ -133,5 +133,10 @@ private:
 
 /// The driver name of a link (empty when unknown); used in messages.
 std::string DriverName(Namespace& ns, const std::string& name);
+/// Rethrows \p e, a refusal of an operation on link \p dev: a missing
+/// device as "the link DEV does not exist", a missing operation naming the
+/// driver and \p subject's feature, anything else as it is.
+[[noreturn]] void RethrowForLink(Namespace& ns, const std::string& dev, Subject subject,
+                                 const Error& e);
 
 } // namespace LinuxNet::Detail
