@@ -161,21 +161,21 @@ TEST_F(RouteTest, ThousandsOfRoutesAreAllListed) {
 }
 
 TEST_F(RouteTest, AddReplaceAndDeleteReachTheKernel) {
-  RouteSpec spec;
-  spec.destination = IpPrefix::Parse("203.0.113.0/24");
-  spec.gateway = IpAddress::Parse("10.1.0.1");
-  spec.metric = 50;
-  AddRoute(*ns_, spec);
+  RouteSpec wanted;
+  wanted.destination = IpPrefix::Parse("203.0.113.0/24");
+  wanted.gateway = IpAddress::Parse("10.1.0.1");
+  wanted.metric = 50;
+  AddRoute(*ns_, wanted);
   auto j = IpJson("route show 203.0.113.0/24");
   ASSERT_EQ(j.size(), 1u);
   EXPECT_EQ(j[0]["gateway"], "10.1.0.1");
   EXPECT_EQ(j[0]["dev"], "br0");
   EXPECT_EQ(j[0]["metric"], 50);
   EXPECT_EQ(j[0]["protocol"], "static");
-  ExpectError([&] { AddRoute(*ns_, spec); }, EEXIST,
+  ExpectError([&] { AddRoute(*ns_, wanted); }, EEXIST,
               "route 203.0.113.0/24 via 10.1.0.1: already exists");
-  spec.gateway = IpAddress::Parse("10.1.0.254");
-  AddRoute(*ns_, spec, true);
+  wanted.gateway = IpAddress::Parse("10.1.0.254");
+  AddRoute(*ns_, wanted, true);
   EXPECT_EQ(IpJson("route show 203.0.113.0/24")[0]["gateway"], "10.1.0.254");
 
   RouteSpec direct;
@@ -199,7 +199,7 @@ TEST_F(RouteTest, AddReplaceAndDeleteReachTheKernel) {
   }
 
   RouteSpec gone;
-  gone.destination = spec.destination;
+  gone.destination = wanted.destination;
   DeleteRoute(*ns_, gone);
   DeleteRoute(*ns_, direct);
   EXPECT_TRUE(IpJson("route show 203.0.113.0/24").empty());
@@ -230,11 +230,11 @@ TEST_F(NeighbourTest, ListMatchesIpNeighShow) {
 }
 
 TEST_F(NeighbourTest, AddAndDeleteReachTheKernel) {
-  NeighbourSpec spec;
-  spec.device = "br0";
-  spec.address = IpAddress::Parse("10.1.0.20");
-  spec.lladdr = ParseHwAddress("02:00:00:00:00:20");
-  AddNeighbour(*ns_, spec);
+  NeighbourSpec wanted;
+  wanted.device = "br0";
+  wanted.address = IpAddress::Parse("10.1.0.20");
+  wanted.lladdr = ParseHwAddress("02:00:00:00:00:20");
+  AddNeighbour(*ns_, wanted);
   NeighbourSpec router;
   router.device = "br0";
   router.address = IpAddress::Parse("2001:db8::20");
@@ -251,15 +251,15 @@ TEST_F(NeighbourTest, AddAndDeleteReachTheKernel) {
   EXPECT_EQ(j[0]["state"][0], "STALE");
   EXPECT_TRUE(j[0].contains("router"));
 
-  ExpectError([&] { AddNeighbour(*ns_, spec); }, EEXIST,
+  ExpectError([&] { AddNeighbour(*ns_, wanted); }, EEXIST,
               "neighbour 10.1.0.20 on br0: already exists");
-  spec.lladdr = ParseHwAddress("02:00:00:00:00:22");
-  AddNeighbour(*ns_, spec, true);
+  wanted.lladdr = ParseHwAddress("02:00:00:00:00:22");
+  AddNeighbour(*ns_, wanted, true);
   EXPECT_EQ(IpJson("neigh show 10.1.0.20")[0]["lladdr"], "02:00:00:00:00:22");
-  DeleteNeighbour(*ns_, "br0", spec.address);
+  DeleteNeighbour(*ns_, "br0", wanted.address);
   DeleteNeighbour(*ns_, "br0", router.address);
   EXPECT_TRUE(IpJson("neigh show 10.1.0.20").empty());
-  ExpectError([&] { DeleteNeighbour(*ns_, "br0", spec.address); }, ENOENT,
+  ExpectError([&] { DeleteNeighbour(*ns_, "br0", wanted.address); }, ENOENT,
               "neighbour 10.1.0.20 on br0: not found");
 }
 

@@ -86,24 +86,24 @@ std::vector<Address> ListAddresses(Namespace& ns, Family family) {
   return addresses;
 }
 
-void AddAddress(Namespace& ns, const AddressSpec& spec) {
+void AddAddress(Namespace& ns, const AddressSpec& wanted) {
   NlSocket& s = ns.Internals().Route();
-  AddrObjPtr a = Build(ns, spec.device, spec.prefix);
-  if (spec.broadcast.IsSet()) {
-    AddrPtr b = ToNlAddr(spec.broadcast);
+  AddrObjPtr a = Build(ns, wanted.device, wanted.prefix);
+  if (wanted.broadcast.IsSet()) {
+    AddrPtr b = ToNlAddr(wanted.broadcast);
     rtnl_addr_set_broadcast(a.get(), b.get());
   }
-  if (spec.scope)
-    rtnl_addr_set_scope(a.get(), *spec.scope);
-  if (spec.noDad)
+  if (wanted.scope)
+    rtnl_addr_set_scope(a.get(), *wanted.scope);
+  if (wanted.noDad)
     rtnl_addr_set_flags(a.get(), IFA_F_NODAD);
-  if (spec.validLifetime != kForever || spec.preferredLifetime != kForever) {
-    rtnl_addr_set_valid_lifetime(a.get(), spec.validLifetime);
-    rtnl_addr_set_preferred_lifetime(a.get(), spec.preferredLifetime);
+  if (wanted.validLifetime != kForever || wanted.preferredLifetime != kForever) {
+    rtnl_addr_set_valid_lifetime(a.get(), wanted.validLifetime);
+    rtnl_addr_set_preferred_lifetime(a.get(), wanted.preferredLifetime);
   }
-  if (!spec.label.empty())
-    rtnl_addr_set_label(a.get(), spec.label.c_str());
-  s.Check(rtnl_addr_add(s.Get(), a.get(), NLM_F_EXCL), {Describe(spec.device, spec.prefix)});
+  if (!wanted.label.empty())
+    rtnl_addr_set_label(a.get(), wanted.label.c_str());
+  s.Check(rtnl_addr_add(s.Get(), a.get(), NLM_F_EXCL), {Describe(wanted.device, wanted.prefix)});
 }
 
 void DeleteAddress(Namespace& ns, const std::string& device, const IpPrefix& prefix) {

@@ -81,20 +81,20 @@ std::vector<Neighbour> ListNeighbours(Namespace& ns, Family family) {
   return neighbours;
 }
 
-void AddNeighbour(Namespace& ns, const NeighbourSpec& spec, bool replace) {
+void AddNeighbour(Namespace& ns, const NeighbourSpec& wanted, bool replace) {
   NlSocket& s = ns.Internals().Route();
-  if (!spec.address.IsSet())
+  if (!wanted.address.IsSet())
     throw Error(EINVAL, "a neighbour needs an address");
-  NeighPtr n = Build(ns, spec.device, spec.address);
-  if (!spec.lladdr.empty()) {
-    AddrPtr ll = ToNlAddr(spec.lladdr);
+  NeighPtr n = Build(ns, wanted.device, wanted.address);
+  if (!wanted.lladdr.empty()) {
+    AddrPtr ll = ToNlAddr(wanted.lladdr);
     rtnl_neigh_set_lladdr(n.get(), ll.get());
   }
-  rtnl_neigh_set_state(n.get(), spec.state);
-  if (spec.router)
+  rtnl_neigh_set_state(n.get(), wanted.state);
+  if (wanted.router)
     rtnl_neigh_set_flags(n.get(), NTF_ROUTER);
   s.Check(rtnl_neigh_add(s.Get(), n.get(), NLM_F_CREATE | (replace ? NLM_F_REPLACE : NLM_F_EXCL)),
-          {"neighbour " + spec.address.ToString() + " on " + spec.device});
+          {"neighbour " + wanted.address.ToString() + " on " + wanted.device});
 }
 
 void DeleteNeighbour(Namespace& ns, const std::string& device, const IpAddress& address) {

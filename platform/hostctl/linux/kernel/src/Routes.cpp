@@ -91,40 +91,40 @@ void DumpFamily(Namespace& ns, Family family, uint32_t table, const NameTable& n
   });
 }
 
-std::string Describe(const RouteSpec& spec) {
-  std::string text = "route " + spec.destination.ToString();
-  if (spec.gateway.IsSet())
-    text += " via " + spec.gateway.ToString();
-  if (!spec.device.empty())
-    text += " dev " + spec.device;
+std::string Describe(const RouteSpec& wanted) {
+  std::string text = "route " + wanted.destination.ToString();
+  if (wanted.gateway.IsSet())
+    text += " via " + wanted.gateway.ToString();
+  if (!wanted.device.empty())
+    text += " dev " + wanted.device;
   return text;
 }
 
-RoutePtr Build(Namespace& ns, const RouteSpec& spec) {
+RoutePtr Build(Namespace& ns, const RouteSpec& wanted) {
   RoutePtr r(rtnl_route_alloc());
   if (!r)
     throw Error(ENOMEM, "out of memory building a route request");
-  const Family family = spec.destination.address.family;
-  if (spec.gateway.IsSet() && spec.gateway.family != family)
-    throw Error(EINVAL, Describe(spec) + ": the gateway is not of the destination's family");
+  const Family family = wanted.destination.address.family;
+  if (wanted.gateway.IsSet() && wanted.gateway.family != family)
+    throw Error(EINVAL, Describe(wanted) + ": the gateway is not of the destination's family");
   rtnl_route_set_family(r.get(), static_cast<uint8_t>(family));
-  AddrPtr dst = ToNlAddr(spec.destination.address, spec.destination.length);
+  AddrPtr dst = ToNlAddr(wanted.destination.address, wanted.destination.length);
   rtnl_route_set_dst(r.get(), dst.get());
-  rtnl_route_set_table(r.get(), spec.table);
-  if (spec.metric)
-    rtnl_route_set_priority(r.get(), spec.metric);
-  if (spec.prefSource.IsSet()) {
-    AddrPtr src = ToNlAddr(spec.prefSource);
+  rtnl_route_set_table(r.get(), wanted.table);
+  if (wanted.metric)
+    rtnl_route_set_priority(r.get(), wanted.metric);
+  if (wanted.prefSource.IsSet()) {
+    AddrPtr src = ToNlAddr(wanted.prefSource);
     rtnl_route_set_pref_src(r.get(), src.get());
   }
-  if (spec.gateway.IsSet() || !spec.device.empty()) {
+  if (wanted.gateway.IsSet() || !wanted.device.empty()) {
     rtnl_nexthop* nh = rtnl_route_nh_alloc();
     if (!nh)
       throw Error(ENOMEM, "out of memory building a route request");
-    if (!spec.device.empty())
-      rtnl_route_nh_set_ifindex(nh, IfIndex(ns, spec.device));
-    if (spec.gateway.IsSet()) {
-      AddrPtr gw = ToNlAddr(spec.gateway);
+    if (!wanted.device.empty())
+      rtnl_route_nh_set_ifindex(nh, IfIndex(ns, wanted.device));
+    if (wanted.gateway.IsSet()) {
+      AddrPtr gw = ToNlAddr(wanted.gateway);
       rtnl_route_nh_set_gateway(nh, gw.get());
     }
     rtnl_route_add_nexthop(r.get(), nh);
@@ -144,25 +144,26 @@ std::vector<Route> ListRoutes(Namespace& ns, Family family, uint32_t table) {
   return routes;
 }
 
-void AddRoute(Namespace& ns, const RouteSpec& spec, bool replace) {
+void AddRoute(Namespace& ns, const RouteSpec& wanted, bool replace) {
   NlSocket& s = ns.Internals().Route();
-  RoutePtr r = Build(ns, spec);
-  rtnl_route_set_protocol(r.get(), spec.protocol);
-  rtnl_route_set_type(r.get(), spec.type);
-  uint8_t scope = spec.gateway.IsSet() || spec.type != RTN_UNICAST ? uint8_t{RT_SCOPE_UNIVERSE}
-                                                                   : uint8_t{RT_SCOPE_LINK};
-  rtnl_route_set_scope(r.get(), spec.scope.value_or(scope));
-  s.Check(rtnl_route_add(s.Get(), r.get(), replace ? NLM_F_REPLACE : NLM_F_EXCL), {Describe(spec)});
+  RoutePtr r = Build(ns, wanted);
+  rtnl_route_set_protocol(r.get(), wanted.protocol);
+  rtnl_route_set_type(r.get(), wanted.type);
+  uint8_t scope = wanted.gateway.IsSet() || wanted.type != RTN_UNICAST ? uint8_t{RT_SCOPE_UNIVERSE}
+                                                                       : uint8_t{RT_SCOPE_LINK};
+  rtnl_route_set_scope(r.get(), wanted.scope.value_or(scope));
+  s.Check(rtnl_route_add(s.Get(), r.get(), replace ? NLM_F_REPLACE : NLM_F_EXCL),
+          {Describe(wanted)});
 }
 
-void DeleteRoute(Namespace& ns, const RouteSpec& spec) {
+void DeleteRoute(Namespace& ns, const RouteSpec& wanted) {
   NlSocket& s = ns.Internals().Route();
-  RoutePtr r = Build(ns, spec);
+  RoutePtr r = Build(ns, wanted);
   // As `ip route del`: scope, protocol and type left open match any route.
-  rtnl_route_set_scope(r.get(), spec.scope.value_or(uint8_t{RT_SCOPE_NOWHERE}));
+  rtnl_route_set_scope(r.get(), wanted.scope.value_or(uint8_t{RT_SCOPE_NOWHERE}));
   rtnl_route_set_protocol(r.get(), RTPROT_UNSPEC);
   rtnl_route_set_type(r.get(), RTN_UNSPEC);
-  s.Check(rtnl_route_delete(s.Get(), r.get(), 0), {Describe(spec)});
+  s.Check(rtnl_route_delete(s.Get(), r.get(), 0), {Describe(wanted)});
 }
 
 std::string RouteProtocolName(uint8_t protocol) {

@@ -74,7 +74,7 @@ struct AddressSpec {
   std::string label;                     ///< IPv4 label; empty for the device name.
 };
 /// Adds an address; refuses one the link has already.
-void AddAddress(Namespace& ns, const AddressSpec& spec);
+void AddAddress(Namespace& ns, const AddressSpec& wanted);
 /// Removes an address of \p device.
 void DeleteAddress(Namespace& ns, const std::string& device, const IpPrefix& prefix);
 

@@ -51,7 +51,7 @@ struct NeighbourSpec {
   bool router = false;           ///< IPv6: the neighbour is a router.
 };
 /// Adds an entry; refuses one that exists, unless \p replace.
-void AddNeighbour(Namespace& ns, const NeighbourSpec& spec, bool replace = false);
+void AddNeighbour(Namespace& ns, const NeighbourSpec& wanted, bool replace = false);
 /// Deletes the entry of \p address on \p device.
 void DeleteNeighbour(Namespace& ns, const std::string& device, const IpAddress& address);
 

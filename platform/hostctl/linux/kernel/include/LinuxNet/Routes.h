@@ -64,9 +64,9 @@ struct RouteSpec {
   uint32_t table = kMainTable;  ///< Routing table.
 };
 /// Adds a route; refuses one that exists, unless \p replace.
-void AddRoute(Namespace& ns, const RouteSpec& spec, bool replace = false);
-/// Deletes the route that \p spec names.
-void DeleteRoute(Namespace& ns, const RouteSpec& spec);
+void AddRoute(Namespace& ns, const RouteSpec& wanted, bool replace = false);
+/// Deletes the route that \p wanted names.
+void DeleteRoute(Namespace& ns, const RouteSpec& wanted);
 
 /// Text of codes as `ip` prints them ("static", "link", "unicast").
 std::string RouteProtocolName(uint8_t protocol);
