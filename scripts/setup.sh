@@ -7,7 +7,9 @@ if [ "$(id -u)" = 0 ]; then
   apt-get update -qq
   DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends \
     build-essential cmake ninja-build ccache python3 libsqlite3-dev nlohmann-json3-dev \
-    libboost-regex-dev libgtest-dev libgmock-dev libbenchmark-dev libxml2-utils sqlite3 >/dev/null
+    libboost-regex-dev libgtest-dev libgmock-dev libbenchmark-dev libxml2-utils sqlite3 \
+    pkg-config libnl-3-dev libnl-route-3-dev libnl-genl-3-dev libnl-xfrm-3-dev iproute2 ethtool \
+    >/dev/null
 fi
 cmake --preset default >/dev/null
 cmake --build --preset default -j"$(nproc)"
