@@ -1,0 +1,279 @@
+//===- linux/host/Routing.cpp - Routes and neighbours of a netstack --------===//
+//
+// Routes are those of the main table (ip route show), of every type; a route
+// with several next hops is shown with its first. The source of a route is
+// the kernel's protocol: "connected" for the kernel's own, "dhcp" for a DHCP
+// client's or a router advertisement's, "user" for the rest. Neighbours are
+// those `ip neigh show` lists (entries that need no resolution left out).
+//
+//===----------------------------------------------------------------------===//
+#include "Host.h"
+
+#include "HostCtl/Network/Routing.h"
+#include "LinuxNet/Neighbours.h"
+#include "LinuxNet/Routes.h"
+#include "TvkCtl/Network/RoutingInfoImpl.h"
+
+#include <algorithm>
+
+namespace LinuxHost {
+
+using namespace HostCtl::Network;
+namespace Ops = HostCtl::Backend;
+using TvkCtl::Network::RoutingInfoImpl;
+
+namespace {
+
+LinuxNet::IpAddress V4(uint32_t hostOrder) {
+  uint8_t bytes[4] = {static_cast<uint8_t>(hostOrder >> 24), static_cast<uint8_t>(hostOrder >> 16),
+                      static_cast<uint8_t>(hostOrder >> 8), static_cast<uint8_t>(hostOrder)};
+  return LinuxNet::IpAddress::FromBytes(bytes, 4);
+}
+LinuxNet::IpAddress V6(const Ipv6Address& address) {
+  return LinuxNet::IpAddress::FromBytes(address.GetBytes().data(), 16);
+}
+uint32_t HostOrder(const LinuxNet::IpAddress& a) {
+  return (uint32_t{a.bytes[0]} << 24) | (uint32_t{a.bytes[1]} << 16) | (uint32_t{a.bytes[2]} << 8) |
+         a.bytes[3];
+}
+Ipv6Address ToV6(const LinuxNet::IpAddress& a) {
+  std::array<uint8_t, 16> bytes{};
+  std::copy(a.bytes.begin(), a.bytes.end(), bytes.begin());
+  return Ipv6Address(bytes);
+}
+
+const char* SourceOf(uint8_t protocol) {
+  switch (protocol) {
+  case 2:
+    return RoutingInfoImpl::SOURCE_CONNECTED; // kernel
+  case 9:                                     // router advertisement
+  case 16:
+    return RoutingInfoImpl::SOURCE_DHCP; // dhcp
+  default:
+    return RoutingInfoImpl::SOURCE_USER;
+  }
+}
+
+/// The gateway and device of a route, its first hop for a multipath one.
+std::pair<LinuxNet::IpAddress, std::string> HopOf(const LinuxNet::Route& route) {
+  if (route.nextHops.empty())
+    return {route.gateway, route.device};
+  return {route.nextHops[0].gateway, route.nextHops[0].device};
+}
+
+/// Neighbour type codes of the routing service's table.
+int TypeCode(const LinuxNet::Neighbour& n) {
+  if (n.flags & 0x80)
+    return 4; // Router
+  if (n.state & LinuxNet::NudPermanent)
+    return 2; // Static
+  return 1;   // Dynamic
+}
+int StateCode(uint16_t state) {
+  if (state & LinuxNet::NudIncomplete)
+    return 0;
+  if (state & LinuxNet::NudStale)
+    return 2;
+  if (state & LinuxNet::NudDelay)
+    return 3;
+  if (state & LinuxNet::NudProbe)
+    return 4;
+  if (state & LinuxNet::NudFailed)
+    return 5;
+  return 1; // Reachable, and permanent entries that need no probing.
+}
+
+class Routing final : public Ops::Routing {
+public:
+  Routing(Context& ctx, std::string netstack) : ctx_(ctx), netstack_(std::move(netstack)) {}
+
+  void SetNetstackInstanceKey(const std::string& key) override {
+    netstack_ = key;
+    holder_.reset();
+    ns_ = nullptr;
+  }
+
+  std::vector<Ipv4Route> GetCurrentTarvikRoutes(PortsetGetType selector) override {
+    std::vector<Ipv4Route> routes;
+    if (selector != PortsetGetRegular)
+      return routes;
+    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4)) {
+      auto [gateway, device] = HopOf(route);
+      Ipv4Network network(Ipv4Address(HostOrder(route.destination.address)),
+                          Ipv4Address::FromPrefixLength(route.destination.length));
+      routes.emplace_back(network, Ipv4Address(gateway.IsSet() ? HostOrder(gateway) : 0), device);
+    }
+    return routes;
+  }
+  void AddTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) override {
+    Add(V4(network.GetNetwork().GetValue()), network.GetPrefixLength(), V4(gateway.GetValue()),
+        gateway.GetValue() == 0);
+  }
+  void RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) override {
+    Remove(V4(network.GetNetwork().GetValue()), network.GetPrefixLength(), V4(gateway.GetValue()),
+           gateway.GetValue() == 0);
+  }
+  Ipv4Address GetTvKernelDefaultGateway() override {
+    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
+      if (route.destination.length == 0 && HopOf(route).first.IsSet())
+        return Ipv4Address(HostOrder(HopOf(route).first));
+    return Ipv4Address();
+  }
+  Ipv4Address GetTvKernelConfigDefaultGateway() override { return GetTvKernelDefaultGateway(); }
+  void SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool) override {
+    SetDefault(LinuxNet::Family::Ipv4, V4(gateway.GetValue()), gateway.GetValue() == 0);
+  }
+  std::string GetDefaultGatewaySource(const Ipv4Network& network) override {
+    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
+      if (route.destination.length == network.GetPrefixLength() &&
+          HostOrder(route.destination.address) == network.GetNetwork().GetValue())
+        return SourceOf(route.protocol);
+    return "";
+  }
+
+  std::vector<Ipv6Route> GetCurrentIpv6TarvikRoutes(PortsetGetType selector) override {
+    std::vector<Ipv6Route> routes;
+    if (selector != PortsetGetRegular)
+      return routes;
+    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv6)) {
+      auto [gateway, device] = HopOf(route);
+      routes.emplace_back(Ipv6Network(ToV6(route.destination.address), route.destination.length),
+                          gateway.IsSet() ? ToV6(gateway) : Ipv6Address(), device);
+    }
+    return routes;
+  }
+  void AddIpv6TarvikRoute(const Ipv6Network& network, const Ipv6Address& gateway) override {
+    Add(V6(network.GetAddress()), network.GetNetmask(), V6(gateway), gateway.IsUnspecified());
+  }
+  void RemoveIpv6TarvikRoute(const Ipv6Network& network, const Ipv6Address& gateway) override {
+    Remove(V6(network.GetAddress()), network.GetNetmask(), V6(gateway), gateway.IsUnspecified());
+  }
+  Ipv6Address GetIpv6TvKernelDefaultGateway() override {
+    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv6))
+      if (route.destination.length == 0 && HopOf(route).first.IsSet())
+        return ToV6(HopOf(route).first);
+    return Ipv6Address();
+  }
+  Ipv6Address GetIpv6TvKernelConfigDefaultGateway() override {
+    return GetIpv6TvKernelDefaultGateway();
+  }
+  void SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) override {
+    SetDefault(LinuxNet::Family::Ipv6, V6(gateway), gateway.IsUnspecified());
+  }
+
+  void GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& list,
+                                     const std::string& interfaceName,
+                                     PortsetGetType selector) override {
+    list.clear();
+    if (selector != PortsetGetRegular)
+      return;
+    for (const LinuxNet::Neighbour& n : Neighbours(LinuxNet::Family::Ipv4, interfaceName))
+      list.emplace_back(Ipv4Address(HostOrder(n.address)), LinuxNet::FormatHwAddress(n.lladdr),
+                        n.device, 0, TypeCode(n), StateCode(n.state));
+  }
+  void GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& list,
+                                     const std::string& interfaceName,
+                                     PortsetGetType selector) override {
+    list.clear();
+    if (selector != PortsetGetRegular)
+      return;
+    for (const LinuxNet::Neighbour& n : Neighbours(LinuxNet::Family::Ipv6, interfaceName))
+      list.emplace_back(ToV6(n.address), LinuxNet::FormatHwAddress(n.lladdr), n.device, 0,
+                        TypeCode(n), StateCode(n.state));
+  }
+  void RemoveIpv4Neighbor(const Ipv4Neighbor& neighbor) override {
+    RemoveNeighbour(V4(neighbor.GetAddress().GetValue()), neighbor.GetInterfaceName());
+  }
+  void RemoveIpv6Neighbor(const Ipv6Neighbor& neighbor) override {
+    RemoveNeighbour(V6(neighbor.GetAddress()), neighbor.GetInterfaceName());
+  }
+
+private:
+  LinuxNet::Namespace& Ns() {
+    if (!ns_)
+      ns_ = &NetstackNamespace(ctx_, netstack_, holder_);
+    return *ns_;
+  }
+  /// The main table of one family, read once per object.
+  const std::vector<LinuxNet::Route>& Routes(LinuxNet::Family family) {
+    auto& cache = family == LinuxNet::Family::Ipv4 ? v4_ : v6_;
+    if (!cache)
+      cache = Kernel([&] { return LinuxNet::ListRoutes(Ns(), family); });
+    return *cache;
+  }
+  std::vector<LinuxNet::Neighbour> Neighbours(LinuxNet::Family family, const std::string& device) {
+    std::vector<LinuxNet::Neighbour> all =
+        Kernel([&] { return LinuxNet::ListNeighbours(Ns(), family); });
+    std::erase_if(all, [&](const LinuxNet::Neighbour& n) {
+      return (n.state & LinuxNet::NudNoArp) || (!device.empty() && n.device != device);
+    });
+    return all;
+  }
+  void Add(const LinuxNet::IpAddress& network, int length, const LinuxNet::IpAddress& gateway,
+           bool direct) {
+    if (direct)
+      Refuse("A route on a Linux host needs a gateway; a directly connected network is the route "
+             "of an interface's address");
+    LinuxNet::RouteSpec spec;
+    spec.destination = {network, static_cast<uint8_t>(length)};
+    spec.gateway = gateway;
+    Kernel([&] { LinuxNet::AddRoute(Ns(), spec); });
+    Forget();
+  }
+  void Remove(const LinuxNet::IpAddress& network, int length, const LinuxNet::IpAddress& gateway,
+              bool direct) {
+    LinuxNet::RouteSpec spec;
+    spec.destination = {network, static_cast<uint8_t>(length)};
+    if (!direct)
+      spec.gateway = gateway;
+    spec.protocol = 0;
+    Kernel([&] { LinuxNet::DeleteRoute(Ns(), spec); });
+    Forget();
+  }
+  void SetDefault(LinuxNet::Family family, const LinuxNet::IpAddress& gateway, bool none) {
+    LinuxNet::RouteSpec spec;
+    spec.destination.address.family = family;
+    if (none) {
+      bool any = false;
+      for (const LinuxNet::Route& route : Routes(family))
+        any = any || route.destination.length == 0;
+      if (any) {
+        spec.protocol = 0;
+        Kernel([&] { LinuxNet::DeleteRoute(Ns(), spec); });
+      }
+    } else {
+      spec.gateway = gateway;
+      Kernel([&] { LinuxNet::AddRoute(Ns(), spec, true); });
+    }
+    Forget();
+  }
+  void RemoveNeighbour(const LinuxNet::IpAddress& address, const std::string& device) {
+    std::string dev = device;
+    if (dev.empty())
+      for (const LinuxNet::Neighbour& n : Neighbours(address.family, ""))
+        if (n.address == address)
+          dev = n.device;
+    if (dev.empty())
+      Refuse("neighbour " + address.ToString() + ": not found");
+    Kernel([&] { LinuxNet::DeleteNeighbour(Ns(), dev, address); });
+  }
+  void Forget() {
+    v4_.reset();
+    v6_.reset();
+  }
+
+  Context& ctx_;                                   ///< The host.
+  std::string netstack_;                           ///< Key.
+  std::unique_ptr<LinuxNet::Namespace> holder_;    ///< Another netstack, opened.
+  LinuxNet::Namespace* ns_ = nullptr;              ///< The netstack's namespace.
+  std::optional<std::vector<LinuxNet::Route>> v4_; ///< Routes read.
+  std::optional<std::vector<LinuxNet::Route>> v6_; ///< Routes read.
+};
+
+} // namespace
+
+std::unique_ptr<Ops::Routing> MakeRouting(Context& ctx, const std::string& netstack) {
+  return std::make_unique<Routing>(ctx, netstack);
+}
+
+} // namespace LinuxHost
