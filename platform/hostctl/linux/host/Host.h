@@ -13,6 +13,7 @@
 
 #include "HostCtl/Lib.h"
 #include "LinuxNet/Error.h"
+#include "LinuxNet/Ethtool.h"
 #include "LinuxNet/Links.h"
 #include "LinuxNet/Namespace.h"
 #include "backend/Backend.h"
@@ -66,7 +67,9 @@ std::string LinkName(const std::vector<LinuxNet::Link>& links, int index);
 std::unique_ptr<HostCtl::Backend::Network> MakeNetwork(Context& ctx);
 std::unique_ptr<HostCtl::Backend::Pnic> MakePnic(Context& ctx, const std::string& name);
 /// A NIC whose link was read already (listings).
-std::unique_ptr<HostCtl::Backend::Pnic> MakeListedPnic(Context& ctx, const LinuxNet::Link& link);
+/// A NIC whose link (and link modes, when given) were read already: listings.
+std::unique_ptr<HostCtl::Backend::Pnic> MakeListedPnic(Context& ctx, const LinuxNet::Link& link,
+                                                       const LinuxNet::LinkModes* modes = nullptr);
 std::unique_ptr<HostCtl::Backend::Dcb> MakeDcb(Context& ctx, const std::string& name);
 std::unique_ptr<HostCtl::Network::TvKernelNicInfo> MakeKernelNics(Context& ctx);
 std::unique_ptr<HostCtl::Backend::Routing> MakeRouting(Context& ctx, const std::string& netstack);

@@ -138,11 +138,20 @@ class Network final : public Ops::Network {
 public:
   explicit Network(Context& ctx) : ctx_(ctx) {}
 
+  /// One link dump and one ethtool dump of link modes for all NICs.
   std::vector<std::unique_ptr<Pnic>> GetPnics(PnicGetType) override {
     std::vector<std::unique_ptr<Pnic>> nics;
-    for (const LinuxNet::Link& link : Kernel([&] { return LinuxNet::ListLinks(ctx_.ns); }))
-      if (IsNic(link))
-        nics.push_back(MakeListedPnic(ctx_, link));
+    std::vector<LinuxNet::LinkModes> modes;
+    for (const LinuxNet::Link& link : Kernel([&] { return LinuxNet::ListLinks(ctx_.ns); })) {
+      if (!IsNic(link))
+        continue;
+      if (nics.empty())
+        modes = Kernel([&] { return LinuxNet::DumpLinkModes(ctx_.ns); });
+      auto found = std::find_if(modes.begin(), modes.end(), [&](const LinuxNet::LinkModes& m) {
+        return m.ifindex == link.index;
+      });
+      nics.push_back(MakeListedPnic(ctx_, link, found == modes.end() ? nullptr : &*found));
+    }
     return nics;
   }
   std::unique_ptr<Pnic> GetPnicByName(const std::string& name) override {

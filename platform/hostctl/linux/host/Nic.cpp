@@ -157,8 +157,9 @@ private:
 
 class Nic final : public Ops::Pnic {
 public:
-  Nic(Context& ctx, std::string name, std::optional<LinuxNet::Link> link = std::nullopt)
-      : ctx_(ctx), name_(std::move(name)), link_(std::move(link)) {}
+  Nic(Context& ctx, std::string name, std::optional<LinuxNet::Link> link = std::nullopt,
+      std::optional<LinuxNet::LinkModes> modes = std::nullopt)
+      : ctx_(ctx), name_(std::move(name)), link_(std::move(link)), modes_(std::move(modes)) {}
 
   void Refresh() override {
     link_.reset();
@@ -690,8 +691,10 @@ std::unique_ptr<Ops::Pnic> MakePnic(Context& ctx, const std::string& name) {
   return std::make_unique<Nic>(ctx, name);
 }
 
-std::unique_ptr<Ops::Pnic> MakeListedPnic(Context& ctx, const LinuxNet::Link& link) {
-  return std::make_unique<Nic>(ctx, link.name, link);
+std::unique_ptr<Ops::Pnic> MakeListedPnic(Context& ctx, const LinuxNet::Link& link,
+                                          const LinuxNet::LinkModes* modes) {
+  return std::make_unique<Nic>(ctx, link.name, link,
+                               modes ? std::optional<LinuxNet::LinkModes>(*modes) : std::nullopt);
 }
 
 std::unique_ptr<Ops::Dcb> MakeDcb(Context& ctx, const std::string& name) {

@@ -15,6 +15,7 @@
 #include "TvkCtl/Network/RoutingInfoImpl.h"
 
 #include <algorithm>
+#include <unordered_map>
 
 namespace LinuxHost {
 
@@ -123,12 +124,18 @@ public:
   void SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool) override {
     SetDefault(LinuxNet::Family::Ipv4, V4(gateway.GetValue()), gateway.GetValue() == 0);
   }
+  /// Asked once per listed route: the sources are indexed on first use.
   std::string GetDefaultGatewaySource(const Ipv4Network& network) override {
-    for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
-      if (route.destination.length == network.GetPrefixLength() &&
-          HostOrder(route.destination.address) == network.GetNetwork().GetValue())
-        return SourceOf(route.protocol);
-    return "";
+    if (!sources_) {
+      sources_.emplace();
+      sources_->reserve(Routes(LinuxNet::Family::Ipv4).size());
+      for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
+        sources_->emplace(SourceKey(HostOrder(route.destination.address), route.destination.length),
+                          route.protocol);
+    }
+    auto found =
+        sources_->find(SourceKey(network.GetNetwork().GetValue(), network.GetPrefixLength()));
+    return found == sources_->end() ? "" : SourceOf(found->second);
   }
 
   std::vector<Ipv6Route> GetCurrentIpv6TarvikRoutes(PortsetGetType selector) override {
@@ -260,6 +267,10 @@ private:
   void Forget() {
     v4_.reset();
     v6_.reset();
+    sources_.reset();
+  }
+  static uint64_t SourceKey(uint32_t network, int length) {
+    return (uint64_t{network} << 8) | static_cast<uint8_t>(length);
   }
 
   Context& ctx_;                                   ///< The host.
@@ -268,6 +279,8 @@ private:
   LinuxNet::Namespace* ns_ = nullptr;              ///< The netstack's namespace.
   std::optional<std::vector<LinuxNet::Route>> v4_; ///< Routes read.
   std::optional<std::vector<LinuxNet::Route>> v6_; ///< Routes read.
+  /// Kernel protocol of each IPv4 route, by network and length.
+  std::optional<std::unordered_map<uint64_t, uint8_t>> sources_;
 };
 
 } // namespace
