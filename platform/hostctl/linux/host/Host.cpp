@@ -45,6 +45,26 @@ std::string LinkName(const std::vector<LinuxNet::Link>& links, int index) {
   return "";
 }
 
+LinuxNet::IpAddress FromIpv4(const HostCtl::Network::Ipv4Address& address) {
+  uint32_t v = address.GetValue();
+  uint8_t bytes[4] = {static_cast<uint8_t>(v >> 24), static_cast<uint8_t>(v >> 16),
+                      static_cast<uint8_t>(v >> 8), static_cast<uint8_t>(v)};
+  return LinuxNet::IpAddress::FromBytes(bytes, 4);
+}
+LinuxNet::IpAddress FromIpv6(const HostCtl::Network::Ipv6Address& address) {
+  return LinuxNet::IpAddress::FromBytes(address.GetBytes().data(), 16);
+}
+HostCtl::Network::Ipv4Address ToIpv4(const LinuxNet::IpAddress& address) {
+  const auto& b = address.bytes;
+  return HostCtl::Network::Ipv4Address((uint32_t{b[0]} << 24) | (uint32_t{b[1]} << 16) |
+                                       (uint32_t{b[2]} << 8) | b[3]);
+}
+HostCtl::Network::Ipv6Address ToIpv6(const LinuxNet::IpAddress& address) {
+  std::array<uint8_t, 16> bytes{};
+  std::copy(address.bytes.begin(), address.bytes.end(), bytes.begin());
+  return HostCtl::Network::Ipv6Address(bytes);
+}
+
 void Refuse(const std::string& message) {
   throw HostCtlException(message);
 }

@@ -12,6 +12,7 @@
 #pragma once
 
 #include "HostCtl/Lib.h"
+#include "HostCtl/Network/Address.h"
 #include "LinuxNet/Error.h"
 #include "LinuxNet/Ethtool.h"
 #include "LinuxNet/Links.h"
@@ -58,6 +59,12 @@ inline bool IsBridge(const LinuxNet::Link& link) {
 std::optional<LinuxNet::Link> FindLink(Context& ctx, const std::string& name);
 /// The name of link \p index in \p links; "" when there is none.
 std::string LinkName(const std::vector<LinuxNet::Link>& links, int index);
+
+/// Addresses between the host library's values and linuxnet's.
+LinuxNet::IpAddress FromIpv4(const HostCtl::Network::Ipv4Address& address);
+LinuxNet::IpAddress FromIpv6(const HostCtl::Network::Ipv6Address& address);
+HostCtl::Network::Ipv4Address ToIpv4(const LinuxNet::IpAddress& address);
+HostCtl::Network::Ipv6Address ToIpv6(const LinuxNet::IpAddress& address);
 
 /// The refusal of a change that a Linux host cannot make, such as
 /// "the MTU of a kernel interface must be 1280 to 9000".

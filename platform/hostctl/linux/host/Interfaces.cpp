@@ -24,26 +24,6 @@ namespace Ops = HostCtl::Backend;
 
 namespace {
 
-LinuxNet::IpAddress FromIpv4(const Ipv4Address& address) {
-  uint32_t v = address.GetValue();
-  uint8_t bytes[4] = {static_cast<uint8_t>(v >> 24), static_cast<uint8_t>(v >> 16),
-                      static_cast<uint8_t>(v >> 8), static_cast<uint8_t>(v)};
-  return LinuxNet::IpAddress::FromBytes(bytes, 4);
-}
-LinuxNet::IpAddress FromIpv6(const Ipv6Address& address) {
-  return LinuxNet::IpAddress::FromBytes(address.GetBytes().data(), 16);
-}
-Ipv4Address ToIpv4(const LinuxNet::IpAddress& address) {
-  const auto& b = address.bytes;
-  return Ipv4Address((uint32_t{b[0]} << 24) | (uint32_t{b[1]} << 16) | (uint32_t{b[2]} << 8) |
-                     b[3]);
-}
-Ipv6Address ToIpv6(const LinuxNet::IpAddress& address) {
-  std::array<uint8_t, 16> bytes{};
-  std::copy(address.bytes.begin(), address.bytes.end(), bytes.begin());
-  return Ipv6Address(bytes);
-}
-
 /// The IPv6 address type the kernel can tell: set by router advertisement
 /// or made by the kernel (link-local), expiring (a DHCPv6 lease), else static.
 int Ipv6Type(const LinuxNet::Address& address) {

@@ -25,24 +25,6 @@ using TvkCtl::Network::RoutingInfoImpl;
 
 namespace {
 
-LinuxNet::IpAddress V4(uint32_t hostOrder) {
-  uint8_t bytes[4] = {static_cast<uint8_t>(hostOrder >> 24), static_cast<uint8_t>(hostOrder >> 16),
-                      static_cast<uint8_t>(hostOrder >> 8), static_cast<uint8_t>(hostOrder)};
-  return LinuxNet::IpAddress::FromBytes(bytes, 4);
-}
-LinuxNet::IpAddress V6(const Ipv6Address& address) {
-  return LinuxNet::IpAddress::FromBytes(address.GetBytes().data(), 16);
-}
-uint32_t HostOrder(const LinuxNet::IpAddress& a) {
-  return (uint32_t{a.bytes[0]} << 24) | (uint32_t{a.bytes[1]} << 16) | (uint32_t{a.bytes[2]} << 8) |
-         a.bytes[3];
-}
-Ipv6Address ToV6(const LinuxNet::IpAddress& a) {
-  std::array<uint8_t, 16> bytes{};
-  std::copy(a.bytes.begin(), a.bytes.end(), bytes.begin());
-  return Ipv6Address(bytes);
-}
-
 const char* SourceOf(uint8_t protocol) {
   switch (protocol) {
   case 2:
@@ -100,29 +82,29 @@ public:
       return routes;
     for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4)) {
       auto [gateway, device] = HopOf(route);
-      Ipv4Network network(Ipv4Address(HostOrder(route.destination.address)),
+      Ipv4Network network(ToIpv4(route.destination.address),
                           Ipv4Address::FromPrefixLength(route.destination.length));
-      routes.emplace_back(network, Ipv4Address(gateway.IsSet() ? HostOrder(gateway) : 0), device);
+      routes.emplace_back(network, gateway.IsSet() ? ToIpv4(gateway) : Ipv4Address(), device);
     }
     return routes;
   }
   void AddTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) override {
-    Add(V4(network.GetNetwork().GetValue()), network.GetPrefixLength(), V4(gateway.GetValue()),
+    Add(FromIpv4(network.GetNetwork()), network.GetPrefixLength(), FromIpv4(gateway),
         gateway.GetValue() == 0);
   }
   void RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Address& gateway) override {
-    Remove(V4(network.GetNetwork().GetValue()), network.GetPrefixLength(), V4(gateway.GetValue()),
+    Remove(FromIpv4(network.GetNetwork()), network.GetPrefixLength(), FromIpv4(gateway),
            gateway.GetValue() == 0);
   }
   Ipv4Address GetTvKernelDefaultGateway() override {
     for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
       if (route.destination.length == 0 && HopOf(route).first.IsSet())
-        return Ipv4Address(HostOrder(HopOf(route).first));
+        return ToIpv4(HopOf(route).first);
     return Ipv4Address();
   }
   Ipv4Address GetTvKernelConfigDefaultGateway() override { return GetTvKernelDefaultGateway(); }
   void SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool) override {
-    SetDefault(LinuxNet::Family::Ipv4, V4(gateway.GetValue()), gateway.GetValue() == 0);
+    SetDefault(LinuxNet::Family::Ipv4, FromIpv4(gateway), gateway.GetValue() == 0);
   }
   /// Asked once per listed route: the sources are indexed on first use.
   std::string GetDefaultGatewaySource(const Ipv4Network& network) override {
@@ -130,8 +112,9 @@ public:
       sources_.emplace();
       sources_->reserve(Routes(LinuxNet::Family::Ipv4).size());
       for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv4))
-        sources_->emplace(SourceKey(HostOrder(route.destination.address), route.destination.length),
-                          route.protocol);
+        sources_->emplace(
+            SourceKey(ToIpv4(route.destination.address).GetValue(), route.destination.length),
+            route.protocol);
     }
     auto found =
         sources_->find(SourceKey(network.GetNetwork().GetValue(), network.GetPrefixLength()));
@@ -144,28 +127,30 @@ public:
       return routes;
     for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv6)) {
       auto [gateway, device] = HopOf(route);
-      routes.emplace_back(Ipv6Network(ToV6(route.destination.address), route.destination.length),
-                          gateway.IsSet() ? ToV6(gateway) : Ipv6Address(), device);
+      routes.emplace_back(Ipv6Network(ToIpv6(route.destination.address), route.destination.length),
+                          gateway.IsSet() ? ToIpv6(gateway) : Ipv6Address(), device);
     }
     return routes;
   }
   void AddIpv6TarvikRoute(const Ipv6Network& network, const Ipv6Address& gateway) override {
-    Add(V6(network.GetAddress()), network.GetNetmask(), V6(gateway), gateway.IsUnspecified());
+    Add(FromIpv6(network.GetAddress()), network.GetNetmask(), FromIpv6(gateway),
+        gateway.IsUnspecified());
   }
   void RemoveIpv6TarvikRoute(const Ipv6Network& network, const Ipv6Address& gateway) override {
-    Remove(V6(network.GetAddress()), network.GetNetmask(), V6(gateway), gateway.IsUnspecified());
+    Remove(FromIpv6(network.GetAddress()), network.GetNetmask(), FromIpv6(gateway),
+           gateway.IsUnspecified());
   }
   Ipv6Address GetIpv6TvKernelDefaultGateway() override {
     for (const LinuxNet::Route& route : Routes(LinuxNet::Family::Ipv6))
       if (route.destination.length == 0 && HopOf(route).first.IsSet())
-        return ToV6(HopOf(route).first);
+        return ToIpv6(HopOf(route).first);
     return Ipv6Address();
   }
   Ipv6Address GetIpv6TvKernelConfigDefaultGateway() override {
     return GetIpv6TvKernelDefaultGateway();
   }
   void SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) override {
-    SetDefault(LinuxNet::Family::Ipv6, V6(gateway), gateway.IsUnspecified());
+    SetDefault(LinuxNet::Family::Ipv6, FromIpv6(gateway), gateway.IsUnspecified());
   }
 
   void GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& list,
@@ -175,8 +160,8 @@ public:
     if (selector != PortsetGetRegular)
       return;
     for (const LinuxNet::Neighbour& n : Neighbours(LinuxNet::Family::Ipv4, interfaceName))
-      list.emplace_back(Ipv4Address(HostOrder(n.address)), LinuxNet::FormatHwAddress(n.lladdr),
-                        n.device, 0, TypeCode(n), StateCode(n.state));
+      list.emplace_back(ToIpv4(n.address), LinuxNet::FormatHwAddress(n.lladdr), n.device, 0,
+                        TypeCode(n), StateCode(n.state));
   }
   void GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& list,
                                      const std::string& interfaceName,
@@ -185,14 +170,14 @@ public:
     if (selector != PortsetGetRegular)
       return;
     for (const LinuxNet::Neighbour& n : Neighbours(LinuxNet::Family::Ipv6, interfaceName))
-      list.emplace_back(ToV6(n.address), LinuxNet::FormatHwAddress(n.lladdr), n.device, 0,
+      list.emplace_back(ToIpv6(n.address), LinuxNet::FormatHwAddress(n.lladdr), n.device, 0,
                         TypeCode(n), StateCode(n.state));
   }
   void RemoveIpv4Neighbor(const Ipv4Neighbor& neighbor) override {
-    RemoveNeighbour(V4(neighbor.GetAddress().GetValue()), neighbor.GetInterfaceName());
+    RemoveNeighbour(FromIpv4(neighbor.GetAddress()), neighbor.GetInterfaceName());
   }
   void RemoveIpv6Neighbor(const Ipv6Neighbor& neighbor) override {
-    RemoveNeighbour(V6(neighbor.GetAddress()), neighbor.GetInterfaceName());
+    RemoveNeighbour(FromIpv6(neighbor.GetAddress()), neighbor.GetInterfaceName());
   }
 
 private:
