@@ -15,18 +15,39 @@ with their expected output:
 All commands of one file share one fresh host, so later commands see the
 changes of earlier ones. Run with --update to rewrite the expected output from
 what the tools print now; review the diff before committing it.
+
+A case file can name the Linux host instead (root only; without root the file
+is skipped with the reason):
+
+    host: linux               (a lab network namespace made for this file)
+    setup: ip link add vmnic0 address 02:00:00:00:00:10 type veth peer name peer0
+                              (run as `ip -n LAB ...`; likewise `bridge ...`)
+    setup: exec sysctl -qw net.ipv6.conf.all.accept_dad=0
+                              (run as `ip netns exec LAB ...`)
+    setup: file hosts 192.0.2.7 web.lab
+                              (a line appended to /etc/netns/LAB/hosts)
+
+The setup lines run in order before the first command; the commands run with
+OSTRACLI_HOST=netns:LAB. The word LAB in a command or setup line stands for the
+namespace's name, and the name is shown as LAB in the outputs compared. Give
+links fixed MAC addresses so that outputs stay the same from run to run. The
+lab and /etc/netns/LAB are deleted afterwards, whatever happened.
 """
 import argparse
 import concurrent.futures
+import itertools
 import os
 import pathlib
 import shlex
+import shutil
 import subprocess
 import sys
 import tempfile
 
+LAB_COUNTER = itertools.count()
 
-def parse_case(path):
+
+def parse_case(path, setup=None):
     host = None
     steps = []
     comments = []  # comment lines met since the last step, kept for --update
@@ -34,6 +55,11 @@ def parse_case(path):
         line = raw
         if line.startswith("host:"):
             host = line[5:].strip()
+        elif line.startswith("setup:"):
+            if setup is None or steps:
+                raise ValueError(f"{path}:{number}: setup lines come before the commands "
+                                 "of a Linux host case")
+            setup.append(line[6:].strip())
         elif line.startswith("$ "):
             steps.append({"command": line[2:], "out": [], "err": [], "status": 0, "line": number,
                           "comments": comments if steps else []})
@@ -66,8 +92,105 @@ def lines_of(data):
     return text.split("\n") if text else []
 
 
+class Lab:
+    """A throwaway network namespace for one case file, deleted on exit."""
+
+    def __init__(self, setup):
+        self.name = f"ostra-e2e-{os.getpid()}-{next(LAB_COUNTER)}"
+        self.setup = setup
+
+    def run(self, argv):
+        done = subprocess.run(argv, capture_output=True)
+        if done.returncode != 0:
+            raise ValueError(f"setup failed: {' '.join(argv)}: {done.stderr.decode().strip()}")
+
+    def __enter__(self):
+        self.run(["ip", "netns", "add", self.name])
+        try:
+            for line in self.setup:
+                words = shlex.split(line.replace("LAB", self.name))
+                if words[0] in ("ip", "bridge"):
+                    self.run([words[0], "-n", self.name] + words[1:])
+                elif words[0] == "exec":
+                    self.run(["ip", "netns", "exec", self.name] + words[1:])
+                elif words[0] == "file" and len(words) >= 2:
+                    directory = pathlib.Path("/etc/netns") / self.name
+                    directory.mkdir(parents=True, exist_ok=True)
+                    with open(directory / words[1], "a", encoding="utf-8") as out:
+                        out.write(" ".join(words[2:]) + "\n")
+                else:
+                    raise ValueError(f"unknown setup line: {line}")
+        except BaseException:
+            self.__exit__(None, None, None)
+            raise
+        return self
+
+    def __exit__(self, *exc):
+        subprocess.run(["ip", "netns", "del", self.name], capture_output=True)
+        shutil.rmtree(pathlib.Path("/etc/netns") / self.name, ignore_errors=True)
+
+
+def linux_skip_reason():
+    if os.geteuid() != 0:
+        return "a Linux host case builds a network namespace lab, which needs root"
+    if shutil.which("ip") is None:
+        return "a Linux host case needs iproute2 (ip)"
+    return None
+
+
 def run_case(path, tools, update):
-    host, steps = parse_case(path)
+    setup = []
+    host, steps = parse_case(path, setup)
+    if host == "linux":
+        reason = linux_skip_reason()
+        if reason:
+            return [], None, reason
+        with Lab(setup) as lab:
+            failures = run_steps(path, steps, tools, update, {"OSTRACLI_HOST": f"netns:{lab.name}"},
+                                 lab.name)
+        return failures, (host, steps), None
+    if setup:
+        raise ValueError(f"{path}: setup lines belong to a Linux host case")
+    failures, parsed = run_simulated_case(path, host, steps, tools, update)
+    return failures, parsed, None
+
+
+def run_steps(path, steps, tools, update, env_extra, lab):
+    """Runs the commands of a Linux host case in its lab."""
+    failures = []
+    env = dict(os.environ)
+    env.update({"COLUMNS": "80", "LC_ALL": "C"})
+    env.update(env_extra)
+    env.pop("OSTRACLI_PLUGIN_DIR", None)
+    for step in steps:
+        argv = shlex.split(step["command"].replace("LAB", lab))
+        if argv and argv[0] in tools:
+            argv[0] = tools[argv[0]]
+        done = subprocess.run(argv, env=env, capture_output=True, cwd=str(path.parent))
+        out = [l.replace(lab, "LAB") for l in lines_of(done.stdout)]
+        err = [l.replace(lab, "LAB") for l in lines_of(done.stderr)]
+        failures += compare(path, step, out, err, done.returncode, update)
+    return failures
+
+
+def compare(path, step, out, err, status, update):
+    if update:
+        step["out"], step["err"], step["status"] = out, err, status
+        return []
+    if out == step["out"] and err == step["err"] and status == step["status"]:
+        return []
+    report = [f"{path}:{step['line']}: $ {step['command']}"]
+    if status != step["status"]:
+        report.append(f"  exit status {status}, expected {step['status']}")
+    for name, got, want in (("stdout", out, step["out"]), ("stderr", err, step["err"])):
+        if got != want:
+            report.append(f"  {name} differs:")
+            report += [f"    - {l}" for l in want]
+            report += [f"    + {l}" for l in got]
+    return ["\n".join(report)]
+
+
+def run_simulated_case(path, host, steps, tools, update):
     failures = []
     with tempfile.TemporaryDirectory(prefix="ostra-e2e-") as tmp:
         db = os.path.join(tmp, "host.db")
@@ -88,20 +211,8 @@ def run_case(path, tools, update):
             if argv and argv[0] in tools:
                 argv[0] = tools[argv[0]]
             done = subprocess.run(argv, env=env, capture_output=True, cwd=str(path.parent))
-            out, err = lines_of(done.stdout), lines_of(done.stderr)
-            if update:
-                step["out"], step["err"], step["status"] = out, err, done.returncode
-                continue
-            if out != step["out"] or err != step["err"] or done.returncode != step["status"]:
-                report = [f"{path}:{step['line']}: $ {step['command']}"]
-                if done.returncode != step["status"]:
-                    report.append(f"  exit status {done.returncode}, expected {step['status']}")
-                for name, got, want in (("stdout", out, step["out"]), ("stderr", err, step["err"])):
-                    if got != want:
-                        report.append(f"  {name} differs:")
-                        report += [f"    - {l}" for l in want]
-                        report += [f"    + {l}" for l in got]
-                failures.append("\n".join(report))
+            failures += compare(path, step, lines_of(done.stdout), lines_of(done.stderr),
+                                done.returncode, update)
     return failures, (host, steps)
 
 
@@ -142,14 +253,18 @@ def main():
         try:
             return run_case(case, tools, args.update)
         except ValueError as error:
-            return [str(error)], None
+            return [f"{case}: {error}"], None, None
 
-    passed = failed = 0
+    passed = failed = skipped = 0
     # Each case file has its own host, so files run in parallel; results are
     # reported in file order.
     with concurrent.futures.ThreadPoolExecutor(max_workers=max(1, args.jobs)) as pool:
         results = list(pool.map(run, cases))
-    for case, (failures, parsed) in zip(cases, results):
+    for case, (failures, parsed, skip) in zip(cases, results):
+        if skip:
+            skipped += 1
+            print(f"{case}: skipped: {skip}")
+            continue
         if args.update and parsed:
             write_case(case, *parsed)
         if failures:
@@ -157,7 +272,7 @@ def main():
             print("\n".join(failures))
         else:
             passed += 1
-    print(f"e2e: {passed} passed, {failed} failed")
+    print(f"e2e: {passed} passed, {failed} failed" + (f", {skipped} skipped" if skipped else ""))
     return 1 if failed else 0
 
 

@@ -215,8 +215,17 @@ int RunBatch(const CommandTree& tree, const std::string& file,
     summary += "; " + fatal;
   if (!kept)
     summary += "; no change of the batch was kept";
+  // A host without transactions (the Linux kernel) applies a batch line by
+  // line; its summary always says so.
+  bool lineByLine = false;
+  try {
+    lineByLine = !HostCtl::Session::HasTransactions();
+  } catch (const HostCtl::Lib::HostCtlException&) {
+  }
+  if (lineByLine)
+    summary += "; applied line by line: the host has no transactions";
   // A batch that applied every line is as quiet as each line was.
-  if (failed > 0 || !kept)
+  if (failed > 0 || !kept || lineByLine)
     WriteAll(stderr, summary + "\n");
   if (!fatal.empty())
     worst = std::max(worst, static_cast<int>(ExitCommandError));

@@ -8,6 +8,7 @@
 //
 //===----------------------------------------------------------------------===//
 #include "Host.h"
+#include "HostCtl/Lib.h"
 
 #include "Fabrik/Format.h"
 
@@ -84,7 +85,12 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
   auto command = std::dynamic_pointer_cast<AutoCli::CommandSpec>(node);
   if (!command)
     return out;
-  std::shared_ptr<CallSpec::InputSpec> spec = command->GetInputSpec();
+  std::shared_ptr<CallSpec::InputSpec> spec;
+  try {
+    spec = command->GetInputSpec();
+  } catch (const HostCtl::Lib::HostCtlException&) {
+    return out; // A host that cannot answer completes no options.
+  }
   std::set<std::string> given;
   std::shared_ptr<CallSpec::ParameterSpec> pending;
   for (; i < count; ++i) {

@@ -82,7 +82,7 @@ std::string ExecutableDirectory() {
 
 /// The host state the run works on (SelectHost).
 struct HostChoice {
-  std::string path;       ///< --host value (a database file, linux or netns:NAME); "" before SelectHost.
+  std::string path; ///< --host value (a database file, linux or netns:NAME); "" before SelectHost.
   bool isDefault = false; ///< The default host, created on first use.
   std::string problem;    ///< Why the host cannot be used (no backend serves it), or "".
 };
@@ -379,7 +379,16 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     err += "Error: " + node->GetPathString(' ') + " cannot be run\n";
     return ExitUsage;
   }
-  std::shared_ptr<CallSpec::InputSpec> inputSpec = command->GetInputSpec();
+  // A command's options may come from the host (the congestion control
+  // algorithms of a netstack): a host that cannot answer is one line, never
+  // a crash of help or parsing.
+  std::shared_ptr<CallSpec::InputSpec> inputSpec;
+  try {
+    inputSpec = command->GetInputSpec();
+  } catch (const HostCtl::Lib::HostCtlException& e) {
+    err += (mode.inBatch ? "" : "ostracli: ") + std::string(e.what()) + "\n";
+    return ExitCommandError;
+  }
   if (wantsHelp) {
     out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
     return ExitOk;
@@ -521,6 +530,22 @@ int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
   if (timeout >= 0)
     HostCtl::Session::SetLockTimeout(timeout);
 
+  // A host without transactions cannot undo a command: --atomic would
+  // promise what it cannot keep.
+  if (first >= 0 && global.atomic && HostProblem().empty()) {
+    bool transactions = true;
+    try {
+      transactions = HostCtl::Session::HasTransactions();
+    } catch (const HostCtl::Lib::HostCtlException&) {
+    }
+    if (!transactions) {
+      std::fprintf(stderr,
+                   "Error: --atomic needs a host with transactions; the host %s applies each "
+                   "change as it is made\n",
+                   Chosen().path.c_str());
+      return ExitUsage;
+    }
+  }
   if (first >= 0 && !global.batch.empty()) {
     // The formatter options in front of --batch apply to every line.
     std::vector<std::string> defaults;

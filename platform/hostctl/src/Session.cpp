@@ -63,7 +63,7 @@ std::string LinuxModulePath() {
 /// Loads the Linux host's module, which registers its factories; false when
 /// it is not there.
 bool LoadLinuxModule() {
-  void* handle = ::dlopen(LinuxModulePath().c_str(), RTLD_NOW | RTLD_LOCAL);
+  void* handle = ::dlopen(LinuxModulePath().c_str(), RTLD_LAZY | RTLD_LOCAL);
   if (!handle)
     return false;
   using RegisterFn = void (*)();
