@@ -15,6 +15,7 @@
 #include "LinuxNet/Sysctl.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
 
 namespace LinuxHost {
@@ -203,10 +204,27 @@ private:
         LinuxNet::AddressSpec spec;
         spec.device = link_.name;
         spec.prefix = {FromIpv6(network.GetAddress()), static_cast<uint8_t>(network.GetNetmask())};
+        spec.noDad = !DetectsDuplicates();
         Kernel([&] { LinuxNet::AddAddress(ns_, spec); });
       }
     SetGateway(FromIpv6(current.GetIpv6Gateway()), FromIpv6(wanted.GetIpv6Gateway()),
                current.GetIpv6Gateway().IsUnspecified(), wanted.GetIpv6Gateway().IsUnspecified());
+  }
+  /// Whether the kernel runs duplicate address detection for IPv6 addresses
+  /// of this interface (it does unless accept_dad is off for the interface
+  /// and for all). Where it does not, the address is added as not needing it,
+  /// so that it is usable at once instead of tentative until the kernel's
+  /// work queue gets to it.
+  bool DetectsDuplicates() {
+    auto enabled = [&](const std::string& key) {
+      try {
+        return std::atoi(LinuxNet::ReadSysctl(ns_, key).c_str()) > 0;
+      } catch (const LinuxNet::Error&) {
+        return true;
+      }
+    };
+    return enabled("net.ipv6.conf.all.accept_dad") ||
+           enabled("net.ipv6.conf." + link_.name + ".accept_dad");
   }
   /// The default route through this interface.
   void SetGateway(const LinuxNet::IpAddress& from, const LinuxNet::IpAddress& to, bool fromNone,
