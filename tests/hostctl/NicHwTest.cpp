@@ -231,14 +231,11 @@ TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {
   ExpectRefusal([&] { nic.SetRingParams(ring); },
                 "The RX ring of vmnic0 takes at most 4096 entries, not 4097");
   ring.rx = 512;
-  ring.tx = 0;
-  ExpectRefusal([&] { nic.SetRingParams(ring); },
-                "The TX ring of vmnic0 is required; its size cannot be 0");
-  ring.tx = 2048;
   ring.rxMini = 1;
   ExpectRefusal([&] { nic.SetRingParams(ring); },
-                "vmnic0 has no RX mini ring; its size must be 0, not 1");
+                "vmnic0 has no RX mini ring; its size cannot be set");
   ring.rxMini = 0;
+  ring.tx = 2048;
   nic.SetRingParams(ring);
   PnicRingParams max{}, cur{};
   PnicImpl("vmnic0").GetRingParams(max, cur);
@@ -247,6 +244,26 @@ TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {
   EXPECT_EQ(cur.rx, 512u);
   EXPECT_EQ(cur.rxJumbo, 0u);
   EXPECT_EQ(cur.tx, 2048u);
+}
+
+TEST_F(NicHwTest, RingSizeZeroLeavesThatRingAsItIs) {
+  PnicImpl nic("vmnic0");
+  PnicRingParams ring{};
+  ring.tx = 1024;
+  nic.SetRingParams(ring); // RX and the rings the NIC lacks stay as they are.
+  PnicRingParams max{}, before{}, after{};
+  nic.GetRingParams(max, before);
+  EXPECT_EQ(before.tx, 1024u);
+  ring = {};
+  ring.rx = 256;
+  nic.SetRingParams(ring);
+  nic.GetRingParams(max, after);
+  EXPECT_EQ(after.rx, 256u);
+  EXPECT_EQ(after.tx, 1024u);
+  nic.SetRingParams(PnicRingParams{});
+  nic.GetRingParams(max, before);
+  EXPECT_EQ(before.rx, 256u);
+  EXPECT_EQ(before.tx, 1024u);
 }
 
 TEST_F(NicHwTest, NetqueueSetChangesExactlyWhatItSelects) {

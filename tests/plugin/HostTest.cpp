@@ -85,6 +85,15 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
   } cases[] = {
       {{}, "missing required option --nic-name (-n)"},
       {{"-n", "a", "--colour", "red"}, "unknown option --colour"},
+      // A slip of one or two letters gets the closest option names.
+      {{"--nic-nme", "a"}, "unknown option --nic-nme; did you mean --nic-name?"},
+      {{"-n", "a", "--Duplex", "full"}, "unknown option --Duplex; did you mean --duplex?"},
+      {{"-n", "a", "--vmnics", "b"}, "unknown option --vmnics; did you mean --vmnic?"},
+      // An option of the whole run, written where the command's go.
+      {{"-n", "a", "--formatter", "json"},
+       "option --formatter is a global option; global options go before the command words"},
+      {{"-n", "a", "--host=/tmp/h.db"},
+       "option --host is a global option; global options go before the command words"},
       {{"-n", "a", "-x", "1"}, "unknown option -x"},
       {{"-n", "a", "-n", "b"}, "option --nic-name is given more than once"},
       {{"-n", "a", "--speed", "fast"}, "option --speed: \"fast\" is not an integer"},
@@ -124,6 +133,20 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
     std::string problem = Parse(c.args, input);
     EXPECT_EQ(problem, c.problem);
   }
+}
+
+TEST(OptionsTest, HelpAnywhereAfterTheWords) {
+  auto spec = SampleSpec();
+  EXPECT_TRUE(Ostra::AsksForHelp({"-n", "vmnic0", "--help"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"--bogus", "-h"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"--help"}, nullptr));
+  EXPECT_FALSE(Ostra::AsksForHelp({"-n", "vmnic0"}, spec.get()));
+  // A command with a -h of its own keeps it.
+  auto own = ParameterSpec::New("hostname", CallSpec::String);
+  own->SetShortName("h");
+  spec->AddParameter(own);
+  EXPECT_FALSE(Ostra::AsksForHelp({"-h", "web01"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"-h", "web01", "--help"}, spec.get()));
 }
 
 TEST(OptionsTest, BooleanWordsAndIntegers) {
@@ -207,6 +230,90 @@ TEST(HostTest, ExitStatusesAndEscapingExceptions) {
   EXPECT_EQ(out, "");
   EXPECT_EQ(run({"probe"}, out, err), 0);
   EXPECT_NE(out.find("Available Commands:"), std::string::npos);
+}
+
+/// A command whose result is a list of "Nic" structures, each with a nested
+/// "Driver" structure.
+class Lister : public Fabrik::AutoCli::Command {
+protected:
+  std::shared_ptr<CallSpec::InputSpec> GetInputSpecInternal() override {
+    return CallSpec::InputSpec::New();
+  }
+  std::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+    auto driver = MetaObj::MetaStruct::New("Driver");
+    driver->SetField("Version", MetaObj::MetaString::New());
+    auto nic = MetaObj::MetaStruct::New("Nic");
+    nic->SetField("Name", MetaObj::MetaString::New());
+    nic->SetField("MTU", MetaObj::MetaInt::New());
+    nic->SetField("Driver", driver);
+    auto spec = CallSpec::OutputSpec::New();
+    spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, nic));
+    return spec;
+  }
+  void ExecuteInternal(const std::shared_ptr<CallSpec::Input>&,
+                       const std::shared_ptr<CallSpec::Output>& output) override {
+    auto row = MetaObj::MetaStruct::New("Nic");
+    row->SetField("Name", "vmnic0");
+    row->SetField("MTU", 1500L);
+    auto list = MetaObj::MetaList::New(MetaObj::Struct);
+    list->Add(row);
+    output->SetRootObject(list);
+  }
+};
+
+TEST(HostTest, FormatterParametersMustNameWhatTheResultHolds) {
+  auto root = AutoCli::Namespace::New();
+  root->RegisterNamespaceNode(std::make_shared<Lister>(), "list");
+  root->RegisterNamespaceNode(std::make_shared<Probe>(0), "probe");
+  Ostra::CommandTree tree(root);
+  auto run = [&](const std::string& param, std::string& err, const char* command = "list") {
+    std::string out;
+    err.clear();
+    std::vector<std::string> args = {"--format-param", param, command};
+    if (std::string(command) == "probe")
+      args.insert(args.end(), {"-n", "x"});
+    return Ostra::RunCommandLine(tree, args, out, err);
+  };
+  std::string err;
+  for (const char* good : {"fields=Name, MTU", "fields:Driver=Version", "table-columns=MTU",
+                           "header:Nic=%Name%", "units:Nic.MTU=bytes", "show-header=off"}) {
+    EXPECT_EQ(run(good, err), 0) << good;
+    EXPECT_EQ(err, "") << good;
+  }
+  const std::pair<const char*, const char*> bad[] = {
+      {"fields=Name,Bogus",
+       "--format-param fields=Name,Bogus: \"Bogus\" is not a field of Nic (its fields: Name, MTU, "
+       "Driver)"},
+      {"fields:Driver=Name",
+       "--format-param fields:Driver=Name: \"Name\" is not a field of Driver (its fields: "
+       "Version)"},
+      {"header:Drivers=x", "--format-param header:Drivers=x: the result of this command has no "
+                           "structure \"Drivers\" (its structures: Driver, Nic)"},
+      {"units:Nic.Speed=Mbps", "--format-param units:Nic.Speed=Mbps: \"Speed\" is not a field of "
+                               "Nic (its fields: Name, MTU, Driver)"},
+      {"colour=red", "unknown formatter parameter \"colour\" (known: fields, fields:S, "
+                     "table-columns, table-columns:S, header:S, units:S.F, show-header, "
+                     "wrap-last)"},
+      {"wrap-last=maybe",
+       "--format-param wrap-last=maybe: \"maybe\" is not a boolean (true/false, yes/no, on/off, "
+       "1/0)"},
+  };
+  for (const auto& [param, message] : bad) {
+    EXPECT_EQ(run(param, err), 2) << param;
+    EXPECT_EQ(err, "Error: " + std::string(message) + "\n");
+  }
+  EXPECT_EQ(run("fields=Name", err, "probe"), 2);
+  EXPECT_EQ(err, "Error: --format-param fields=Name: the result of this command has no fields\n");
+}
+
+TEST(HostTest, RootHelpListsEveryGlobalOption) {
+  Ostra::CommandTree tree(AutoCli::Namespace::New());
+  std::string out, err;
+  ASSERT_EQ(Ostra::RunCommandLine(tree, {"--help"}, out, err), 0);
+  for (const char* option :
+       {"--formatter NAME", "--format-param KEY=VALUE", "--host PATH", "--batch FILE",
+        "--keep-going", "-h, --help", "--version", "--reference", "--man", "--complete WORD..."})
+    EXPECT_NE(out.find("\n  " + std::string(option) + " "), std::string::npos) << option;
 }
 
 } // namespace

@@ -11,6 +11,7 @@
 #include "Host.h"
 
 #include "Fabrik/Format.h"
+#include "FormatParams.h"
 #include "Help.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
@@ -157,6 +158,8 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
       options.keepGoing = true;
     } else if (name == "--reference") {
       options.reference = true;
+    } else if (name == "--man") {
+      options.manual = true;
     } else if (name == "--complete") {
       options.complete = true;
       return static_cast<int>(i + 1);
@@ -202,9 +205,10 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   int first = ParseGlobalOptions(args, global, err);
   if (first < 0)
     return ExitUsage;
-  if (global.complete || global.reference || !global.batch.empty() || global.keepGoing) {
-    err += "Error: --batch, --keep-going, --complete and --reference are options of a whole "
-           "ostracli run, not of one command\n";
+  if (global.complete || global.reference || global.manual || !global.batch.empty() ||
+      global.keepGoing) {
+    err += "Error: --batch, --keep-going, --complete, --reference and --man are options of a "
+           "whole ostracli run, not of one command\n";
     return ExitUsage;
   }
   if (!global.formatter.empty() && !Format::MakeFormatter(global.formatter)) {
@@ -231,11 +235,6 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   for (; i < args.size() && !(args[i].size() > 1 && args[i][0] == '-'); ++i)
     words.push_back(args[i]);
   std::vector<std::string> rest(args.begin() + static_cast<long>(i), args.end());
-  bool wantsHelp = global.help;
-  if (!rest.empty() && (rest[0] == "--help" || rest[0] == "-h")) {
-    wantsHelp = true;
-    rest.erase(rest.begin());
-  }
 
   AutoCli::NamespaceNodePtr node = tree.Root();
   for (std::size_t w = 0; w < words.size(); ++w) {
@@ -250,7 +249,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
 
   const bool machine = global.formatter == "json";
   if (node->GetType() == AutoCli::NamespaceKind) {
-    if (!rest.empty() && !wantsHelp) {
+    if (!rest.empty() && !global.help && !AsksForHelp(rest, nullptr)) {
       err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
              " --help\" lists the commands\n";
       return ExitUsage;
@@ -265,14 +264,15 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
     return ExitUsage;
   }
   std::shared_ptr<CallSpec::InputSpec> inputSpec = command->GetInputSpec();
-  if (wantsHelp) {
+  if (global.help || AsksForHelp(rest, inputSpec.get())) {
     out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
     return ExitOk;
   }
 
   auto input = CallSpec::Input::New();
   std::string problem;
-  if (!ParseCommandOptions(*inputSpec, rest, *input, problem)) {
+  if (!ParseCommandOptions(*inputSpec, rest, *input, problem) ||
+      !(problem = CheckFormatParams(*command, global.params)).empty()) {
     err += "Error: " + problem + "\n";
     return ExitUsage;
   }
@@ -330,8 +330,8 @@ int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
     std::fwrite(out.data(), 1, out.size(), stdout);
     return ExitOk;
   }
-  if (first >= 0 && global.reference) {
-    out = Reference(*tree);
+  if (first >= 0 && (global.reference || global.manual)) {
+    out = global.manual ? ManualPage(*tree) : Reference(*tree);
     std::fwrite(out.data(), 1, out.size(), stdout);
     return ExitOk;
   }

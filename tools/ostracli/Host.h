@@ -57,6 +57,7 @@ struct GlobalOptions {
   bool version = false;                                    ///< --version.
   bool complete = false;                                   ///< --complete WORD...
   bool reference = false;                                  ///< --reference.
+  bool manual = false;                                     ///< --man.
 };
 
 /// Reads the global options in front of the command path; returns the index
@@ -80,6 +81,10 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
 
 /// The command reference in Markdown, generated from the tree.
 std::string Reference(const CommandTree& tree);
+
+/// The manual page ostracli(1) in roff, generated from the tree and the
+/// global options.
+std::string ManualPage(const CommandTree& tree);
 
 /// Where ostracli looks for plug-ins: $OSTRACLI_PLUGIN_DIR, else
 /// <directory of the executable>/../lib/ostracli/plugins.
