@@ -543,9 +543,6 @@ constexpr RingSlot kRingSlots[] = {
 
 std::string QueueCountProblem(const std::string& nic, const char* direction, uint32_t count,
                               uint32_t max) {
-  if (max == 0 && count != 0)
-    return nic + " has no " + direction + " netqueues, so its " + direction +
-           " netqueue count must be 0, not " + std::to_string(count);
   if (max != 0 && (count < 1 || count > max))
     return "The " + std::string(direction) + " netqueue count of " + nic +
            " must be between 1 and " + std::to_string(max) + ", not " + std::to_string(count);
