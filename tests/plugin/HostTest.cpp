@@ -261,6 +261,18 @@ protected:
   }
 };
 
+/// A command whose result is one "Switch" structure.
+class Other : public Lister {
+protected:
+  std::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+    auto vswitch = MetaObj::MetaStruct::New("Switch");
+    vswitch->SetField("Name", MetaObj::MetaString::New());
+    auto spec = CallSpec::OutputSpec::New();
+    spec->SetRootObject(vswitch);
+    return spec;
+  }
+};
+
 TEST(HostTest, FormatterParametersMustNameWhatTheResultHolds) {
   auto root = AutoCli::Namespace::New();
   root->RegisterNamespaceNode(std::make_shared<Lister>(), "list");
@@ -302,8 +314,15 @@ TEST(HostTest, FormatterParametersMustNameWhatTheResultHolds) {
     EXPECT_EQ(run(param, err), 2) << param;
     EXPECT_EQ(err, "Error: " + std::string(message) + "\n");
   }
-  EXPECT_EQ(run("fields=Name", err, "probe"), 2);
-  EXPECT_EQ(err, "Error: --format-param fields=Name: the result of this command has no fields\n");
+  // A boolean result has nothing to select, as in a batch whose global
+  // options name the fields of its listings.
+  EXPECT_EQ(run("fields=Name", err, "probe"), 0);
+  EXPECT_EQ(run("units:Nic.MTU=bytes", err, "probe"), 0);
+  // The structure of another command's result is for that command's lines.
+  root->RegisterNamespaceNode(std::make_shared<Other>(), "other");
+  EXPECT_EQ(run("fields:Nic=Name", err, "other"), 0);
+  EXPECT_EQ(run("fields:Nic=Bogus", err), 2);
+  EXPECT_EQ(run("colour=red", err, "probe"), 2);
 }
 
 TEST(HostTest, RootHelpListsEveryGlobalOption) {

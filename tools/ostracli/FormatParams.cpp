@@ -69,9 +69,24 @@ std::vector<std::string> FieldNames(const std::string& list) {
   return names;
 }
 
+/// Whether a command of the tree below \p node has structure \p shape.
+bool TreeHasShape(const AutoCli::NamespaceNodePtr& node, const std::string& shape) {
+  if (auto command = std::dynamic_pointer_cast<AutoCli::CommandSpec>(node)) {
+    std::shared_ptr<CallSpec::OutputSpec> output = command->GetOutputSpec();
+    Shapes shapes;
+    Collect(output ? output->GetRootObject() : nullptr, shapes);
+    if (shapes.count(shape))
+      return true;
+  }
+  for (const AutoCli::NamespaceNodePtr& child : node->GetNamespaceNodes())
+    if (TreeHasShape(child, shape))
+      return true;
+  return false;
+}
+
 } // namespace
 
-std::string CheckFormatParams(AutoCli::CommandSpec& command,
+std::string CheckFormatParams(AutoCli::CommandSpec& command, const AutoCli::NamespaceNodePtr& tree,
                               const std::vector<std::pair<std::string, std::string>>& params) {
   if (params.empty())
     return "";
@@ -108,6 +123,10 @@ std::string CheckFormatParams(AutoCli::CommandSpec& command,
       return "unknown formatter parameter \"" + key + "\" (known: " + kKeys + ")";
     if (colon == std::string::npos && (kind == "header" || kind == "units"))
       return "formatter parameter \"" + key + "\" names no structure (known: " + kKeys + ")";
+    // A result without structures (a boolean, a text) has nothing to select;
+    // the parameters in front of --batch apply to such lines too.
+    if (shapes.empty())
+      continue;
     std::string shape = colon == std::string::npos ? rootShape : key.substr(colon + 1);
     std::string field;
     if (kind == "units") {
@@ -117,12 +136,16 @@ std::string CheckFormatParams(AutoCli::CommandSpec& command,
       field = shape.substr(dot + 1);
       shape.erase(dot);
     }
-    if (shape.empty())
-      return given + "the result of this command has no fields";
+
     auto found = shapes.find(shape);
-    if (found == shapes.end())
+    if (found == shapes.end()) {
+      // Another command's structure: the parameters in front of --batch may
+      // be meant for other lines.
+      if (colon != std::string::npos && TreeHasShape(tree, shape))
+        continue;
       return given + "the result of this command has no structure \"" + shape +
              "\" (its structures: " + Join(shapeNames) + ")";
+    }
     const std::vector<std::string>& fields = found->second;
     std::vector<std::string> wanted;
     if (kind == "units")

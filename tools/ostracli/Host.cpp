@@ -272,7 +272,7 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   auto input = CallSpec::Input::New();
   std::string problem;
   if (!ParseCommandOptions(*inputSpec, rest, *input, problem) ||
-      !(problem = CheckFormatParams(*command, global.params)).empty()) {
+      !(problem = CheckFormatParams(*command, tree.Root(), global.params)).empty()) {
     err += "Error: " + problem + "\n";
     return ExitUsage;
   }
