@@ -109,6 +109,9 @@ void Columns(std::string& out, const std::string& name, const std::string& text,
 std::vector<std::string> ClosestNames(const std::string& word,
                                       const std::vector<std::string>& names) {
   std::vector<std::string> close;
+  // No name is near a word this long, and the distance costs its length.
+  if (word.size() > 64)
+    return close;
   const std::size_t limit = word.size() <= 4 ? 1 : 2;
   std::size_t best = limit + 1;
   for (const std::string& name : names) {

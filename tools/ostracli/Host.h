@@ -82,6 +82,9 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
 /// The command reference in Markdown, generated from the tree.
 std::string Reference(const CommandTree& tree);
 
+/// The name of a parameter type in the reference and the manual page.
+const char* ReferenceTypeName(Fabrik::CallSpec::ParameterType type);
+
 /// The manual page ostracli(1) in roff, generated from the tree and the
 /// global options.
 std::string ManualPage(const CommandTree& tree);

@@ -50,22 +50,6 @@ std::string OneLine(std::string text) {
   return text;
 }
 
-const char* TypeName(CallSpec::ParameterType type) {
-  switch (type) {
-  case CallSpec::String:
-    return "string";
-  case CallSpec::Integer:
-    return "integer";
-  case CallSpec::Boolean:
-    return "boolean";
-  case CallSpec::Flag:
-    return "flag";
-  case CallSpec::StringList:
-    return "string, repeatable";
-  }
-  return "value";
-}
-
 void Commands(const AutoCli::NamespaceNodePtr& node, std::string& out) {
   std::string path = node->GetPathString(' ');
   if (node->GetType() == AutoCli::NamespaceKind && !path.empty()) {
@@ -81,7 +65,7 @@ void Commands(const AutoCli::NamespaceNodePtr& node, std::string& out) {
           out += "\\fB\\-" + Roff(parameter->GetShortName()) + "\\fR, ";
         out += "\\fB\\-\\-" + Roff(parameter->GetName()) + "\\fR";
         if (parameter->GetType() != CallSpec::Flag)
-          out += std::string(" \\fI") + TypeName(parameter->GetType()) + "\\fR";
+          out += std::string(" \\fI") + ReferenceTypeName(parameter->GetType()) + "\\fR";
         if (parameter->IsRequired())
           out += " (required)";
         out += "\n" + Roff(parameter->GetExpandedDescription());

@@ -110,6 +110,15 @@ nlohmann::ordered_json Encode(const SelfTestState& in);
 nlohmann::ordered_json Encode(const DcbState& in);
 nlohmann::ordered_json Encode(const HostCtl::Network::PnicHwCapabilities& in);
 
+/// A ring of the ring record and its name in messages.
+struct RingSlot {
+  const char* name;                                   ///< "RX", "RX mini", ...
+  uint32_t HostCtl::Network::PnicRingParams::*member; ///< Field.
+  bool required; ///< A NIC that has this ring holds at least one entry in it.
+};
+/// The rings, in record order.
+extern const std::array<RingSlot, 4> kRingSlots;
+
 // The host's rules for the state a record may be in, which the operations
 // that change a record keep and import checks: the problem with the record of
 // NIC \p nic, or "" when it keeps them.

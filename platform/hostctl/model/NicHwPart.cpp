@@ -491,6 +491,13 @@ ordered_json Encode(const PnicHwCapabilities& in) {
 
 // --- The host's rules.
 
+const std::array<RingSlot, 4> kRingSlots = {{
+    {"RX", &PnicRingParams::rx, true},
+    {"RX mini", &PnicRingParams::rxMini, false},
+    {"RX jumbo", &PnicRingParams::rxJumbo, false},
+    {"TX", &PnicRingParams::tx, true},
+}};
+
 namespace {
 
 /// A count or delay of the coalescing record and its name in messages.
@@ -526,20 +533,6 @@ constexpr CoalesceSlot kCoalesceSlots[] = {
 /// what a negative number becomes in the record's 32 bits, and no hardware
 /// delays an interrupt for weeks.
 constexpr uint32_t kMaxCoalesceValue = 0x7fffffff;
-
-/// A ring of the ring record and its name in messages.
-struct RingSlot {
-  const char* name;                 ///< Name in messages.
-  uint32_t PnicRingParams::*member; ///< Field.
-  bool required;                    ///< A NIC that has this ring cannot run without it.
-};
-
-constexpr RingSlot kRingSlots[] = {
-    {"RX", &PnicRingParams::rx, true},
-    {"RX mini", &PnicRingParams::rxMini, false},
-    {"RX jumbo", &PnicRingParams::rxJumbo, false},
-    {"TX", &PnicRingParams::tx, true},
-};
 
 std::string QueueCountProblem(const std::string& nic, const char* direction, uint32_t count,
                               uint32_t max) {

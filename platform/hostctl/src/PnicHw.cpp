@@ -104,19 +104,6 @@ constexpr OffloadFlag kOffloadFlags[] = {
 constexpr uint8_t kOffloadMaskAll =
     OffloadRxChecksum | OffloadTxChecksum | OffloadScatterGather | OffloadTso;
 
-/// A ring of the ring record.
-struct RingSlot {
-  const char* name;                 ///< Name in messages.
-  uint32_t PnicRingParams::*member; ///< Field.
-};
-
-constexpr RingSlot kRingSlots[] = {
-    {"RX", &PnicRingParams::rx},
-    {"RX mini", &PnicRingParams::rxMini},
-    {"RX jumbo", &PnicRingParams::rxJumbo},
-    {"TX", &PnicRingParams::tx},
-};
-
 /// Checks a NetQueue count against the NIC's limit.
 void CheckQueueCount(const std::string& nic, const char* direction, uint32_t count, uint32_t max) {
   if (max == 0)
@@ -207,7 +194,7 @@ void PnicImpl::SetRingParams(const PnicRingParams& params) {
   const std::string nic = GetName();
   ChangeRecord<Model::RingState>("SetRingParams", nic, "ring", [&](Model::RingState& state) {
     // A size of 0 leaves that ring as it is, so one ring can be resized alone.
-    for (const RingSlot& slot : kRingSlots) {
+    for (const Model::RingSlot& slot : Model::kRingSlots) {
       uint32_t size = params.*slot.member;
       uint32_t max = state.maximums.*slot.member;
       if (size == 0)
@@ -219,7 +206,7 @@ void PnicImpl::SetRingParams(const PnicRingParams& params) {
         throw HostCtlException(StrPrintf("The %s ring of %s takes at most %u entries, not %u",
                                          slot.name, nic.c_str(), max, size));
     }
-    for (const RingSlot& slot : kRingSlots)
+    for (const Model::RingSlot& slot : Model::kRingSlots)
       if (params.*slot.member != 0)
         state.current.*slot.member = params.*slot.member;
   });
