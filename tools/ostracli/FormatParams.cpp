@@ -94,14 +94,17 @@ std::string CheckFormatParams(AutoCli::CommandSpec& command, const AutoCli::Name
   const MetaObj::MetaObjectPtr root = output ? output->GetRootObject() : nullptr;
   // The structure that "fields" and "table-columns" select from.
   std::string rootShape;
-  if (root && root->GetType() == MetaObj::Struct)
+  // A list of structures without a template declares none to check against.
+  bool undeclared = false;
+  if (root && root->GetType() == MetaObj::Struct) {
     rootShape = static_cast<const MetaObj::MetaStruct&>(*root).GetName();
-  else if (root && root->GetType() == MetaObj::List) {
-    const auto& element = static_cast<const MetaObj::MetaList&>(*root).GetElementTemplate();
+  } else if (root && root->GetType() == MetaObj::List) {
+    const auto& list = static_cast<const MetaObj::MetaList&>(*root);
+    const auto& element = list.GetElementTemplate();
     if (element && element->GetType() == MetaObj::Struct)
       rootShape = static_cast<const MetaObj::MetaStruct&>(*element).GetName();
-    else if (static_cast<const MetaObj::MetaList&>(*root).GetElementType() == MetaObj::Struct)
-      return ""; // Structures of no declared shape: nothing to check against.
+    else
+      undeclared = list.GetElementType() == MetaObj::Struct;
   }
   Shapes shapes;
   Collect(root, shapes);
@@ -125,7 +128,7 @@ std::string CheckFormatParams(AutoCli::CommandSpec& command, const AutoCli::Name
       return "formatter parameter \"" + key + "\" names no structure (known: " + kKeys + ")";
     // A result without structures (a boolean, a text) has nothing to select;
     // the parameters in front of --batch apply to such lines too.
-    if (shapes.empty())
+    if (shapes.empty() || undeclared)
       continue;
     std::string shape = colon == std::string::npos ? rootShape : key.substr(colon + 1);
     std::string field;
