@@ -331,7 +331,8 @@ TEST(HostTest, RootHelpListsEveryGlobalOption) {
   ASSERT_EQ(Ostra::RunCommandLine(tree, {"--help"}, out, err), 0);
   for (const char* option :
        {"--formatter NAME", "--format-param KEY=VALUE", "--host PATH", "--batch FILE",
-        "--keep-going", "-h, --help", "--version", "--reference", "--man", "--complete WORD..."})
+        "--keep-going", "--lock-timeout MS", "--atomic", "-h, --help", "--version", "--reference",
+        "--man", "--complete WORD..."})
     EXPECT_NE(out.find("\n  " + std::string(option) + " "), std::string::npos) << option;
 }
 

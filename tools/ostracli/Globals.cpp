@@ -16,6 +16,12 @@ const GlobalOption kGlobalOptions[] = {
     {"--host", nullptr, "PATH",
      "The host state database to work on (else\n"
      "$OSTRACLI_HOST, else the default host)."},
+    {"--lock-timeout", nullptr, "MS",
+     "How long a change waits for another process's\n"
+     "lock (else $OSTRACLI_LOCK_TIMEOUT_MS, else 10000)."},
+    {"--atomic", nullptr, nullptr,
+     "A command (or batch) that ends with an error\n"
+     "changes nothing."},
     {"--batch", nullptr, "FILE",
      "Run one command line per line of FILE (- for\n"
      "standard input) in one process."},
