@@ -159,7 +159,7 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
     } else if (name == "--reference") {
       options.reference = true;
     } else if (name == "--man") {
-      options.manual = true;
+      options.reference = options.manual = true;
     } else if (name == "--complete") {
       options.complete = true;
       return static_cast<int>(i + 1);
@@ -205,10 +205,9 @@ int RunCommandLine(const CommandTree& tree, const std::vector<std::string>& args
   int first = ParseGlobalOptions(args, global, err);
   if (first < 0)
     return ExitUsage;
-  if (global.complete || global.reference || global.manual || !global.batch.empty() ||
-      global.keepGoing) {
-    err += "Error: --batch, --keep-going, --complete, --reference and --man are options of a "
-           "whole ostracli run, not of one command\n";
+  if (global.complete || global.reference || !global.batch.empty() || global.keepGoing) {
+    err += "Error: --batch, --keep-going, --complete and --reference are options of a whole "
+           "ostracli run, not of one command\n";
     return ExitUsage;
   }
   if (!global.formatter.empty() && !Format::MakeFormatter(global.formatter)) {

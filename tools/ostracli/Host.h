@@ -57,7 +57,7 @@ struct GlobalOptions {
   bool version = false;                                    ///< --version.
   bool complete = false;                                   ///< --complete WORD...
   bool reference = false;                                  ///< --reference.
-  bool manual = false;                                     ///< --man.
+  bool manual = false; ///< --man: the reference as a manual page (reference is set too).
 };
 
 /// Reads the global options in front of the command path; returns the index
