@@ -17,9 +17,11 @@ struct Command {
 
 const Command kCommands[] = {
     {"init PATH [--profile demo|empty]", "create a host state file"},
-    {"import FILE [--host PATH]", "replace a host by a JSON host description\n"
-                                  "(FILE - reads standard input; PATH is\n"
-                                  "created when it does not exist)"},
+    {"import FILE [--host PATH] [--max-size SIZE]", "replace a host by a JSON host description\n"
+                                                    "(FILE - reads standard input; PATH is\n"
+                                                    "created when it does not exist; FILE may\n"
+                                                    "hold at most SIZE bytes, suffix K, M or G,\n"
+                                                    "default 256M)"},
     {"export [--host PATH]", "print the host as a JSON host description"},
     {"profile NAME", "print a built-in profile (demo, empty)"},
     {"generate PATH [SIZES]", "create a large host: the demo host grown to\n"
@@ -56,8 +58,11 @@ std::string Indented(const char* text, std::size_t indent) {
   return out;
 }
 
+/// \p text padded with blanks to \p width; a longer one is followed by a line
+/// break and \p width blanks.
 std::string Padded(std::string text, std::size_t width) {
-  return text.size() < width ? text + std::string(width - text.size(), ' ') : text + " ";
+  return text.size() < width ? text + std::string(width - text.size(), ' ')
+                             : text + "\n" + std::string(width, ' ');
 }
 
 /// \p text as roff text (backslashes and hyphens escaped, line breaks as blanks).

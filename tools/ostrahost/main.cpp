@@ -35,13 +35,6 @@ int Fail(const std::string& message) {
   return 1;
 }
 
-/// Writes \p text to standard output; the command's status.
-int Print(const std::string& text) {
-  std::fwrite(text.data(), 1, text.size(), stdout);
-  return 0;
-}
-
-/// A refused command line: one line, and where to read more.
 int Usage(const std::string& message) {
   std::fprintf(stderr, "ostrahost: %s\nsee ostrahost --help\n", message.c_str());
   return 2;
@@ -107,12 +100,15 @@ int main(int argc, char** argv) {
   std::vector<std::string> args(argv + 1, argv + argc);
   if (args.empty())
     return Usage("no command given");
-  if (args[0] == "--help" || args[0] == "-h")
-    return Print(OstraHost::UsageText());
-  if (args[0] == "--version")
-    return Print(std::string("ostrahost ") + OstraHost::Version() + "\n");
-  if (args[0] == "--man")
-    return Print(OstraHost::ManualPage());
+  if (args[0] == "--help" || args[0] == "-h" || args[0] == "--version" || args[0] == "--man") {
+    std::string text = OstraHost::UsageText();
+    if (args[0] == "--version")
+      text = std::string("ostrahost ") + OstraHost::Version() + "\n";
+    else if (args[0] == "--man")
+      text = OstraHost::ManualPage();
+    std::fwrite(text.data(), 1, text.size(), stdout);
+    return 0;
+  }
   std::string command = args[0];
   std::vector<std::string> positional;
   std::string host, profile = "demo";
