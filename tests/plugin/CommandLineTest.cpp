@@ -1,4 +1,5 @@
 //===- CommandLineTest.cpp - What the command host tells a user -----------===//
+#include "../support/ScratchHost.h"
 #include "Host.h"
 
 #include "Fabrik/AutoCli.h"
@@ -72,6 +73,7 @@ protected:
 };
 
 TEST(HostTest, FormatterParametersMustNameWhatTheResultHolds) {
+  TestSupport::ScratchHost host("command-line-test", "{}");
   auto root = AutoCli::Namespace::New();
   root->RegisterNamespaceNode(std::make_shared<Lister>(), "list");
   root->RegisterNamespaceNode(std::make_shared<Switcher>(), "probe");
