@@ -17,6 +17,7 @@
 #include "TvkCtl/Network/Switching.h"
 #include "TvkCtl/Network/TvkNicImpl.h"
 #include "TvkCtl/Util.h"
+#include "common/IntFit.h"
 
 #include <climits>
 #include <ctime>
@@ -57,6 +58,10 @@ const std::string kDvsName = "dvs-name";
 const std::string kDvportId = "dvport-id";
 const std::string kInterfaceName = "interface-name";
 const std::string kDefaultNetstack = "defaultTcpipStack";
+const std::string kMtuParam = "mtu";
+
+/// `ip interface set` passes a non-negative MTU on as an unsigned 32-bit number.
+const IntFit kSetFits[] = {{kMtuParam, 0, kUint32Max}};
 
 /// Names tvk0 to tvk255 without leading zeros.
 const std::string kInterfaceNamePattern = "tvk([0-9]|[1-9][0-9]|1[0-9][0-9]|2[0-4][0-9]|25[0-5])";
@@ -564,9 +569,8 @@ void IpInterfaceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& inp
         output->AddErrorMessage("MTU size should be a positive value");
         return;
       }
-      // A value beyond the unsigned range is passed as the largest one, which
-      // the host refuses, rather than wrapped to a small valid MTU.
-      found->SetMtu(mtu > static_cast<long>(UINT32_MAX) ? UINT32_MAX : static_cast<uint32_t>(mtu));
+      RequireFit(*input, kSetFits);
+      found->SetMtu(static_cast<uint32_t>(mtu));
     }
     output->SetRootObject(MetaObj::MetaBool::New(true));
   } catch (const HostCtlException& e) {

@@ -88,9 +88,9 @@ void ReadPolicyNetwork(const std::string& text, std::string& address, int& prefi
 } // namespace
 
 bool ParseSpiText(const std::string& text, uint32_t& spi) {
-  // A sign or blanks would be accepted by the stream (a negative number
-  // wrapping around), so only hex digits with an optional 0x are read.
-  if (text.empty() || text.find_first_of("+- \t\n") != std::string::npos)
+  // Read as the stream reads a hex number: leading blanks and a "+" are
+  // taken, but a "-" is refused rather than wrapped around to a large SPI.
+  if (text.find('-') != std::string::npos)
     return false;
   std::istringstream stream(text);
   uint32_t value = 0;

@@ -10,6 +10,7 @@
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/NetstackInstanceImpl.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/IntFit.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -35,6 +36,10 @@ const std::string kNetstack = "netstack";
 const std::string kUnableToFind = "Unable to find a Netstack instance ";
 const std::string kDefaultEcn = "enabled";
 const std::string kNewReno = "newreno";
+const std::string kMaxconnParam = "maxconn";
+
+/// The maximum connections go to the host as an unsigned 32-bit number.
+const IntFit kSetFits[] = {{kMaxconnParam, 0, kUint32Max}};
 
 /// The state of an instance created in the kernel.
 constexpr long kEnabledState = 4660;
@@ -272,6 +277,10 @@ std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceSet::GetOutputSpecIntern
 
 void IpNetstackInstanceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
                                             const std::shared_ptr<CallSpec::Output>& output) {
+  if (auto problem = OutOfRange(*input, kSetFits[0])) {
+    output->AddErrorMessage(*problem);
+    return;
+  }
   try {
     TvkCtl::Network::NetworkInfoImpl info;
     const std::string& key = input->GetParameter(kNetstack);
@@ -288,14 +297,9 @@ void IpNetstackInstanceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Inpu
       else
         instance->Disable();
     }
-    if (input->HasParameter("maxconn")) {
-      long value = input->GetParameterInt("maxconn");
-      // A value outside the unsigned range can never be accepted; it is
-      // reported as the out-of-range value it is rather than wrapped.
-      if (value < 0 || value > static_cast<long>(UINT32_MAX))
-        throw HostCtlException("Maximum connections " + std::to_string(value) + " is out of range");
-      instance->SetMaxConnections(static_cast<uint32_t>(value), true);
-    }
+    if (input->HasParameter(kMaxconnParam))
+      instance->SetMaxConnections(static_cast<uint32_t>(input->GetParameterInt(kMaxconnParam)),
+                                  true);
     if (input->HasParameter("ccalgo") && !input->GetParameter("ccalgo").empty())
       instance->SetCongestionControlAlgorithm(input->GetParameter("ccalgo"), true);
     if (input->HasParameter("ipv6enabled"))

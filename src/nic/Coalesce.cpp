@@ -11,6 +11,7 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/PnicHwRecords.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/IntFit.h"
 #include "nic/HwCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
@@ -123,6 +124,13 @@ const CoalesceTarget kSetTargets[] = {
     {&PnicCoalesceParams::sampleInterval, nullptr},
 };
 
+/// The integer set parameters of every coalescing set go into the record's
+/// unsigned 32-bit counts (the sample interval has its own narrower range).
+const IntFit kCountFits[] = {
+    {kPktRate, 0, kUint32Max}, {kRxUsecs, 0, kUint32Max},     {kRxMaxFrames, 0, kUint32Max},
+    {kTxUsecs, 0, kUint32Max}, {kTxMaxFrames, 0, kUint32Max},
+};
+
 /// Result fields of the high and low gets after "NIC", all integers.
 const std::string* const kRegimeFields[] = {&kPacketRate, &kRxDelayTime, &kRxDelayPackets,
                                             &kTxDelayTime, &kTxDelayPackets};
@@ -233,6 +241,7 @@ void RegimeGet(const Regime& regime, const Input& input, Output& output) {
 
 void RegimeSet(const Regime& regime, const Input& input, Output& output) {
   try {
+    RequireFit(input, kCountFits);
     std::unique_ptr<Pnic> nic = RegimeNic(input, output);
     if (!nic)
       return;
@@ -331,6 +340,7 @@ std::shared_ptr<OutputSpec> NicCoalesceSet::GetOutputSpecInternal() {
 void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                      const std::shared_ptr<Output>& output) {
   try {
+    RequireFit(*input, kCountFits);
     TvkCtl::Network::NetworkInfoImpl info;
     std::unique_ptr<Pnic> nic = NicHw::FindNic(info, *input, kVmnic, NicHw::PnicNotFound, *output);
     if (!nic)

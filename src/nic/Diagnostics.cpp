@@ -10,6 +10,7 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/PnicHwRecords.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/IntFit.h"
 #include "nic/HwCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
@@ -51,6 +52,14 @@ const std::string kFailed = "Failed";
 
 const std::string* const kDumpFields[] = {&kOffsetField, &kValueField};
 const std::string* const kSelfTestFields[] = {&kItemField, &kValueField};
+
+/// Offsets, lengths, values and the magic key are unsigned 32-bit numbers.
+const IntFit kEepromFits[] = {
+    {kOffset, 0, kUint32Max},
+    {kLength, 0, kUint32Max},
+    {kValue, 0, kUint32Max},
+    {kMagic, 0, kUint32Max},
+};
 
 /// Bytes and registers per dump row.
 constexpr std::size_t kRowWidth = 16;
@@ -159,6 +168,7 @@ std::shared_ptr<OutputSpec> NicEepromDump::GetOutputSpecInternal() {
 void NicEepromDump::ExecuteInternal(const std::shared_ptr<Input>& input,
                                     const std::shared_ptr<Output>& output) {
   try {
+    RequireFit(*input, kEepromFits);
     TvkCtl::Network::NetworkInfoImpl info;
     std::unique_ptr<Pnic> nic = FindNic(info, *input, *output);
     if (!nic)
@@ -196,6 +206,7 @@ std::shared_ptr<OutputSpec> NicEepromChange::GetOutputSpecInternal() {
 void NicEepromChange::ExecuteInternal(const std::shared_ptr<Input>& input,
                                       const std::shared_ptr<Output>& output) {
   try {
+    RequireFit(*input, kEepromFits);
     TvkCtl::Network::NetworkInfoImpl info;
     std::unique_ptr<Pnic> nic = FindNic(info, *input, *output);
     if (!nic)

@@ -11,6 +11,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/PnicHwRecords.h"
+#include "common/IntFit.h"
 #include "nic/HwCommon.h"
 
 #include <algorithm>
@@ -262,12 +263,16 @@ void ListEveryNetqueue(Output& output, const std::function<std::shared_ptr<MetaS
   }
 }
 
+/// Queue counts are unsigned 32-bit numbers.
+const IntFit kQueueFits[] = {{kNum, 0, kUint32Max}};
+
 /// Runs a set: \p fill writes the selections into a zeroed record, which is
 /// sent to the NIC `vmnic` names unless \p fill gives false (nothing
 /// selected); the result is true either way.
 template <typename Fill>
 void SetNetqueue(const Input& input, Output& output, NicHw::NotFoundText notFound, Fill fill) {
   try {
+    RequireFit(input, kQueueFits);
     std::unique_ptr<NetworkInfo> info = Root();
     std::unique_ptr<Pnic> nic = NicHw::FindNic(*info, input, kVmnic, notFound, output);
     if (!nic)

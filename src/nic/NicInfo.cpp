@@ -14,6 +14,7 @@
 #include "HostCtl/Network/PnicRecords.h"
 #include "HostCtl/SmartNic.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/IntFit.h"
 
 #include <cstring>
 #include <iterator>
@@ -52,6 +53,10 @@ const std::string kSupportsAutoNegotiation = "Supports Auto Negotiation";
 const std::string kAdvertisedLinkModes = "Advertised Link Modes";
 const std::string kAdvertisedAutoNegotiation = "Advertised Auto Negotiation";
 const std::string kCableType = "Cable Type";
+/// The record's PHY address and message level are unsigned 32-bit numbers.
+/// Below 1 a PHY address is -1 (left as it is) or refused.
+const IntFit kSetFits[] = {{kPhyAddress, 1, kUint32Max}, {kMessageLevel, 0, kUint32Max}};
+
 const std::string kPhyAddressField = "PHY Address";
 const std::string kVirtualAddressField = "Virtual Address";
 const std::string kTransceiver = "Transceiver";
@@ -440,11 +445,8 @@ bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, Pni
   }
   if (input->HasParameter(kPhyAddress)) {
     long phy = input->GetParameterInt(kPhyAddress);
-    // An address that does not fit the record's 32 bits is refused rather
-    // than cut to its low bits and taken for another address.
-    if (phy > static_cast<long>(std::numeric_limits<uint32_t>::max()))
-      throw HostCtlException("Invalid PHY address value.");
     if (phy >= 1) {
+      RequireFit(*input, std::span(kSetFits, 1));
       if (static_cast<uint32_t>(phy) != info.phyAddress) {
         info.phyAddress = static_cast<uint32_t>(phy);
         info.phyAddressChanged = true;
@@ -486,12 +488,8 @@ bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, Pni
   if (input->HasParameter(kMessageLevel)) {
     if (!info.messageLevelSupported)
       throw HostCtlException("Not Support msglvl.");
-    long value = input->GetParameterInt(kMessageLevel);
-    if (value < std::numeric_limits<int32_t>::min() ||
-        value > static_cast<long>(std::numeric_limits<uint32_t>::max()))
-      throw HostCtlException("Invalid message level value.");
-    // A negative level stands for its 32-bit pattern (-1 sets every bit).
-    auto level = static_cast<uint32_t>(value);
+    RequireFit(*input, std::span(kSetFits + 1, 1));
+    auto level = static_cast<uint32_t>(input->GetParameterInt(kMessageLevel));
     if (level != info.messageLevel) {
       info.messageLevel = level;
       info.messageLevelChanged = true;

@@ -10,6 +10,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/PnicHwRecords.h"
+#include "common/IntFit.h"
 #include "nic/HwCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
@@ -97,6 +98,14 @@ const Param kCurrentSetParams[] = {
     {kRxMini, "m", kInteger, false, "Number of ring entries for the RX mini ring."},
     {kRxJumbo, "j", kInteger, false, "Number of ring entries for the RX jumbo ring."},
     {kTx, "t", kInteger, false, "Number of ring entries for the TX ring."},
+};
+
+/// Ring sizes are unsigned 32-bit counts.
+const IntFit kRingFits[] = {
+    {kRx, 0, kUint32Max},
+    {kRxMini, 0, kUint32Max},
+    {kRxJumbo, 0, kUint32Max},
+    {kTx, 0, kUint32Max},
 };
 
 /// Fields of "PauseParamsSettings" after "NIC", in structure order.
@@ -251,6 +260,7 @@ std::shared_ptr<OutputSpec> NicRingCurrentSet::GetOutputSpecInternal() {
 void NicRingCurrentSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                         const std::shared_ptr<Output>& output) {
   try {
+    RequireFit(*input, kRingFits);
     std::unique_ptr<HostCtl::Network::NetworkInfo> info =
         HostCtl::Network::NetworkFactory::GetNetworkInfo();
     std::unique_ptr<Pnic> nic = FindNic(*info, *input, *output);

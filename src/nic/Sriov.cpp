@@ -13,9 +13,9 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Sriov.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/IntFit.h"
 
 #include <cstdlib>
-#include <limits>
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -27,6 +27,10 @@ namespace {
 
 const std::string kNicName = "nic-name";
 const std::string kVfId = "vf-id";
+
+/// The VF id goes to the host as a signed 32-bit number; negative ones have
+/// their own message.
+const IntFit kStatsFits[] = {{kVfId, 0, kInt32Max}};
 const std::string kNoSriovNic = "There is no SRIOV Nic with name ";
 
 // network sriovnic list
@@ -287,8 +291,12 @@ void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
     // A number that does not fit in 32 bits is refused like a negative one,
     // rather than cut to its low bits and taken for another VF.
     long vfId = ParseVfId(vfText);
-    if (vfId < 0 || vfId > std::numeric_limits<int32_t>::max()) {
+    if (vfId < 0) {
       output->AddErrorMessage("Invalid vf id:" + vfText + " provided. vf id starts from 0");
+      return;
+    }
+    if (auto problem = OutOfRange(*input, kStatsFits[0])) {
+      output->AddErrorMessage(*problem);
       return;
     }
     if (!info.GetSriovNicByName(name)) {

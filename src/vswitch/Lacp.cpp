@@ -12,10 +12,10 @@
 #include "HostCtl/Misc.h"
 #include "HostCtl/Network/NetworkInfo.h"
 #include "TvkCtl/Network/Switching.h"
+#include "common/IntFit.h"
 #include "common/PolicyParams.h"
 
 #include <cstring>
-#include <limits>
 #include <map>
 
 namespace CorvexCli::NetworkNamespace {
@@ -39,6 +39,9 @@ const std::string kParamTimeout = "timeout";
 const std::string kParamNicName = "nic-name";
 const std::string kParamLagId = "lag-id";
 const std::string kParamKrx = "krx";
+
+/// The LAG id goes to the switch as an unsigned 32-bit number.
+const IntFit kTimeoutFits[] = {{kParamLagId, 0, kUint32Max}};
 
 const std::string kStructLacp = "LACP";
 const std::string kStructLacpStats = "LACPStats";
@@ -545,12 +548,11 @@ void LacpSetTimeout::ExecuteInternal(const std::shared_ptr<Input>& input,
       output->AddErrorMessage("LAG ID is empty");
       return;
     }
-    long lagId = input->GetParameterInt(kParamLagId);
-    if (lagId < 0 || lagId > static_cast<long>(std::numeric_limits<uint32_t>::max())) {
-      output->AddErrorMessage("Invalid LAG ID " + std::to_string(lagId) +
-                              ": a LAG ID is between 0 and 4294967295");
+    if (auto problem = OutOfRange(*input, kTimeoutFits[0])) {
+      output->AddErrorMessage(*problem);
       return;
     }
+    long lagId = input->GetParameterInt(kParamLagId);
     std::string nicName;
     if (input->HasParameter(kParamNicName))
       nicName = input->GetParameter(kParamNicName);

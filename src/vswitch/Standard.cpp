@@ -9,6 +9,7 @@
 #include "HostCtl/Network/NetworkInfo.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/Switching.h"
+#include "common/IntFit.h"
 #include "common/PolicyParams.h"
 
 #include <algorithm>
@@ -55,6 +56,10 @@ const std::string kFieldUplinks = "Uplinks";
 const std::string kFieldPortgroups = "Portgroups";
 
 const std::string kSystemType = "system";
+
+/// The MTU is taken as a signed 32-bit number; negative ones have their own
+/// message.
+const IntFit kSetFits[] = {{kParamMtu, 0, kInt32Max}};
 
 /// CDP status names, by index.
 const std::string kCdpStatus[] = {"down", "listen", "advertise", "both"};
@@ -210,16 +215,16 @@ void VirtualSwitchStandardSet::ExecuteInternal(const std::shared_ptr<Input>& inp
       return;
     }
     if (input->HasParameter(kParamMtu)) {
-      // The value is read as a signed 32-bit one. A value beyond 32 bits is
-      // not wrapped into a small valid MTU: a negative one is refused here,
-      // a larger one passed as the largest, which the host refuses.
       long mtu = input->GetParameterInt(kParamMtu);
-      if (mtu < 0 || (mtu <= static_cast<long>(UINT32_MAX) && static_cast<int32_t>(mtu) < 0)) {
+      if (mtu < 0) {
         output->AddErrorMessage("MTU size should be a positive value");
         return;
       }
-      vswitch->SetMtu(mtu > static_cast<long>(UINT32_MAX) ? UINT32_MAX
-                                                          : static_cast<uint32_t>(mtu));
+      if (auto problem = OutOfRange(*input, kSetFits[0])) {
+        output->AddErrorMessage(*problem);
+        return;
+      }
+      vswitch->SetMtu(static_cast<uint32_t>(mtu));
     }
     if (input->HasParameter(kParamCdpStatus)) {
       const std::string& status = input->GetParameter(kParamCdpStatus);

@@ -235,10 +235,6 @@ ACCEPTED = {
     ("network nic set", "phy-address", "outside"): "-1 leaves the PHY address as it is",
     ("network nic set", "virtual-address", "empty"):
         "the demo NIC has no virtual address: no change",
-    ("network nic set", "message-level", "outside"):
-        "-1 sets every bit of the driver's 32-bit message mask",
-    ("network nic eeprom change", "value", "outside"):
-        "-1 is the double word 0xffffffff (stored as its low 32 bits)",
     ("network vswitch standard policy failover set", "active-uplinks", "empty"):
         "an empty list leaves no active uplink",
     ("network vswitch standard policy failover set", "standby-uplinks", "empty"):

@@ -61,38 +61,38 @@ void ExpectRecords(const ordered_json& records, const MetaObjectPtr& root,
 } // namespace
 
 TEST(CsvFormatTest, ScalarsAndStringLists) {
-  EXPECT_EQ(Render("csv", MetaBool::New(true)), "true\r\n");
-  EXPECT_EQ(Render("csv", MetaInt::New(-7)), "-7\r\n");
-  EXPECT_EQ(Render("csv", MetaString::New("a, \"b\"")), "\"a, \"\"b\"\"\"\r\n");
+  EXPECT_EQ(Render("csv", MetaBool::New(true)), "true\n");
+  EXPECT_EQ(Render("csv", MetaInt::New(-7)), "-7\n");
+  EXPECT_EQ(Render("csv", MetaString::New("a, \"b\"")), "\"a, \"\"b\"\"\"\n");
   // A record of one empty field is quoted, or it would read as a blank line.
-  EXPECT_EQ(Render("csv", MetaString::New("")), "\"\"\r\n");
+  EXPECT_EQ(Render("csv", MetaString::New("")), "\"\"\n");
   EXPECT_EQ(Render("csv", MetaString::New()), "");
   EXPECT_EQ(Render("csv", nullptr), "");
 
   auto strings = MetaList::New(String);
-  EXPECT_EQ(Render("csv", strings), "Value\r\n");
+  EXPECT_EQ(Render("csv", strings), "Value\n");
   strings->AddAll(std::vector<std::string>{"vmnic0", "", "x\ny"});
-  EXPECT_EQ(Render("csv", strings), "Value\r\nvmnic0\r\n\"\"\r\n\"x\ny\"\r\n");
-  EXPECT_EQ(Render("csv", strings, {{"show-header", "false"}}), "vmnic0\r\n\"\"\r\n\"x\ny\"\r\n");
+  EXPECT_EQ(Render("csv", strings), "Value\nvmnic0\n\"\"\n\"x\ny\"\n");
+  EXPECT_EQ(Render("csv", strings, {{"show-header", "false"}}), "vmnic0\n\"\"\n\"x\ny\"\n");
 }
 
 TEST(CsvFormatTest, StructuresWithNestedCells) {
   EXPECT_EQ(Render("csv", Nics()),
-            "Name,Speed,Link Up,Uplinks,Driver,Queues,Description\r\n"
+            "Name,Speed,Link Up,Uplinks,Driver,Queues,Description\n"
             "vmnic0,25000,true,\"[\"\"vmnic0\"\",\"\"vmnic1\"\"]\","
             "\"{\"\"Name\"\":\"\"nfx\"\",\"\"Firmware\"\":{\"\"Version\"\":\"\"2.1\"\","
             "\"\"Features\"\":[\"\"tso\"\",\"\"rss\"\"]}}\","
             "\"[{\"\"Queue ID\"\":0,\"\"Filters\"\":[{\"\"Class\"\":\"\"mac\"\","
             "\"\"MACs\"\":[\"\"00:50:56:00:00:01\"\"]}]}]\","
-            "\"Dual port, \"\"25G\"\"\"\r\n"
-            "vmnic1,-1,false,[],\"{\"\"Firmware\"\":{\"\"Features\"\":[]}}\",[],\r\n");
+            "\"Dual port, \"\"25G\"\"\"\n"
+            "vmnic1,-1,false,[],\"{\"\"Firmware\"\":{\"\"Features\"\":[]}}\",[],\n");
   // A single structure is a header and one row; unset fields are empty cells.
   EXPECT_EQ(Render("csv", Switch("vSwitch1", 9000, {}, {})),
-            "Name,MTU,Uplinks,Policy,Ports,Notes\r\n"
-            "vSwitch1,9000,[],\"{\"\"Enabled\"\":true,\"\"Peak\"\":100}\",[],\r\n");
+            "Name,MTU,Uplinks,Policy,Ports,Notes\n"
+            "vSwitch1,9000,[],\"{\"\"Enabled\"\":true,\"\"Peak\"\":100}\",[],\n");
   // An empty list still names its columns.
   EXPECT_EQ(Render("csv", MetaList::New(Struct, SwitchTemplate())),
-            "Name,MTU,Uplinks,Policy,Ports,Notes\r\n");
+            "Name,MTU,Uplinks,Policy,Ports,Notes\n");
 }
 
 TEST(CsvFormatTest, SelectsFieldsAndHonoursShowHeader) {
@@ -102,12 +102,12 @@ TEST(CsvFormatTest, SelectsFieldsAndHonoursShowHeader) {
       {"header:VirtualSwitch", "%Name%"},
       {"table-columns", "MTU"},
       {"units:VirtualSwitch.Name", "x"}};
-  EXPECT_EQ(Render("csv", TwoSwitches(), params), "Ports,Name\r\n"
+  EXPECT_EQ(Render("csv", TwoSwitches(), params), "Ports,Name\n"
                                                   "\"[{\"\"Port ID\"\":1},{\"\"Port ID\"\":2}]\","
-                                                  "vSwitch0\r\n"
-                                                  "[],vSwitch1\r\n");
+                                                  "vSwitch0\n"
+                                                  "[],vSwitch1\n");
   EXPECT_EQ(Render("csv", TwoSwitches(), {{"fields", "Name"}, {"show-header", "false"}}),
-            "vSwitch0\r\nvSwitch1\r\n");
+            "vSwitch0\nvSwitch1\n");
   EXPECT_EQ(Render("csv", TwoSwitches(), {{"fields", "Bogus"}}), "");
 }
 
@@ -122,15 +122,15 @@ TEST(CsvFormatTest, RowsWithoutTemplateKeepEveryField) {
   second->SetField("A", 2L);
   list->Add(first);
   list->Add(second);
-  EXPECT_EQ(Render("csv", list), "A,B\r\n1,\r\n2,b\r\n");
+  EXPECT_EQ(Render("csv", list), "A,B\n1,\n2,b\n");
 }
 
 TEST(CsvFormatTest, RepairsInvalidUtf8) {
   auto value = MetaStruct::New("Text");
   value->SetField("Bad\xFF", "a\xC0\xAF"
                              "b");
-  EXPECT_EQ(Render("csv", value), "Bad\xEF\xBF\xBD\r\na\xEF\xBF\xBD\xEF\xBF\xBD"
-                                  "b\r\n");
+  EXPECT_EQ(Render("csv", value), "Bad\xEF\xBF\xBD\na\xEF\xBF\xBD\xEF\xBF\xBD"
+                                  "b\n");
 }
 
 TEST(CsvFormatTest, ReadsBackWithAnRfc4180Reader) {

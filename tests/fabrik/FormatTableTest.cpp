@@ -91,8 +91,9 @@ TEST(TableFormatTest, FallsBackToSimpleForScalarsAndHandlesEdges) {
   strings->AddAll(std::vector<std::string>{"a", "b"});
   EXPECT_EQ(Render("table", strings), "a\nb\n");
   EXPECT_EQ(Render("table", MetaList::New(Struct, SwitchTemplate())), "");
+  // A single structure is no table: it prints as "simple" does.
   EXPECT_EQ(Render("table", Switch("vSwitch0", 1500, {}, {}), {{"fields", "Name,MTU"}}),
-            "Name      MTU\n--------  ----\nvSwitch0  1500\n");
+            "Name: vSwitch0\nMTU: 1500\n");
 }
 
 TEST(TableFormatTest, CountsCharactersNotBytesAndKeepsCellsOnOneLine) {

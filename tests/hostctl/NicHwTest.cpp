@@ -169,6 +169,57 @@ TEST_F(NicHwTest, ImportNamesTheBadField) {
   }
 }
 
+TEST_F(NicHwTest, ImportRefusesWhatTheHostRefuses) {
+  struct Case {
+    const char* key;      ///< Key of vmnic0 to replace.
+    const char* value;    ///< Its new JSON.
+    const char* expected; ///< Error text.
+  };
+  const Case refused[] = {
+      {"coalesce", R"({"adaptiveTx": true})",
+       "nics[0].coalesce: Adaptive coalescing on vmnic0 needs a sample interval of 1 to 3600 "
+       "seconds, not 0"},
+      {"coalesce", R"({"pktRateLow": 5000, "pktRateHigh": 5000})",
+       "nics[0].coalesce: The low packet rate of vmnic0 (5000 pps) must be below its high packet "
+       "rate (5000 pps)"},
+      {"coalesce", R"({"txUsecsHigh": 4294967295})",
+       "nics[0].coalesce: The coalescing high-rate TX delay time of vmnic0 must be at most "
+       "2147483647, not 4294967295"},
+      {"ring", R"({"maximums": {"rx": 512, "tx": 512}, "current": {"tx": 512}})",
+       "nics[0].ring: The RX ring of vmnic0 needs at least one entry"},
+      {"netqueue", R"({"maxTxQueues": 8, "txQueues": 0})",
+       "nics[0].netqueue: The TX netqueue count of vmnic0 must be between 1 and 8, not 0"},
+      {"netqueue", R"({"supportedSettings": ["RSS"], "allowedSettings": ["RSS", "MacLearnLB"]})",
+       "nics[0].netqueue: vmnic0 does not support the NetQueue load balancer setting MacLearnLB, "
+       "so it cannot be allowed"},
+  };
+  for (const Case& c : refused) {
+    ordered_json host = TestHost();
+    host["nics"][0][c.key] = ordered_json::parse(c.value);
+    auto store = Model::Store::Create(dir_ + "/refused.db");
+    EXPECT_THROW(
+        {
+          try {
+            Model::ImportHost(*store, host);
+          } catch (const Model::ImportError& e) {
+            EXPECT_EQ(e.what(), std::string(c.expected));
+            throw;
+          }
+        },
+        Model::ImportError)
+        << c.value;
+    store.reset();
+    std::filesystem::remove_all(dir_ + "/refused.db");
+  }
+  // What the rules allow: no rings, no queues, rates of which one is unset.
+  ordered_json host = TestHost();
+  host["nics"][0]["ring"] = ordered_json::parse(R"({"maximums": {}, "current": {}})");
+  host["nics"][0]["netqueue"] = ordered_json::parse(R"({"supportedSettings": ["RSS"]})");
+  host["nics"][0]["coalesce"] = ordered_json::parse(R"({"pktRateLow": 9000})");
+  auto store = Model::Store::Create(dir_ + "/allowed.db");
+  EXPECT_NO_THROW(Model::ImportHost(*store, host));
+}
+
 TEST_F(NicHwTest, OffloadSetChangesOnlyMaskedFlags) {
   PnicImpl nic("vmnic0");
   PnicOffloadSettings settings{};
@@ -231,14 +282,11 @@ TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {
   ExpectRefusal([&] { nic.SetRingParams(ring); },
                 "The RX ring of vmnic0 takes at most 4096 entries, not 4097");
   ring.rx = 512;
-  ring.tx = 0;
-  ExpectRefusal([&] { nic.SetRingParams(ring); },
-                "The TX ring of vmnic0 is required; its size cannot be 0");
-  ring.tx = 2048;
   ring.rxMini = 1;
   ExpectRefusal([&] { nic.SetRingParams(ring); },
-                "vmnic0 has no RX mini ring; its size must be 0, not 1");
+                "vmnic0 has no RX mini ring; its size cannot be set");
   ring.rxMini = 0;
+  ring.tx = 2048;
   nic.SetRingParams(ring);
   PnicRingParams max{}, cur{};
   PnicImpl("vmnic0").GetRingParams(max, cur);
@@ -247,6 +295,26 @@ TEST_F(NicHwTest, RingSizesAreCheckedAgainstThePresetMaximums) {
   EXPECT_EQ(cur.rx, 512u);
   EXPECT_EQ(cur.rxJumbo, 0u);
   EXPECT_EQ(cur.tx, 2048u);
+}
+
+TEST_F(NicHwTest, RingSizeZeroLeavesThatRingAsItIs) {
+  PnicImpl nic("vmnic0");
+  PnicRingParams ring{};
+  ring.tx = 1024;
+  nic.SetRingParams(ring); // RX and the rings the NIC lacks stay as they are.
+  PnicRingParams max{}, before{}, after{};
+  nic.GetRingParams(max, before);
+  EXPECT_EQ(before.tx, 1024u);
+  ring = {};
+  ring.rx = 256;
+  nic.SetRingParams(ring);
+  nic.GetRingParams(max, after);
+  EXPECT_EQ(after.rx, 256u);
+  EXPECT_EQ(after.tx, 1024u);
+  nic.SetRingParams(PnicRingParams{});
+  nic.GetRingParams(max, before);
+  EXPECT_EQ(before.rx, 256u);
+  EXPECT_EQ(before.tx, 1024u);
 }
 
 TEST_F(NicHwTest, NetqueueSetChangesExactlyWhatItSelects) {

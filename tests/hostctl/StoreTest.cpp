@@ -384,7 +384,14 @@ TEST_F(StoreTest, UpgradesAFileOfTheLayoutBefore) {
     // The same host as a demo host made now, resolver order included.
     auto fresh = Model::Store::Create(dir_ + "/fresh.db");
     Model::ImportHost(*fresh, Model::Profile("demo"));
-    EXPECT_EQ(Model::ExportHost(old), Model::ExportHost(*fresh));
+    // The demo of that release let vmnic0 use a load-balancer setting it did
+    // not list as supported; today's demo lists it. Stored files are not
+    // checked again, so the old file keeps its list.
+    auto now = Model::ExportHost(*fresh);
+    auto& supported = now["nics"][0]["netqueue"]["supportedSettings"];
+    for (auto it = supported.begin(); it != supported.end();)
+      it = *it == "MacLearnLB" ? supported.erase(it) : it + 1;
+    EXPECT_EQ(Model::ExportHost(old), now);
   }
   // A second open finds nothing left to do.
   Model::Store again(path_);

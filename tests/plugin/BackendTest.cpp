@@ -117,11 +117,11 @@ TEST_F(BackendTest, CommandsRunOnTheRegisteredBackend) {
   Ops::RegisterFactory("linux", MakeFakeHost);
   EXPECT_EQ(Run({"--host", "linux", "--formatter", "csv", "network", "nic", "list"}), 0) << err_;
   EXPECT_EQ(out_, "Name,PCI Device,Driver,Link,Admin Status,Link Status,Speed,Duplex,MAC Address,"
-                  "MTU,Description,DPU Id\r\n"
+                  "MTU,Description,DPU Id\n"
                   "eth0,Pseudo,fakenet,Up,Up,Up,1000,Full,02:00:00:00:00:01,1500,Fake Labs "
-                  "Virtual NIC,N/A\r\n"
+                  "Virtual NIC,N/A\n"
                   "eth1,Pseudo,fakenet,Down,Down,Down,1000,Full,02:00:00:00:00:02,1500,Fake Labs "
-                  "Virtual NIC,N/A\r\n");
+                  "Virtual NIC,N/A\n");
 
   // A change goes to the fake, and the next command sees it.
   EXPECT_EQ(Run({"--host", "linux", "network", "nic", "up", "-n", "eth1"}), 0) << err_;

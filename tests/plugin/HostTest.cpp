@@ -89,6 +89,15 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
   } cases[] = {
       {{}, "missing required option --nic-name (-n)"},
       {{"-n", "a", "--colour", "red"}, "unknown option --colour"},
+      // A slip of one or two letters gets the closest option names.
+      {{"--nic-nme", "a"}, "unknown option --nic-nme; did you mean --nic-name?"},
+      {{"-n", "a", "--Duplex", "full"}, "unknown option --Duplex; did you mean --duplex?"},
+      {{"-n", "a", "--vmnics", "b"}, "unknown option --vmnics; did you mean --vmnic?"},
+      // An option of the whole run, written where the command's go.
+      {{"-n", "a", "--formatter", "json"},
+       "option --formatter is a global option; global options go before the command words"},
+      {{"-n", "a", "--host=/tmp/h.db"},
+       "option --host is a global option; global options go before the command words"},
       {{"-n", "a", "-x", "1"}, "unknown option -x"},
       {{"-n", "a", "-n", "b"}, "option --nic-name is given more than once"},
       {{"-n", "a", "--speed", "fast"}, "option --speed: \"fast\" is not an integer"},
@@ -128,6 +137,20 @@ TEST(OptionsTest, RefusesBadCommandLinesNamingTheOption) {
     std::string problem = Parse(c.args, input);
     EXPECT_EQ(problem, c.problem);
   }
+}
+
+TEST(OptionsTest, HelpAnywhereAfterTheWords) {
+  auto spec = SampleSpec();
+  EXPECT_TRUE(Ostra::AsksForHelp({"-n", "vmnic0", "--help"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"--bogus", "-h"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"--help"}, nullptr));
+  EXPECT_FALSE(Ostra::AsksForHelp({"-n", "vmnic0"}, spec.get()));
+  // A command with a -h of its own keeps it.
+  auto own = ParameterSpec::New("hostname", CallSpec::String);
+  own->SetShortName("h");
+  spec->AddParameter(own);
+  EXPECT_FALSE(Ostra::AsksForHelp({"-h", "web01"}, spec.get()));
+  EXPECT_TRUE(Ostra::AsksForHelp({"-h", "web01", "--help"}, spec.get()));
 }
 
 TEST(OptionsTest, BooleanWordsAndIntegers) {

@@ -44,8 +44,15 @@ TEST(IpServicesConversionTest, SpiIsReadAsWholeHexNumber) {
   EXPECT_EQ(500u, spi);
   EXPECT_TRUE(ParseSpiText("ffffffff", spi));
   EXPECT_EQ(0xffffffffu, spi);
+  // Leading blanks and a plus sign are taken, as a stream extraction takes them.
+  for (const char* signedOrBlank : {" 1f6", "\t 1f6", "+1f6", "  +0x1F6"}) {
+    spi = 0;
+    EXPECT_TRUE(ParseSpiText(signedOrBlank, spi)) << signedOrBlank;
+    EXPECT_EQ(0x1f6u, spi) << signedOrBlank;
+  }
   spi = 7;
-  for (const char* bad : {"1f4g", "", "g", "100000000", "-1", "+1f4", " 1f4", "1f4 ", "0x"}) {
+  for (const char* bad :
+       {"1f4g", "", " ", "g", "100000000", "-1", " -1", "+-1", "+ 1f4", "1f4 ", "0x", "--1"}) {
     EXPECT_FALSE(ParseSpiText(bad, spi)) << bad;
     EXPECT_EQ(7u, spi) << bad;
   }

@@ -117,17 +117,24 @@ TEST_F(GetInfoFromParamTest, PhyAddressBounds) {
   EXPECT_EQ(Refusal(), "Invalid PHY address value.");
   input_->SetInt("phy-address", -2);
   EXPECT_EQ(Refusal(), "Invalid PHY address value.");
-  // 2^32 + 1 must not be taken for address 1.
+  // 2^32 + 1 must not be taken for address 1: the record holds 32 bits.
   input_->SetInt("phy-address", 4294967297L);
-  EXPECT_EQ(Refusal(), "Invalid PHY address value.");
+  EXPECT_EQ(Refusal(), "option --phy-address: value 4294967297 is out of range [1 - 4294967295]");
+  input_->SetInt("phy-address", 4294967295L);
+  EXPECT_TRUE(Merge());
+  EXPECT_EQ(record_.phyAddress, 4294967295u);
 }
 
-TEST_F(GetInfoFromParamTest, MessageLevelKeepsItsBitPattern) {
-  input_->SetInt("message-level", -1);
+TEST_F(GetInfoFromParamTest, MessageLevelMustFitThirtyTwoBits) {
+  input_->SetInt("message-level", 4294967295L);
   EXPECT_TRUE(Merge());
   EXPECT_EQ(record_.messageLevel, 0xffffffffu);
-  input_->SetInt("message-level", 4294967296L);
-  EXPECT_EQ(Refusal(), "Invalid message level value.");
+  record_.messageLevelChanged = false;
+  for (long outside : {-1L, 4294967296L}) {
+    input_->SetInt("message-level", outside);
+    EXPECT_EQ(Refusal(), "option --message-level: value " + std::to_string(outside) +
+                             " is out of range [0 - 4294967295]");
+  }
 }
 
 TEST_F(GetInfoFromParamTest, WakeOnLettersBecomeCodesInOrder) {

@@ -2,15 +2,18 @@
 //
 // "ostracli --complete WORD..." prints the candidates for the last word, one
 // per line, from the live command tree: global options, namespace and command
-// names, command options, and the values of enumerations, booleans and
-// formatters. The bash function installed with ostracli (ostracli.bash)
-// calls it, so completion never drifts from the tree.
+// names, command options, the values of enumerations, booleans and
+// formatters, and the names of the host's objects (LiveNames). The bash
+// function installed with ostracli (ostracli.bash) calls it, so completion
+// never drifts from the tree or the host.
 //
 //===----------------------------------------------------------------------===//
 #include "Host.h"
 #include "HostCtl/Lib.h"
 
 #include "Fabrik/Format.h"
+#include "Globals.h"
+#include "LiveNames.h"
 
 #include <set>
 
@@ -20,12 +23,9 @@ using namespace Fabrik;
 
 namespace {
 
-const char* const kGlobalOptions[] = {"--formatter", "--format-param", "--host",      "--help",
-                                      "--version",   "--batch",        "--keep-going"};
-
 bool TakesValue(const std::string& option) {
-  return option == "--formatter" || option == "--format-param" || option == "--host" ||
-         option == "--batch";
+  const GlobalOption* global = FindGlobalOption(option);
+  return global && global->value;
 }
 
 void Add(std::string& out, const std::string& candidate, const std::string& prefix) {
@@ -40,11 +40,16 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
   const std::string current = words.empty() ? std::string() : words.back();
   const std::size_t count = words.empty() ? 0 : words.size() - 1; // Complete words before it.
 
-  // Global options, then the path.
+  // Global options, then the path. The host they name is the one whose
+  // names are offered.
   std::size_t i = 0;
-  std::string previous;
+  std::string host;
   for (; i < count && words[i].size() > 1 && words[i][0] == '-'; ++i) {
-    if (TakesValue(words[i]) && words[i].find('=') == std::string::npos)
+    std::size_t eq = words[i].find('=');
+    if (words[i].compare(0, eq, "--host") == 0)
+      host =
+          eq == std::string::npos ? (i + 1 < count ? words[i + 1] : "") : words[i].substr(eq + 1);
+    if (TakesValue(words[i].substr(0, eq)) && eq == std::string::npos)
       ++i;
   }
   if (i > count) {
@@ -70,8 +75,8 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
     if (i < count)
       return out;
     if (node == tree.Root() && !current.empty() && current[0] == '-') {
-      for (const char* option : kGlobalOptions)
-        Add(out, option, current);
+      for (const GlobalOption& option : GlobalOptionTable())
+        Add(out, option.name, current);
       return out;
     }
     for (const std::string& name : node->GetNamespaceNodeNames())
@@ -120,6 +125,9 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
           constraint->GetType() == CallSpec::IntEnum)
         for (const auto& value : constraint->GetEnumValues())
           Add(out, value.value, current);
+    } else {
+      for (const std::string& name : LiveNames(pending->GetName(), host))
+        Add(out, name, current);
     }
     return out;
   }

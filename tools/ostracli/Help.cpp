@@ -1,6 +1,8 @@
 //===- Help.cpp - Help texts generated from the command tree ---------------===//
 #include "Help.h"
 
+#include "Globals.h"
+
 #include <algorithm>
 #include <cstdio>
 #include <vector>
@@ -104,34 +106,44 @@ void Columns(std::string& out, const std::string& name, const std::string& text,
 
 } // namespace
 
+std::vector<std::string> ClosestNames(const std::string& word,
+                                      const std::vector<std::string>& names) {
+  std::vector<std::string> close;
+  // No name is near a word this long, and the distance costs its length.
+  if (word.size() > 64)
+    return close;
+  const std::size_t limit = word.size() <= 4 ? 1 : 2;
+  std::size_t best = limit + 1;
+  for (const std::string& name : names) {
+    std::size_t distance = EditDistance(Lower(name), Lower(word));
+    if (distance < best) {
+      best = distance;
+      close.clear();
+    }
+    if (distance == best)
+      close.push_back(name);
+  }
+  return close;
+}
+
+std::string DidYouMean(const std::vector<std::string>& close, const char* before,
+                       const char* after) {
+  if (close.empty())
+    return "";
+  std::string text = "; did you mean";
+  for (std::size_t i = 0; i < close.size(); ++i)
+    text += (i ? ", " : " ") + (before + close[i]) + after;
+  return text + "?";
+}
+
 std::string UnknownWordMessage(const AutoCli::NamespaceNode& node, const std::string& word) {
   std::string where = node.GetPathString(' ');
   std::string message =
       "Error: unknown " +
       std::string(node.GetType() == AutoCli::CommandKind ? "argument" : "command") + " \"" + word +
       "\"" + (where.empty() ? "" : " under \"" + where + "\"");
-  // Suggest the children closest to the word: a different case, or one or two
-  // typing slips (one for short words).
-  std::vector<std::string> close;
-  if (node.GetType() == AutoCli::NamespaceKind) {
-    const std::size_t limit = word.size() <= 4 ? 1 : 2;
-    std::size_t best = limit + 1;
-    for (const std::string& name : node.GetNamespaceNodeNames()) {
-      std::size_t distance = EditDistance(Lower(name), Lower(word));
-      if (distance < best) {
-        best = distance;
-        close.clear();
-      }
-      if (distance == best)
-        close.push_back(name);
-    }
-  }
-  if (!close.empty()) {
-    message += "; did you mean";
-    for (std::size_t i = 0; i < close.size(); ++i)
-      message += (i ? ", \"" : " \"") + close[i] + "\"";
-    message += "?";
-  }
+  if (node.GetType() == AutoCli::NamespaceKind)
+    message += DidYouMean(ClosestNames(word, node.GetNamespaceNodeNames()));
   return message + "\n";
 }
 
@@ -140,16 +152,14 @@ std::string NamespaceHelpText(const AutoCli::NamespaceNode& node, const std::str
   const bool root = node.GetPathString(' ').empty();
   if (root) {
     out = "Usage: ostracli [options] {namespace}+ {cmd} [cmd options]\n\n"
-          "Options:\n";
-    Columns(out, "--formatter=NAME",
-            "Output formatter: simple, table, json, xml, csv,\n"
-            "keyvalue (the command's default when not given).",
-            28);
-    Columns(out, "--format-param=KEY=VALUE",
-            "Formatter parameter, repeatable, e.g. fields=Name,MTU or show-header=false.", 28);
-    Columns(out, "--host=PATH", "The host state database to work on.", 28);
-    Columns(out, "-h, --help", "Help of the namespace or command named before it.", 28);
-    Columns(out, "--version", "Versions of ostracli and its plug-ins.", 28);
+          "Options (before the command words):\n";
+    for (const GlobalOption& option : GlobalOptionTable()) {
+      std::string name = option.alias ? std::string(option.alias) + ", " : std::string();
+      name += option.name;
+      if (option.value)
+        name += std::string(" ") + option.value;
+      Columns(out, name, option.text, 28);
+    }
     out += "\nExit status: 0 success; 1 the command reported an error; 2 the command line was "
            "refused\n(unknown command or option, missing or invalid value) and nothing ran.\n";
     out += "\nHost state: " + hostState + ".\nOverride it with --host or OSTRACLI_HOST.\n";

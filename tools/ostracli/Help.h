@@ -4,8 +4,20 @@
 #include "Fabrik/AutoCli.h"
 
 #include <string>
+#include <vector>
 
 namespace Ostra {
+
+/// The names of \p names closest to \p word: a different case, or one or two
+/// typing slips (one for words of up to four characters); none when nothing
+/// is that close.
+std::vector<std::string> ClosestNames(const std::string& word,
+                                      const std::vector<std::string>& names);
+
+/// "; did you mean "a", "b"?" for \p close, each name between \p before and
+/// \p after; "" when \p close is empty.
+std::string DidYouMean(const std::vector<std::string>& close, const char* before = "\"",
+                       const char* after = "\"");
 
 /// "Error: ..." for a path word that names no child of \p node, with the
 /// closest child names as suggestions.

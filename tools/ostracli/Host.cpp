@@ -11,6 +11,7 @@
 #include "Host.h"
 
 #include "Fabrik/Format.h"
+#include "FormatParams.h"
 #include "Help.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
@@ -265,6 +266,8 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
       }
     } else if (name == "--reference") {
       options.reference = true;
+    } else if (name == "--man") {
+      options.reference = options.manual = true;
     } else if (name == "--complete") {
       options.complete = true;
       return static_cast<int>(i + 1);
@@ -346,11 +349,6 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
   for (; i < args.size() && !(args[i].size() > 1 && args[i][0] == '-'); ++i)
     words.push_back(args[i]);
   std::vector<std::string> rest(args.begin() + static_cast<long>(i), args.end());
-  bool wantsHelp = global.help;
-  if (!rest.empty() && (rest[0] == "--help" || rest[0] == "-h")) {
-    wantsHelp = true;
-    rest.erase(rest.begin());
-  }
 
   AutoCli::NamespaceNodePtr node = tree.Root();
   for (std::size_t w = 0; w < words.size(); ++w) {
@@ -365,7 +363,7 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
 
   const bool machine = global.formatter == "json";
   if (node->GetType() == AutoCli::NamespaceKind) {
-    if (!rest.empty() && !wantsHelp) {
+    if (!rest.empty() && !global.help && !AsksForHelp(rest, nullptr)) {
       err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
              " --help\" lists the commands\n";
       return ExitUsage;
@@ -389,14 +387,15 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     err += (mode.inBatch ? "" : "ostracli: ") + std::string(e.what()) + "\n";
     return ExitCommandError;
   }
-  if (wantsHelp) {
+  if (global.help || AsksForHelp(rest, inputSpec.get())) {
     out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
     return ExitOk;
   }
 
   auto input = CallSpec::Input::New();
   std::string problem;
-  if (!ParseCommandOptions(*inputSpec, rest, *input, problem)) {
+  if (!ParseCommandOptions(*inputSpec, rest, *input, problem) ||
+      !(problem = CheckFormatParams(*command, tree.Root(), global.params)).empty()) {
     err += "Error: " + problem + "\n";
     return ExitUsage;
   }
@@ -501,8 +500,8 @@ int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
     std::fwrite(out.data(), 1, out.size(), stdout);
     return ExitOk;
   }
-  if (first >= 0 && global.reference) {
-    out = Reference(*tree);
+  if (first >= 0 && (global.reference || global.manual)) {
+    out = global.manual ? ManualPage(*tree) : Reference(*tree);
     std::fwrite(out.data(), 1, out.size(), stdout);
     return ExitOk;
   }

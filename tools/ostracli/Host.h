@@ -60,6 +60,7 @@ struct GlobalOptions {
   bool version = false;                                    ///< --version.
   bool complete = false;                                   ///< --complete WORD...
   bool reference = false;                                  ///< --reference.
+  bool manual = false; ///< --man: the reference as a manual page (reference is set too).
 };
 
 /// Reads the global options in front of the command path; returns the index
@@ -103,6 +104,13 @@ std::string Complete(const CommandTree& tree, const std::vector<std::string>& wo
 
 /// The command reference in Markdown, generated from the tree.
 std::string Reference(const CommandTree& tree);
+
+/// The name of a parameter type in the reference and the manual page.
+const char* ReferenceTypeName(Fabrik::CallSpec::ParameterType type);
+
+/// The manual page ostracli(1) in roff, generated from the tree and the
+/// global options.
+std::string ManualPage(const CommandTree& tree);
 
 /// Where ostracli looks for plug-ins: $OSTRACLI_PLUGIN_DIR, else
 /// <directory of the executable>/../lib/ostracli/plugins.

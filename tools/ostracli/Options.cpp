@@ -1,6 +1,9 @@
 //===- Options.cpp - Command options against an input specification ------===//
 #include "Options.h"
 
+#include "Globals.h"
+#include "Help.h"
+
 #include <cerrno>
 #include <cstdlib>
 #include <set>
@@ -130,6 +133,19 @@ bool IsDecimal(const std::string& text) {
   return true;
 }
 
+/// "unknown option X" with the command's closest options, or the reminder
+/// that a global option goes before the command words.
+std::string UnknownOption(const InputSpec& spec, const std::string& option) {
+  if (FindGlobalOption(option))
+    return "option " + option + " is a global option; global options go before the command words";
+  if (option.compare(0, 2, "--") != 0)
+    return "unknown option " + option;
+  std::vector<std::string> names;
+  for (const auto& parameter : spec.GetParameters())
+    names.push_back(parameter->GetName());
+  return "unknown option " + option + DidYouMean(ClosestNames(option.substr(2), names), "--", "");
+}
+
 bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
            std::string& problem) {
   const std::string name = OptionName(spec);
@@ -193,6 +209,13 @@ bool Store(const ParameterSpec& spec, const std::string& value, Input& input,
 
 } // namespace
 
+bool AsksForHelp(const std::vector<std::string>& args, const InputSpec* spec) {
+  for (const std::string& arg : args)
+    if (arg == "--help" || (arg == "-h" && !(spec && spec->FindShortParameter("h"))))
+      return true;
+  return false;
+}
+
 bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& args, Input& input,
                          std::string& problem) {
   std::set<std::string> seen;
@@ -206,7 +229,7 @@ bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& 
       std::string name = arg.substr(2, eq == std::string::npos ? std::string::npos : eq - 2);
       parameter = spec.FindParameter(name);
       if (!parameter) {
-        problem = "unknown option --" + name;
+        problem = UnknownOption(spec, "--" + name);
         return false;
       }
       if (eq != std::string::npos) {
@@ -216,7 +239,7 @@ bool ParseCommandOptions(const InputSpec& spec, const std::vector<std::string>& 
     } else if (arg.size() == 2 && arg[0] == '-' && arg[1] != '-') {
       parameter = spec.FindShortParameter(arg.substr(1));
       if (!parameter) {
-        problem = "unknown option " + arg;
+        problem = UnknownOption(spec, arg);
         return false;
       }
     } else {

@@ -17,6 +17,11 @@ bool ParseCommandOptions(const Fabrik::CallSpec::InputSpec& spec,
                          const std::vector<std::string>& args, Fabrik::CallSpec::Input& input,
                          std::string& problem);
 
+/// Whether \p args (the words after the command path) ask for help: "--help"
+/// anywhere, or "-h" unless \p spec (null for a namespace) has a short option
+/// "h" of its own.
+bool AsksForHelp(const std::vector<std::string>& args, const Fabrik::CallSpec::InputSpec* spec);
+
 /// Boolean words: true/false, 1/0, yes/no, on/off, in any case.
 bool ParseBoolWord(const std::string& text, bool& value);
 

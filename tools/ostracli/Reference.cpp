@@ -13,9 +13,7 @@ namespace Ostra {
 
 using namespace Fabrik;
 
-namespace {
-
-const char* TypeName(CallSpec::ParameterType type) {
+const char* ReferenceTypeName(CallSpec::ParameterType type) {
   switch (type) {
   case CallSpec::String:
     return "string";
@@ -30,6 +28,8 @@ const char* TypeName(CallSpec::ParameterType type) {
   }
   return "value";
 }
+
+namespace {
 
 /// Makes \p text safe inside a Markdown table cell.
 std::string Cell(const std::string& text) {
@@ -109,7 +109,7 @@ void Walk(const AutoCli::NamespaceNodePtr& node, std::string& out) {
             text += " (" + constraint->Describe() + ")";
           out += "| `--" + parameter->GetName() + "` | " +
                  (parameter->GetShortName().empty() ? "" : "`-" + parameter->GetShortName() + "`") +
-                 " | " + TypeName(parameter->GetType()) + " | " +
+                 " | " + ReferenceTypeName(parameter->GetType()) + " | " +
                  (parameter->IsRequired() ? "yes" : "no") + " | " + Cell(text) + " |\n";
         }
       }

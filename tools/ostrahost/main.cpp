@@ -7,12 +7,14 @@
 //   ostrahost profile NAME
 //   ostrahost generate PATH [--routes N] [--portgroups N] [--vms N]
 //                           [--ports-per-vm N] [--neighbours N] [--hosts-entries N]
+//   ostrahost --help | --version | --man
 //
 // The host defaults to $OSTRACLI_HOST, else the default host of ostracli.
 //
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
+#include "Usage.h"
 #include "model/HostDescription.h"
 #include "model/JsonRead.h"
 #include "model/Store.h"
@@ -31,28 +33,6 @@
 
 namespace {
 
-const char* const kUsage =
-    "Usage:\n"
-    "  ostrahost init PATH [--profile demo|empty]   create a host state file\n"
-    "  ostrahost import FILE [--host PATH]          replace a host by a JSON host description\n"
-    "                  [--max-size SIZE]            (FILE - reads standard input; PATH is\n"
-    "                                               created when it does not exist; FILE may\n"
-    "                                               hold at most SIZE bytes, suffix K, M or G,\n"
-    "                                               default 256M)\n"
-    "  ostrahost export [--host PATH]               print the host as a JSON host description\n"
-    "  ostrahost profile NAME                       print a built-in profile (demo, empty)\n"
-    "  ostrahost generate PATH [SIZES]              create a large host: the demo host grown to\n"
-    "                                               SIZES, all optional:\n"
-    "      --routes N          IPv4 routes on defaultTcpipStack (default 10000)\n"
-    "      --portgroups N      port groups over the standard switches (default 4000)\n"
-    "      --vms N             VMs over the standard switches (default 1000)\n"
-    "      --ports-per-vm N    ports of each VM (default 4); all VM ports must fit\n"
-    "                          the 4608 ports of the standard switches\n"
-    "      --neighbours N      IPv4 neighbours of tvk0 (default 0)\n"
-    "      --hosts-entries N   hosts entries (default 0)\n"
-    "\n"
-    "The host is --host, else $OSTRACLI_HOST, else the default host of ostracli.\n";
-
 int Fail(const std::string& message) {
   std::fprintf(stderr, "ostrahost: %s\n", message.c_str());
   return 1;
@@ -66,7 +46,7 @@ int Write(const std::string& text) {
 }
 
 int Usage(const std::string& message) {
-  std::fprintf(stderr, "ostrahost: %s\n%s", message.c_str(), kUsage);
+  std::fprintf(stderr, "ostrahost: %s\nsee ostrahost --help\n", message.c_str());
   return 2;
 }
 
@@ -210,9 +190,16 @@ void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) 
 
 int main(int argc, char** argv) {
   std::vector<std::string> args(argv + 1, argv + argc);
-  if (args.empty() || args[0] == "--help" || args[0] == "-h") {
-    std::fputs(kUsage, args.empty() ? stderr : stdout);
-    return args.empty() ? 2 : 0;
+  if (args.empty())
+    return Usage("no command given");
+  if (args[0] == "--help" || args[0] == "-h" || args[0] == "--version" || args[0] == "--man") {
+    std::string text = OstraHost::UsageText();
+    if (args[0] == "--version")
+      text = std::string("ostrahost ") + OstraHost::Version() + "\n";
+    else if (args[0] == "--man")
+      text = OstraHost::ManualPage();
+    std::fwrite(text.data(), 1, text.size(), stdout);
+    return 0;
   }
   std::string command = args[0];
   std::vector<std::string> positional;

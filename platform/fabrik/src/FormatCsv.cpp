@@ -18,8 +18,9 @@ using MetaObj::MetaStruct;
 
 namespace {
 
-/// The end of every record.
-constexpr const char* LineEnd = "\r\n";
+/// The end of every record: a line feed, so that a shell reading a cell with
+/// $(...) gets no carriage return.
+constexpr const char* LineEnd = "\n";
 
 /// Writes one record. A field holding a comma, a double quote, a carriage
 /// return or a line feed is quoted, its quotes doubled; so is a record's only

@@ -89,11 +89,8 @@ void TableFormatter::Write(std::ostream& out, const MetaObjectPtr& root,
   // The rows, and the structure that names the columns.
   std::vector<const MetaStruct*> rows;
   const MetaStruct* shape = nullptr;
-  if (root && root->GetType() == MetaObj::Struct) {
-    shape = static_cast<const MetaStruct*>(root.get());
-    rows.push_back(shape);
-  } else if (root && root->GetType() == MetaObj::List &&
-             !IsPlainList(static_cast<const MetaList&>(*root))) {
+  if (root && root->GetType() == MetaObj::List &&
+      !IsPlainList(static_cast<const MetaList&>(*root))) {
     const auto& list = static_cast<const MetaList&>(*root);
     for (const MetaObjectPtr& item : list.GetItems()) {
       if (item && item->GetType() == MetaObj::Struct)

@@ -110,6 +110,30 @@ nlohmann::ordered_json Encode(const SelfTestState& in);
 nlohmann::ordered_json Encode(const DcbState& in);
 nlohmann::ordered_json Encode(const HostCtl::Network::PnicHwCapabilities& in);
 
+/// A ring of the ring record and its name in messages.
+struct RingSlot {
+  const char* name;                                   ///< "RX", "RX mini", ...
+  uint32_t HostCtl::Network::PnicRingParams::*member; ///< Field.
+  bool required; ///< A NIC that has this ring holds at least one entry in it.
+};
+/// The rings, in record order.
+extern const std::array<RingSlot, 4> kRingSlots;
+
+// The host's rules for the state a record may be in, which the operations
+// that change a record keep and import checks: the problem with the record of
+// NIC \p nic, or "" when it keeps them.
+
+/// Counts and delays at most 0x7fffffff; adaptive coalescing with a sample
+/// interval of 1 to 3600; the low packet rate below the high one when both
+/// are set.
+std::string CoalesceProblem(const std::string& nic, const HostCtl::Network::PnicCoalesceParams& p);
+/// No ring above its maximum, no size for a ring the NIC lacks, and RX and TX
+/// rings that the NIC has hold at least one entry.
+std::string RingProblem(const std::string& nic, const RingState& state);
+/// Queue counts from 1 to the NIC's limit (0 without queues), and only
+/// supported load-balancer settings allowed.
+std::string NetqueueProblem(const std::string& nic, const NetqueueState& state);
+
 /// Whether the host has a physical NIC named \p nic.
 bool NicHwPnicExists(Store& store, const std::string& nic);
 

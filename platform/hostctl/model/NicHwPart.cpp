@@ -489,6 +489,103 @@ ordered_json Encode(const PnicHwCapabilities& in) {
   return {{"supported", CapNames(in.supported)}, {"activated", CapNames(in.activated)}};
 }
 
+// --- The host's rules.
+
+const std::array<RingSlot, 4> kRingSlots = {{
+    {"RX", &PnicRingParams::rx, true},
+    {"RX mini", &PnicRingParams::rxMini, false},
+    {"RX jumbo", &PnicRingParams::rxJumbo, false},
+    {"TX", &PnicRingParams::tx, true},
+}};
+
+namespace {
+
+/// A count or delay of the coalescing record and its name in messages.
+struct CoalesceSlot {
+  const char* name;                     ///< Name in messages.
+  uint32_t PnicCoalesceParams::*member; ///< Field.
+};
+
+constexpr CoalesceSlot kCoalesceSlots[] = {
+    {"statistics interval", &PnicCoalesceParams::statsBlockUsecs},
+    {"sample interval", &PnicCoalesceParams::sampleInterval},
+    {"low packet rate", &PnicCoalesceParams::pktRateLow},
+    {"high packet rate", &PnicCoalesceParams::pktRateHigh},
+    {"RX microseconds", &PnicCoalesceParams::rxUsecs},
+    {"RX maximum frames", &PnicCoalesceParams::rxMaxFrames},
+    {"RX microseconds during an interrupt", &PnicCoalesceParams::rxUsecsIrq},
+    {"RX maximum frames during an interrupt", &PnicCoalesceParams::rxMaxFramesIrq},
+    {"TX microseconds", &PnicCoalesceParams::txUsecs},
+    {"TX maximum frames", &PnicCoalesceParams::txMaxFrames},
+    {"TX microseconds during an interrupt", &PnicCoalesceParams::txUsecsIrq},
+    {"TX maximum frames during an interrupt", &PnicCoalesceParams::txMaxFramesIrq},
+    {"low-rate RX delay time", &PnicCoalesceParams::rxUsecsLow},
+    {"low-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesLow},
+    {"low-rate TX delay time", &PnicCoalesceParams::txUsecsLow},
+    {"low-rate TX delay packets", &PnicCoalesceParams::txMaxFramesLow},
+    {"high-rate RX delay time", &PnicCoalesceParams::rxUsecsHigh},
+    {"high-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesHigh},
+    {"high-rate TX delay time", &PnicCoalesceParams::txUsecsHigh},
+    {"high-rate TX delay packets", &PnicCoalesceParams::txMaxFramesHigh},
+};
+
+/// The largest coalescing count or delay a driver takes. Larger values are
+/// what a negative number becomes in the record's 32 bits, and no hardware
+/// delays an interrupt for weeks.
+constexpr uint32_t kMaxCoalesceValue = 0x7fffffff;
+
+std::string QueueCountProblem(const std::string& nic, const char* direction, uint32_t count,
+                              uint32_t max) {
+  if (max != 0 && (count < 1 || count > max))
+    return "The " + std::string(direction) + " netqueue count of " + nic +
+           " must be between 1 and " + std::to_string(max) + ", not " + std::to_string(count);
+  return "";
+}
+
+} // namespace
+
+std::string CoalesceProblem(const std::string& nic, const PnicCoalesceParams& p) {
+  for (const CoalesceSlot& slot : kCoalesceSlots)
+    if (p.*slot.member > kMaxCoalesceValue)
+      return "The coalescing " + std::string(slot.name) + " of " + nic + " must be at most " +
+             std::to_string(kMaxCoalesceValue) + ", not " + std::to_string(p.*slot.member);
+  if ((p.adaptiveRx || p.adaptiveTx) && (p.sampleInterval < 1 || p.sampleInterval > 3600))
+    return "Adaptive coalescing on " + nic + " needs a sample interval of 1 to 3600 seconds, not " +
+           std::to_string(p.sampleInterval);
+  if (p.pktRateLow != 0 && p.pktRateHigh != 0 && p.pktRateLow >= p.pktRateHigh)
+    return "The low packet rate of " + nic + " (" + std::to_string(p.pktRateLow) +
+           " pps) must be below its high packet rate (" + std::to_string(p.pktRateHigh) + " pps)";
+  return "";
+}
+
+std::string RingProblem(const std::string& nic, const RingState& state) {
+  for (const RingSlot& slot : kRingSlots) {
+    uint32_t size = state.current.*slot.member;
+    uint32_t max = state.maximums.*slot.member;
+    if (max == 0 && size != 0)
+      return nic + " has no " + slot.name + " ring; its size must be 0, not " +
+             std::to_string(size);
+    if (size > max)
+      return "The " + std::string(slot.name) + " ring of " + nic + " takes at most " +
+             std::to_string(max) + " entries, not " + std::to_string(size);
+    if (slot.required && max != 0 && size == 0)
+      return "The " + std::string(slot.name) + " ring of " + nic + " needs at least one entry";
+  }
+  return "";
+}
+
+std::string NetqueueProblem(const std::string& nic, const NetqueueState& state) {
+  const PnicNetqueueInfo& info = state.info;
+  std::string problem = QueueCountProblem(nic, "TX", info.txQueueCount, state.maxTxQueues);
+  if (problem.empty())
+    problem = QueueCountProblem(nic, "RX", info.rxQueueCount, state.maxRxQueues);
+  for (std::size_t i = 0; problem.empty() && i < kNetqueueSettingCount; ++i)
+    if (info.settingAllowed[i] && !info.settingSupported[i])
+      problem = nic + " does not support the NetQueue load balancer setting " +
+                kNetqueueSettingNames[i] + ", so it cannot be allowed";
+  return problem;
+}
+
 // --- Store access.
 
 bool NicHwPnicExists(Store& store, const std::string& nic) {
@@ -531,18 +628,36 @@ CREATE TABLE pnic_hw(
 ) WITHOUT ROWID;
 )sql";
 
-/// Checks a record of one kind and gives its canonical JSON.
+/// The host's rules for a record of a kind that has some (see NicHwModel.h).
+template <typename Record> std::string StateProblem(const std::string&, const Record&) {
+  return "";
+}
+template <> std::string StateProblem(const std::string& nic, const PnicCoalesceParams& record) {
+  return CoalesceProblem(nic, record);
+}
+template <> std::string StateProblem(const std::string& nic, const RingState& record) {
+  return RingProblem(nic, record);
+}
+template <> std::string StateProblem(const std::string& nic, const NetqueueState& record) {
+  return NetqueueProblem(nic, record);
+}
+
+/// Checks a record of one kind of NIC \p nic, as stored and against the
+/// host's rules, and gives its canonical JSON.
 template <typename Record>
-ordered_json Normalise(const ordered_json& json, const std::string& path) {
+ordered_json Normalise(const ordered_json& json, const std::string& path, const std::string& nic) {
   Record record{};
   Decode(json, path, record);
+  if (std::string problem = StateProblem(nic, record); !problem.empty())
+    throw ImportError(path + ": " + problem);
   return Encode(record);
 }
 
 /// One kind of hardware record: its host-description key and its codec.
 struct RecordKind {
-  const char* key;                                                    ///< Key inside a NIC.
-  ordered_json (*normalise)(const ordered_json&, const std::string&); ///< Check and canonicalise.
+  const char* key; ///< Key inside a NIC.
+  ordered_json (*normalise)(const ordered_json&, const std::string&,
+                            const std::string&); ///< Check and canonicalise.
 };
 
 constexpr RecordKind kRecordKinds[] = {
@@ -566,7 +681,8 @@ void ImportNicHw(const ordered_json& host, Store& store) {
       auto it = nic.Json().find(kind.key);
       if (it == nic.Json().end())
         continue;
-      SaveNicHwRecord(store, name, kind.key, kind.normalise(*it, nic.Path() + "." + kind.key));
+      SaveNicHwRecord(store, name, kind.key,
+                      kind.normalise(*it, nic.Path() + "." + kind.key, name));
     }
   }
 }

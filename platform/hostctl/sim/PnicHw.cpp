@@ -104,70 +104,6 @@ constexpr OffloadFlag kOffloadFlags[] = {
 constexpr uint8_t kOffloadMaskAll =
     OffloadRxChecksum | OffloadTxChecksum | OffloadScatterGather | OffloadTso;
 
-/// A ring of the ring record.
-struct RingSlot {
-  const char* name;                 ///< Name in messages.
-  uint32_t PnicRingParams::*member; ///< Field.
-  bool required;                    ///< A NIC that has this ring cannot run without it.
-};
-
-constexpr RingSlot kRingSlots[] = {
-    {"RX", &PnicRingParams::rx, true},
-    {"RX mini", &PnicRingParams::rxMini, false},
-    {"RX jumbo", &PnicRingParams::rxJumbo, false},
-    {"TX", &PnicRingParams::tx, true},
-};
-
-/// A count or delay of the coalescing record and its name in messages.
-struct CoalesceSlot {
-  const char* name;                     ///< Name in messages.
-  uint32_t PnicCoalesceParams::*member; ///< Field.
-};
-
-constexpr CoalesceSlot kCoalesceSlots[] = {
-    {"statistics interval", &PnicCoalesceParams::statsBlockUsecs},
-    {"sample interval", &PnicCoalesceParams::sampleInterval},
-    {"low packet rate", &PnicCoalesceParams::pktRateLow},
-    {"high packet rate", &PnicCoalesceParams::pktRateHigh},
-    {"RX microseconds", &PnicCoalesceParams::rxUsecs},
-    {"RX maximum frames", &PnicCoalesceParams::rxMaxFrames},
-    {"RX microseconds during an interrupt", &PnicCoalesceParams::rxUsecsIrq},
-    {"RX maximum frames during an interrupt", &PnicCoalesceParams::rxMaxFramesIrq},
-    {"TX microseconds", &PnicCoalesceParams::txUsecs},
-    {"TX maximum frames", &PnicCoalesceParams::txMaxFrames},
-    {"TX microseconds during an interrupt", &PnicCoalesceParams::txUsecsIrq},
-    {"TX maximum frames during an interrupt", &PnicCoalesceParams::txMaxFramesIrq},
-    {"low-rate RX delay time", &PnicCoalesceParams::rxUsecsLow},
-    {"low-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesLow},
-    {"low-rate TX delay time", &PnicCoalesceParams::txUsecsLow},
-    {"low-rate TX delay packets", &PnicCoalesceParams::txMaxFramesLow},
-    {"high-rate RX delay time", &PnicCoalesceParams::rxUsecsHigh},
-    {"high-rate RX delay packets", &PnicCoalesceParams::rxMaxFramesHigh},
-    {"high-rate TX delay time", &PnicCoalesceParams::txUsecsHigh},
-    {"high-rate TX delay packets", &PnicCoalesceParams::txMaxFramesHigh},
-};
-
-/// The largest coalescing count or delay a driver takes. Larger values are
-/// what a negative number becomes in the record's 32 bits, and no hardware
-/// delays an interrupt for weeks.
-constexpr uint32_t kMaxCoalesceValue = 0x7fffffff;
-
-/// Checks a coalescing record the way a driver does.
-void CheckCoalesce(const std::string& nic, const PnicCoalesceParams& p) {
-  for (const CoalesceSlot& slot : kCoalesceSlots)
-    if (p.*slot.member > kMaxCoalesceValue)
-      throw HostCtlException(StrPrintf("The coalescing %s of %s must be at most %u, not %u",
-                                       slot.name, nic.c_str(), kMaxCoalesceValue, p.*slot.member));
-  if ((p.adaptiveRx || p.adaptiveTx) && (p.sampleInterval < 1 || p.sampleInterval > 3600))
-    throw HostCtlException(StrPrintf("Adaptive coalescing on %s needs a sample interval of 1 to "
-                                     "3600 seconds, not %u",
-                                     nic.c_str(), p.sampleInterval));
-  if (p.pktRateLow != 0 && p.pktRateHigh != 0 && p.pktRateLow >= p.pktRateHigh)
-    throw HostCtlException(StrPrintf("The low packet rate of %s (%u pps) must be below its high "
-                                     "packet rate (%u pps)",
-                                     nic.c_str(), p.pktRateLow, p.pktRateHigh));
-}
-
 /// Checks a NetQueue count against the NIC's limit.
 void CheckQueueCount(const std::string& nic, const char* direction, uint32_t count, uint32_t max) {
   if (max == 0)
@@ -237,11 +173,13 @@ void PnicImpl::GetCoalesceParams(PnicCoalesceParams& params) const {
 }
 
 void PnicImpl::SetCoalesceParams(const PnicCoalesceParams& params) {
-  ChangeRecord<PnicCoalesceParams>("SetCoalesceParams", GetName(), "coalesce",
-                                   [&](PnicCoalesceParams& stored) {
-                                     CheckCoalesce(GetName(), params);
-                                     stored = params;
-                                   });
+  ChangeRecord<PnicCoalesceParams>(
+      "SetCoalesceParams", GetName(), "coalesce", [&](PnicCoalesceParams& stored) {
+        std::string problem = Model::CoalesceProblem(GetName(), params);
+        if (!problem.empty())
+          throw HostCtlException(problem);
+        stored = params;
+      });
 }
 
 // --- Rings.
@@ -255,22 +193,22 @@ void PnicImpl::GetRingParams(PnicRingParams& maximums, PnicRingParams& current) 
 void PnicImpl::SetRingParams(const PnicRingParams& params) {
   const std::string nic = GetName();
   ChangeRecord<Model::RingState>("SetRingParams", nic, "ring", [&](Model::RingState& state) {
-    for (const RingSlot& slot : kRingSlots) {
+    // A size of 0 leaves that ring as it is, so one ring can be resized alone.
+    for (const Model::RingSlot& slot : Model::kRingSlots) {
       uint32_t size = params.*slot.member;
       uint32_t max = state.maximums.*slot.member;
-      if (max == 0 && size != 0)
-        throw HostCtlException(StrPrintf("%s has no %s ring; its size must be 0, not %u",
-                                         nic.c_str(), slot.name, size));
+      if (size == 0)
+        continue;
+      if (max == 0)
+        throw HostCtlException(
+            StrPrintf("%s has no %s ring; its size cannot be set", nic.c_str(), slot.name));
       if (size > max)
         throw HostCtlException(StrPrintf("The %s ring of %s takes at most %u entries, not %u",
                                          slot.name, nic.c_str(), max, size));
-      if (slot.required && max != 0 && size == 0)
-        throw HostCtlException(StrPrintf("The %s ring of %s is required; its size cannot be 0",
-                                         slot.name, nic.c_str()));
     }
-    PnicRingParams current = params;
-    current.flags = 0;
-    state.current = current;
+    for (const Model::RingSlot& slot : Model::kRingSlots)
+      if (params.*slot.member != 0)
+        state.current.*slot.member = params.*slot.member;
   });
 }
 

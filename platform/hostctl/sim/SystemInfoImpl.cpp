@@ -72,8 +72,15 @@ void SystemInfoImpl::SetFirewallDefaultAction(bool pass) {
 
 void SystemInfoImpl::LoadFirewallRulesets() {
   // The simulated firewall applies ruleset changes at once; loading the
-  // configuration puts the filters (back) in place.
-  WriteState("LoadFirewallRulesets", "UPDATE fw_state SET filters_active = ? WHERE id = 1", true);
+  // configuration puts the filters (back) in place. Without the module there
+  // is nothing to load it into: the module reads the configuration when it is
+  // loaded, so this changes nothing then.
+  Store& store = Store::Host();
+  store.CheckFault("LoadFirewallRulesets", FirewallModuleName);
+  store.Write([&] {
+    if (Model::IsFirewallModuleLoaded(store))
+      store.Prepare("UPDATE fw_state SET filters_active = 1 WHERE id = 1").Run();
+  });
 }
 
 void SystemInfoImpl::DestroyFirewallFilters() {

@@ -504,6 +504,9 @@ void VirtualSwitchInfoImpl::RemoveVirtualSwitch(const std::string& name) {
     if (data->kind != PortsetKind::Standard)
       throw HostCtlException("Unable to remove virtual switch " + name +
                              ": it is not a standard virtual switch");
+    if (data->system)
+      throw HostCtlException("Unable to remove virtual switch " + name +
+                             ": it is a system switch, which the host keeps");
     Statement clients = store.Prepare(
         "SELECT client_kind, client FROM port WHERE portset_id = ? AND client_kind != 'uplink' "
         "ORDER BY client_kind, client");

@@ -77,8 +77,8 @@
 //
 // "table"
 // -------
-// A list of structures at the root prints one row per element; a single
-// structure is a table of one row; anything else is printed as by "simple".
+// A list of structures at the root prints one row per element; anything else,
+// a single structure included, is printed as by "simple".
 // The columns are the shown fields (above); with no selection, the fields of
 // the list's element template, or else of its first row. A line of column
 // names and a line of dashes as wide as each column come first, then the rows.
@@ -169,8 +169,9 @@
 //
 // "csv"
 // -----
-// Comma-separated values as RFC 4180 describes them, in UTF-8: every record
-// ends with CR LF; a field holding a comma, a double quote, a CR or a LF is
+// Comma-separated values as RFC 4180 describes them, in UTF-8, except that
+// every record ends with LF alone, as text lines do for the shell and the
+// tools that read it; a field holding a comma, a double quote, a CR or a LF is
 // enclosed in double quotes, with each double quote in it doubled; line
 // breaks inside a quoted field stay as they are. A record whose only field is
 // empty is written "" so that it does not read as a blank line.
