@@ -256,7 +256,10 @@ int main(int argc, char** argv) {
         return Usage("init takes one PATH");
       if (Exists(positional[0]))
         return Fail("the file " + positional[0] + " exists already");
-      WriteHost(positional[0], Model::Profile(profile));
+      // Always a new file: another init may make the same path meanwhile,
+      // and its host must not be replaced (WriteHost would import into it).
+      nlohmann::ordered_json host = Model::Profile(profile);
+      CreateHost(positional[0], [&](Model::Store& store) { Model::ImportHost(store, host); });
       return 0;
     }
     if (command == "generate") {
