@@ -155,8 +155,8 @@ for entry in "${faults[@]}"; do
     missed=$((missed + 1))
     survivors+=("$id: $description")
   else
-    failing=$(grep -E "^\s+[0-9]+ - " "$log/$id.suite" | sed -E 's/^\s+[0-9]+ - //; s/ \(.*//' |
-      head -3 | paste -sd, -)
+    failing=$(sed -n '/tests FAILED:/,$p' "$log/$id.suite" | grep -E "^\s+[0-9]+ - " |
+      sed -E 's/^\s+[0-9]+ - //; s/ \(.*//' | head -3 | paste -sd, -)
     verdict="caught ($failing)"
     caught=$((caught + 1))
   fi
