@@ -151,6 +151,15 @@ for _path in ("remove", "switch get", "switch add", "switch remove", "affinity g
               "affinity set"):
     EDGE_SETUP[("network ens lcore " + _path, "lcore-id")] = ["network ens lcore add -l 15"]
 
+# (command, parameter) -> (template, probes): a number inside a text value
+# ({} in the template) whose range the command or the host checks; each probe
+# is a number outside it that is refused by a message stating the range.
+TEXT_RANGES = {
+    ("network ip interface ipv6 address add", "ipv6"): ("2001:db8:30::21/{}", [0]),
+}
+UNSTATED[("network ip interface ipv6 address add", "ipv6", "high")] = \
+    "a prefix above 128 does not parse as an IPv6 network: \"Invalid format for IPv6 address\""
+
 # (command, parameter) -> options added to each edge run.
 EDGE_ARGS = {
     ("network ip ipsec sp add", "source-port"): ["--upper-layer-protocol", "tcp"],
@@ -202,6 +211,7 @@ class Probe:
         self.rest = without(base_args(command), parameter) + EDGE_ARGS.get(self.key, [])
         self.setup = bad_input.SETUP.get(self.path, []) + \
             [line.split() for line in EDGE_SETUP.get(self.key, [])]
+        self.template = TEXT_RANGES.get(self.key, ("{}", []))[0]
         self.log = []
 
     def run(self, value):
@@ -211,7 +221,8 @@ class Probe:
             status, _, err = self.tools.run(db, line)
             if status != 0:
                 raise RuntimeError(f"setup {' '.join(line)} failed: {err.decode()[:200]}")
-        status, _, err = self.tools.run(db, self.rest + ["--" + self.name, str(value)])
+        status, _, err = self.tools.run(db, self.rest + ["--" + self.name,
+                                                         self.template.format(value)])
         message = err.decode(errors="replace").strip()
         self.log.append(f"{value}: {status} {message[:160]}".replace("\n", " | "))
         return status, message, db
@@ -264,7 +275,18 @@ def find_range(probe, constraint):
     beyond that side must state (None: no message states it), found lists the
     ranges met."""
     where = f"{probe.path} --{probe.name}"
-    if constraint:
+    if probe.key in TEXT_RANGES:
+        low, high = -FAR, FAR
+        for value in TEXT_RANGES[probe.key][1]:
+            status, message, _ = probe.run(value)
+            inner = stated_range(message)
+            if status == 0 or inner is None or None in inner:
+                return low, high, {}, [], [f"{where}: {value} is not refused by a message "
+                                           f"stating a range ({status}): {message}"]
+            low, high = max(low, inner[0]), min(high, inner[1])
+        stated = {"low": low, "high": high}
+        found = [f"text [{low} - {high}]"]
+    elif constraint:
         low, high = constraint["min"], constraint["max"]
         stated = {"low": low, "high": high}  # the command host's own message
         found = [f"spec [{low} - {high}]"]
@@ -272,7 +294,7 @@ def find_range(probe, constraint):
         low, high = -FAR, FAR
         stated = {"low": None, "high": None}
         found = []
-    bounded = {"low": constraint is not None, "high": constraint is not None}
+    bounded = {"low": bool(found), "high": bool(found)}
     for _ in range(8):
         narrowed = False
         for side, value in (("low", low), ("high", high)):
@@ -306,9 +328,10 @@ def find_range(probe, constraint):
 
 
 def check_parameter(tools, command, parameter):
-    """(faults, ranges found, log) of one integer parameter."""
+    """(faults, ranges found, log) of one integer parameter, or of the number
+    inside a text parameter of TEXT_RANGES."""
     probe = Probe(tools, command, parameter)
-    constraint = parameter.get("constraint")
+    constraint = parameter.get("constraint") if probe.key not in TEXT_RANGES else None
     if constraint and constraint["type"] != 1:
         return [], [], []  # an enumeration: bad_input.py tries a value outside it
     if probe.key in UNBOUNDED:
@@ -356,7 +379,8 @@ def main():
     with tempfile.TemporaryDirectory() as tmp:
         tools = Tools(options.ostracli, options.ostrahost, tmp)
         commands = list_commands(tools, options.filters, options.jobs)
-        jobs = [(c, p) for c in commands for p in c["parameters"] if p["type"] == "long"]
+        jobs = [(c, p) for c in commands for p in c["parameters"]
+                if p["type"] == "long" or (c["path"], p["name"]) in TEXT_RANGES]
         with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool:
             results = list(pool.map(lambda job: check_parameter(tools, *job), jobs))
     faults = []
@@ -370,7 +394,7 @@ def main():
             print("  " + "\n  ".join(log))
     for fault in faults:
         print("FAULT " + fault)
-    print(f"{len(jobs)} integer parameters, {checked} with a range; "
+    print(f"{len(jobs)} integer parameters and numbers in text, {checked} with a range; "
           f"{len(faults)} faults; {time.monotonic() - started:.1f} s")
     failed = len({fault.split(":")[0] for fault in faults})
     print(f"edge values: {len(jobs) - failed} passed, {failed} failed")

@@ -35,7 +35,7 @@ ordered_json ReadDescription() {
 /// The objects of collection \p collection ("" the document, "a.b" the
 /// objects of array b inside the objects of array a).
 std::vector<const ordered_json*> Collection(const ordered_json& host,
-                                           const std::string& collection) {
+                                            const std::string& collection) {
   std::vector<const ordered_json*> objects = {&host};
   std::stringstream names(collection);
   for (std::string name; std::getline(names, name, '.');) {
