@@ -56,8 +56,8 @@ RANGE_TEXTS = (
 # (command, parameter) -> (argv that reads the value back, the path to it in
 # its JSON output): words select a field, "k=v" the element of a list whose
 # field k is v ({value} stands for the value given), and a one-element list
-# is entered by any field name. UNCHANGED_BY lists the values that leave the
-# setting as it was.
+# is entered by any field name; a third element maps values to the text shown
+# for them. UNCHANGED_BY lists the values that leave the setting as it was.
 READBACK = {
     ("network nic set", "message-level"):
         ("network nic get -n vmnic0", ["Current Message Level"]),
@@ -86,6 +86,16 @@ READBACK = {
         ("network nic coalesce get -n vmnic0", ["RX microseconds"]),
     ("network nic coalesce set", "tx-max-frames"):
         ("network nic coalesce get -n vmnic0", ["TX Maximum frames"]),
+    ("network nic coalesce set", "rx-max-frames"):
+        ("network nic coalesce get -n vmnic0", ["RX maximum frames"]),
+    ("network nic coalesce set", "tx-usecs"):
+        ("network nic coalesce get -n vmnic0", ["TX microseconds"]),
+    ("network nic queue count set", "num"):
+        ("network nic queue count get", ["NIC=vmnic2", "Tx netqueue count"]),
+    ("network ip ipsec sp add", "source-port"):
+        ("network ip ipsec sp list", ["Name=sp-plain", "Source Port"]),
+    ("network ip ipsec sp add", "destination-port"):
+        ("network ip ipsec sp list", ["Name=sp-plain", "Destination Port"]),
     ("network nic ring current set", "rx"): ("network nic ring current get -n vmnic0", ["RX"]),
     ("network nic ring current set", "tx"): ("network nic ring current get -n vmnic0", ["TX"]),
 }
@@ -165,6 +175,17 @@ EDGE_ARGS = {
     ("network ip ipsec sp add", "source-port"): ["--upper-layer-protocol", "tcp"],
     ("network ip ipsec sp add", "destination-port"): ["--upper-layer-protocol", "tcp"],
 }
+for _level in ("low", "high"):
+    for _name, _field in (("pkt-rate", "Packet rate"), ("rx-usecs", "RX delay time"),
+                          ("rx-max-frames", "RX delay packets"), ("tx-usecs", "TX delay time"),
+                          ("tx-max-frames", "TX delay packets")):
+        READBACK[(f"network nic coalesce {_level} set", _name)] = (
+            f"network nic coalesce {_level} get -n vmnic0", [_field])
+# Offload switches read back as on and off.
+for _family, _field in (("cso", "RX Checksum Offload"), ("tso", "Value"), ("sg", "Value")):
+    READBACK[(f"network nic {_family} set", "enable")] = (
+        f"network nic {_family} get -n vmnic0", [_field], {0: "off", 1: "on"})
+
 # Shaping rates are read only while shaping is enabled, which needs all three;
 # the peak rate is the largest there is, since the average must not exceed it.
 SHAPING = ("avg-bandwidth", "peak-bandwidth", "burst-size")
@@ -229,7 +250,7 @@ class Probe:
 
     def read_back(self, db, value):
         """The value as the command of READBACK shows it, as text."""
-        argv, fields = READBACK[self.key]
+        argv, fields = READBACK[self.key][:2]
         status, out, err = self.tools.run(db, ["--formatter", "json"] + shlex.split(argv))
         if status != 0:
             raise RuntimeError(f"{argv} failed: {err.decode()[:200]}")
@@ -352,7 +373,8 @@ def check_parameter(tools, command, parameter):
                 shown = probe.read_back(db, value)
             except (RuntimeError, LookupError, StopIteration, TypeError, ValueError) as error:
                 shown = f"nothing ({error!r})"
-            if shown != str(value):
+            wanted = READBACK[probe.key][2].get(value) if len(READBACK[probe.key]) > 2 else None
+            if shown != (wanted or str(value)):
                 faults.append(f"{where}: {value} was taken but reads back as {shown}")
     # The first values outside are refused by a message stating the bound.
     for side, value in (("low", low - 1), ("high", high + 1)):
@@ -384,6 +406,14 @@ def main():
         with concurrent.futures.ThreadPoolExecutor(options.jobs) as pool:
             results = list(pool.map(lambda job: check_parameter(tools, *job), jobs))
     faults = []
+    if not options.filters:
+        # An entry for a parameter that no longer exists would silently stop
+        # checking anything.
+        known = {(c["path"], p["name"]) for c in commands for p in c["parameters"]}
+        for table in (READBACK, UNBOUNDED, EDGE_REFUSED, EDGE_SETUP, EDGE_ARGS, TEXT_RANGES,
+                      UNSTATED, UNCHANGED_BY):
+            faults += [f"{' '.join(map(str, key))}: a table entry for no parameter of the tree"
+                       for key in table if tuple(key[:2]) not in known]
     checked = 0
     for (command, parameter), (found, ranges, log) in zip(jobs, results):
         faults += found
