@@ -270,12 +270,21 @@ def parse_args():
     return parser.parse_args()
 
 
-def as_nobody():
-    """The prefix that runs a command as user nobody, or None."""
-    setpriv = shutil.which("setpriv")
-    if setpriv is None:
-        return None
-    return [setpriv, "--reuid=65534", "--regid=65534", "--clear-groups"]
+NOBODY = []
+
+
+def as_nobody(tools):
+    """The prefix that runs a command as user nobody, or None when there is
+    none or nobody cannot run the built tools (a build tree others may not
+    enter)."""
+    if not NOBODY:
+        setpriv = shutil.which("setpriv")
+        prefix = [setpriv, "--reuid=65534", "--regid=65534", "--clear-groups"] if setpriv else None
+        if prefix and any(subprocess.run(prefix + [tool, "--version"], capture_output=True)
+                          .returncode != 0 for tool in tools.values()):
+            prefix = None
+        NOBODY.append(prefix)
+    return NOBODY[0]
 
 
 class Locker(threading.Thread):
@@ -336,18 +345,18 @@ def needs_nobody(settings):
         settings.get("batch") == "unreadable"
 
 
-def skip_reason(settings):
+def skip_reason(tools, settings):
     if settings.get("root") and os.geteuid() != 0:
         return "needs root"
-    if needs_nobody(settings) and os.geteuid() == 0 and as_nobody() is None:
-        return "root reads every file and setpriv is missing"
+    if needs_nobody(settings) and os.geteuid() == 0 and as_nobody(tools) is None:
+        return "root reads every file, and nobody cannot run the tools through setpriv"
     return None
 
 
 def run_row(tools, row, show):
     """A failure report, "skip: why", or None."""
     tool, args, status, err, settings = row
-    reason = skip_reason(settings)
+    reason = skip_reason(tools, settings)
     if reason:
         return "skip: " + reason
     with tempfile.TemporaryDirectory(prefix="ostra-exit-") as tmp:
@@ -362,7 +371,7 @@ def run_row(tools, row, show):
         env.update({key: fill(value) for key, value in settings.get("env", {}).items()})
         argv = [tools[tool]] + [fill(word) for word in shlex.split(args)]
         if needs_nobody(settings) and os.geteuid() == 0:
-            argv = as_nobody() + argv
+            argv = as_nobody(tools) + argv
         locker = None
         if settings.get("host") in ("locked", "committing"):
             locker = Locker(f"{tmp}/host.db", settings["host"] == "committing")
