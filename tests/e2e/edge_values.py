@@ -8,23 +8,24 @@ each command runs from the same base invocation on a fresh demo host.
 An integer parameter's range is where its values are taken. It starts as the
 range of its parameter spec, or unbounded without one, and is narrowed by
 each check of the command or the host that refuses an edge and states its
-own range in the message ("[MIN - MAX]", "(MIN - MAX)", "MIN to MAX"): the
-check's range is read from the message, built from the very table the check
-uses, and must lie inside the range it narrows. Once neither edge is refused
-with a range, the range is checked:
+own range in the message ("[MIN - MAX]", "(MIN - MAX)", "MIN to MAX",
+"between MIN and MAX", "at most MAX"): the check's range is read from the
+message, which the check builds from its own table (IntFit rows, the host's
+limits), so no bound is restated here. The range found is the overlap of
+them all, each side bound by the check that narrowed it. Then:
 
     low, high       the lowest and the highest value are taken (status 0);
                     where READBACK names a command that reads the value back,
                     it shows the value given
     low-1, high+1   the first value outside on each side is refused (status 1
-                    or 2) by a message that states exactly this range, so a
-                    message and its check agree
+                    or 2) by a message stating that side's bound, so a check
+                    and its message agree
 
 An unbounded side (no spec range, no check) is probed with +-2^62, which must
 be refused: a parameter that takes any 64-bit value is listed in UNBOUNDED
-with the reason. Edges that need a host prepared first, or that a check
-refuses without stating a range, are listed in EDGE_SETUP and UNSTATED, each
-with its reason.
+with the reason. Numbers inside text values (a prefix length) are listed in
+TEXT_RANGES. Edges the demo host cannot take as they are have their reason
+in EDGE_SETUP, EDGE_ARGS, EDGE_REFUSED, UNSTATED or UNCHANGED_BY.
 
     edge_values.py OSTRACLI OSTRAHOST [--jobs N] [--verbose] [FILTER...]
 """
