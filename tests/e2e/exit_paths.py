@@ -288,7 +288,8 @@ def as_nobody(tools):
 
 
 class Locker(threading.Thread):
-    """Holds the write lock of a host until released."""
+    """Holds the write lock of a host (exclusive: the lock a commit takes,
+    which readers wait for too) until released."""
 
     def __init__(self, path, exclusive):
         super().__init__(daemon=True)
@@ -307,7 +308,7 @@ class Locker(threading.Thread):
 
 
 def prepare(tools, directory, settings):
-    """Makes the files of a row; returns why it is skipped, or None."""
+    """Makes the files of a row in directory."""
     host = settings.get("host")
     path = directory / "host.db"
     if host in ("demo", "unreadable", "readonly", "locked", "committing"):
@@ -336,7 +337,6 @@ def prepare(tools, directory, settings):
         path.chmod(0o444)
     if batch == "unreadable":
         (directory / "batch").chmod(0)
-    return None
 
 
 def needs_nobody(settings):
