@@ -61,7 +61,8 @@ exclude='^(reliability-concurrency|reliability-crash)$'
 
 # The faults as "id<TAB>file<TAB>description" lines; the texts are read by
 # apply() from the list itself.
-mapfile -t faults < <(awk '/^@ /{id=$2; $1=$2=""; d=substr($0,3)} /^file: /{print id "\t" $2 "\t" d}' "$list")
+mapfile -t faults < <(awk '/^@ /{id=$2; $1=$2=""; d=substr($0,3)}
+  /^file: /{print id "\t" $2 "\t" d}' "$list")
 
 # apply ID: applies fault ID to the scratch tree; 0 applied, 3 not found.
 apply() {
