@@ -21,7 +21,7 @@ them all, each side bound by the check that narrowed it. Then:
                     or 2) by a message stating that side's bound, so a check
                     and its message agree
 
-An unbounded side (no spec range, no check) is probed with +-2^62, which must
+An unbounded side (no declared range, no check) is probed with +-2^62, which must
 be refused: a parameter that takes any 64-bit value is listed in UNBOUNDED
 with the reason. Numbers inside text values (a prefix length) are listed in
 TEXT_RANGES. Edges the demo host cannot take as they are have their reason
@@ -311,7 +311,7 @@ def find_range(probe, constraint):
     elif constraint:
         low, high = constraint["min"], constraint["max"]
         stated = {"low": low, "high": high}  # the command host's own message
-        found = [f"spec [{low} - {high}]"]
+        found = [f"declared [{low} - {high}]"]
     else:
         low, high = -FAR, FAR
         stated = {"low": None, "high": None}
