@@ -147,10 +147,10 @@ PATHS = [
      ["Error: --batch takes its commands from the file, not from the command line"],
      {"host": "demo", "batch": "network nic list\n"}),
     ("ostracli", "--host {dir}/host.db --batch {dir}/batch", 1,
-     ["ostracli: There is no host state at {dir}/host.db (create one with "
-      "\"ostrahost init {dir}/host.db\")"], {"batch": "network nic down -n vmnic1\n"}),
+     ["ostracli: no host state at {dir}/host.db (create one with: ostrahost init "
+      "{dir}/host.db)"], {"batch": "network nic down -n vmnic1\n"}),
     ("ostracli", "--host {dir}/host.db --batch {dir}/batch", 1,
-     ["ostracli: Cannot open the host state at {dir}/host.db: unable to open database file"],
+     ["ostracli: {dir}/host.db is a directory, not a host state"],
      {"host": "dir", "batch": "network nic down -n vmnic1\n"}),
     ("ostracli", "--host {dir}/host.db --batch {dir}/batch", 1,
      ["ostracli: The file {dir}/host.db is not a host state database"],

@@ -101,7 +101,18 @@ std::string HostStateText() {
   return host.path + (host.isDefault ? " (created from the demo profile on first use)" : "");
 }
 
-/// The refusal of a host state that is missing or unreadable, or "".
+/// Reads a lock timeout in milliseconds; -1 when \p text is not one.
+int ParseTimeout(const std::string& text) {
+  if (text.empty() || text.size() > 7 || text.find_first_not_of("0123456789") != std::string::npos)
+    return -1;
+  return std::stoi(text);
+}
+
+/// Values echoed in messages are cut to this many characters.
+constexpr std::size_t kEchoLimit = 64;
+
+} // namespace
+
 std::string HostProblem() {
   const HostChoice& host = Chosen();
   if (!host.problem.empty())
@@ -119,18 +130,6 @@ std::string HostProblem() {
            "\n";
   return "";
 }
-
-/// Reads a lock timeout in milliseconds; -1 when \p text is not one.
-int ParseTimeout(const std::string& text) {
-  if (text.empty() || text.size() > 7 || text.find_first_not_of("0123456789") != std::string::npos)
-    return -1;
-  return std::stoi(text);
-}
-
-/// Values echoed in messages are cut to this many characters.
-constexpr std::size_t kEchoLimit = 64;
-
-} // namespace
 
 void SelectHost(const std::string& path, bool isDefault) {
   Chosen() = {path, isDefault, ""};
