@@ -8,8 +8,10 @@
 #pragma once
 
 #include "Fabrik/Call.h"
+#include "HostCtl/Network/NetworkInfo.h"
 #include "HostCtl/Network/PortsetGetType.h"
 
+#include <memory>
 #include <string>
 
 namespace CorvexCli::NetworkNamespace {
@@ -41,6 +43,12 @@ inline bool ReadListType(const Fabrik::CallSpec::Input& input, Fabrik::CallSpec:
   }
   selector = HostCtl::Network::PortsetGetSystem;
   return true;
+}
+
+/// The kernel-interface service of the session's host, made by the factory so
+/// that the command works on whichever host backend the session chose.
+inline std::unique_ptr<HostCtl::Network::TvKernelNicInfo> KernelNicService() {
+  return HostCtl::Network::NetworkFactory::GetNetworkInfo()->GetTvKernelNicInfo();
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -361,14 +361,24 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     node = next;
   }
 
-  const bool machine = global.formatter == "json";
+  // Help is text unless a formatter is asked for; then it is a typed value
+  // that formatter prints.
+  auto printHelp = [&](const MetaObj::MetaObjectPtr& help) {
+    AppendBuffer buffer(out);
+    std::ostream text(&buffer);
+    Format::MakeFormatter(global.formatter)->Write(text, help, Format::Parameters());
+  };
+  const bool typedHelp = !global.formatter.empty();
   if (node->GetType() == AutoCli::NamespaceKind) {
     if (!rest.empty() && !global.help && !AsksForHelp(rest, nullptr)) {
       err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
              " --help\" lists the commands\n";
       return ExitUsage;
     }
-    out += machine ? NamespaceHelpJson(*node) : NamespaceHelpText(*node, HostStateText());
+    if (typedHelp)
+      printHelp(NamespaceHelpValue(*node));
+    else
+      out += NamespaceHelpText(*node, HostStateText());
     return ExitOk;
   }
 
@@ -388,7 +398,10 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     return ExitCommandError;
   }
   if (global.help || AsksForHelp(rest, inputSpec.get())) {
-    out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
+    if (typedHelp)
+      printHelp(CommandHelpValue(*command, *inputSpec));
+    else
+      out += CommandHelpText(*command, *inputSpec);
     return ExitOk;
   }
 
