@@ -55,10 +55,6 @@ extern const std::string kFieldAverageBandwidth;
 extern const std::string kFieldPeakBandwidth;
 extern const std::string kFieldBurstSize;
 
-/// Appends one parameter per entry of \p table, in order.
-void AddParameterTable(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec,
-                       const std::vector<ParameterDef>& table);
-
 /// Appends load-balancing, failure-detection, notify-switches, failback,
 /// active-uplinks and standby-uplinks.
 void AddFailoverParameters(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec);

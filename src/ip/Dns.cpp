@@ -33,8 +33,8 @@ namespace {
 const std::string kDnsServers = "DNS Servers";
 const std::string kDnsSearchDomains = "DNS Search Domains";
 
-const ParamDef kNetstackParam = {"netstack", Fabrik::CallSpec::String, "N", false,
-                                 kNetstackDescription};
+const ParameterDef kNetstackParam = {"netstack", "N", Fabrik::CallSpec::String, false,
+                                     kNetstackDescription};
 
 /// The server address the user typed, IPv4 tried first; nothing (with the
 /// error added) when neither family accepts it.
@@ -80,7 +80,7 @@ std::shared_ptr<InputSpec> IpDNSServerList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<MetaStruct> IpDNSServerList::GetOutputStructure() {
-  return MakeStructure("NameServerList", {{kDnsServers.c_str(), Fabrik::MetaObj::List}});
+  return MakeStructure("NameServerList", {{kDnsServers, FieldKind::StringList}});
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerList::GetOutputSpecInternal() {
@@ -115,7 +115,7 @@ IpDNSServerAdd::~IpDNSServerAdd() = default;
 
 std::shared_ptr<InputSpec> IpDNSServerAdd::GetInputSpecInternal() {
   return MakeInputSpec(
-      {{"server", Fabrik::CallSpec::String, "s", true,
+      {{"server", "s", Fabrik::CallSpec::String, true,
         "The IP address (v4 or v6) of the DNS server to add to the DNS server list."},
        kNetstackParam});
 }
@@ -146,8 +146,8 @@ IpDNSServerRemove::IpDNSServerRemove() {
 IpDNSServerRemove::~IpDNSServerRemove() = default;
 
 std::shared_ptr<InputSpec> IpDNSServerRemove::GetInputSpecInternal() {
-  return MakeInputSpec({{"all", Fabrik::CallSpec::Flag, "a", false, " "},
-                        {"server", Fabrik::CallSpec::String, "s", false, " "},
+  return MakeInputSpec({{"all", "a", Fabrik::CallSpec::Flag, false, " "},
+                        {"server", "s", Fabrik::CallSpec::String, false, " "},
                         kNetstackParam});
 }
 
@@ -187,7 +187,7 @@ IpDNSSearchAdd::IpDNSSearchAdd() {
 IpDNSSearchAdd::~IpDNSSearchAdd() = default;
 
 std::shared_ptr<InputSpec> IpDNSSearchAdd::GetInputSpecInternal() {
-  return MakeInputSpec({{"domain", Fabrik::CallSpec::String, "d", true,
+  return MakeInputSpec({{"domain", "d", Fabrik::CallSpec::String, true,
                          "The string name of a domain to add to the list of search domains."},
                         kNetstackParam});
 }
@@ -216,7 +216,7 @@ IpDNSSearchRemove::IpDNSSearchRemove() {
 IpDNSSearchRemove::~IpDNSSearchRemove() = default;
 
 std::shared_ptr<InputSpec> IpDNSSearchRemove::GetInputSpecInternal() {
-  return MakeInputSpec({{"domain", Fabrik::CallSpec::String, "d", true,
+  return MakeInputSpec({{"domain", "d", Fabrik::CallSpec::String, true,
                          "The string name of a domain to remove from the list of search domains."},
                         kNetstackParam});
 }
@@ -250,7 +250,7 @@ std::shared_ptr<InputSpec> IpDNSSearchList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<MetaStruct> IpDNSSearchList::GetOutputStructure() {
-  return MakeStructure("DNSSearchList", {{kDnsSearchDomains.c_str(), Fabrik::MetaObj::List}});
+  return MakeStructure("DNSSearchList", {{kDnsSearchDomains, FieldKind::StringList}});
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchList::GetOutputSpecInternal() {

@@ -9,6 +9,8 @@
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
 #include "ip/IpCommon.h"
 
 #include <initializer_list>
@@ -16,59 +18,6 @@
 #include <string>
 
 namespace CorvexCli::NetworkNamespace {
-
-/// One parameter of a command.
-struct ParamRow {
-  const char* name;                     ///< Long name.
-  const char* shortName;                ///< One letter, or "" for none.
-  Fabrik::CallSpec::ParameterType type; ///< Value type.
-  bool required;                        ///< Must be given.
-  const char* description;              ///< Help text.
-};
-
-/// An input specification with \p rows in order.
-inline std::shared_ptr<Fabrik::CallSpec::InputSpec>
-MakeInputSpec(std::initializer_list<ParamRow> rows) {
-  auto spec = Fabrik::CallSpec::InputSpec::New();
-  for (const ParamRow& row : rows) {
-    auto parameter = Fabrik::CallSpec::ParameterSpec::New(row.name, row.type);
-    if (*row.shortName)
-      parameter->SetShortName(row.shortName);
-    parameter->SetDescription(row.description);
-    parameter->SetRequired(row.required);
-    spec->AddParameter(parameter);
-  }
-  return spec;
-}
-
-/// Kind of a result field.
-enum class FieldKind { String, Int, Bool };
-
-/// One field of a result structure.
-struct FieldRow {
-  const std::string& name; ///< Field name.
-  FieldKind kind;          ///< Value type.
-};
-
-/// A result structure \p name with \p rows in order, each field empty.
-inline std::shared_ptr<Fabrik::MetaObj::MetaStruct>
-MakeStructure(const std::string& name, std::initializer_list<FieldRow> rows) {
-  auto structure = Fabrik::MetaObj::MetaStruct::New(name);
-  for (const FieldRow& row : rows) {
-    switch (row.kind) {
-    case FieldKind::String:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaString::New());
-      break;
-    case FieldKind::Int:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaInt::New());
-      break;
-    case FieldKind::Bool:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaBool::New());
-      break;
-    }
-  }
-  return structure;
-}
 
 /// An output specification whose root is a boolean (action commands).
 inline std::shared_ptr<Fabrik::CallSpec::OutputSpec> MakeBoolOutputSpec() {

@@ -1,14 +1,16 @@
-//===- ParamTable.h - Parameters and result fields declared from tables ---===//
+//===- ParamTable.h - Result fields of the IP services declared as tables --===//
 //
-// The IP service families declare each command's parameters and each result
-// structure's fields as a table; these helpers turn a table into the input
-// specification or the structure template.
+// The IP service families declare each result structure's fields as a table;
+// these helpers turn a table into the structure template. Their parameters
+// are tables of ParameterDef (common/ParameterTable.h).
 //
 //===----------------------------------------------------------------------===//
 #pragma once
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
 #include "ip/IpCommon.h"
 
 #include <memory>
@@ -16,66 +18,6 @@
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace {
-
-/// One parameter of a command.
-struct ParamDef {
-  const char* name;                         ///< Long name.
-  Fabrik::CallSpec::ParameterType type;     ///< Value type.
-  const char* shortName;                    ///< One letter.
-  bool required;                            ///< Must be given.
-  std::string description;                  ///< Help text.
-  std::vector<const char*> enumValues = {}; ///< String enumeration, if any.
-};
-
-/// One field of a result structure.
-struct FieldDef {
-  const char* name;               ///< Field name.
-  Fabrik::MetaObj::MetaType type; ///< Boolean, Integer, String, or List (of strings).
-};
-
-/// The input specification holding \p params in order.
-inline std::shared_ptr<Fabrik::CallSpec::InputSpec>
-MakeInputSpec(const std::vector<ParamDef>& params) {
-  auto spec = Fabrik::CallSpec::InputSpec::New();
-  for (const ParamDef& def : params) {
-    auto param = Fabrik::CallSpec::ParameterSpec::New(def.name, def.type);
-    param->SetShortName(def.shortName);
-    param->SetDescription(def.description);
-    param->SetRequired(def.required);
-    if (!def.enumValues.empty()) {
-      auto constraint = Fabrik::CallSpec::ParameterConstraint::New(Fabrik::CallSpec::StringEnum);
-      for (const char* value : def.enumValues)
-        constraint->AddStringEnum(value);
-      param->SetConstraint(constraint);
-    }
-    spec->AddParameter(param);
-  }
-  return spec;
-}
-
-/// A structure template named \p name with \p fields in order.
-inline std::shared_ptr<Fabrik::MetaObj::MetaStruct>
-MakeStructure(const char* name, const std::vector<FieldDef>& fields) {
-  using namespace Fabrik::MetaObj;
-  auto structure = MetaStruct::New(name);
-  for (const FieldDef& field : fields) {
-    switch (field.type) {
-    case Boolean:
-      structure->SetField(field.name, MetaBool::New());
-      break;
-    case Integer:
-      structure->SetField(field.name, MetaInt::New());
-      break;
-    case List:
-      structure->SetField(field.name, MetaList::New(String));
-      break;
-    default:
-      structure->SetField(field.name, MetaString::New());
-      break;
-    }
-  }
-  return structure;
-}
 
 /// An output specification whose result is \p root.
 inline std::shared_ptr<Fabrik::CallSpec::OutputSpec>

@@ -118,16 +118,16 @@ template <typename Family> std::shared_ptr<InputSpec> ChangeInputSpec(bool add) 
       add ? "The " + word + " address of the gateway through which a route to be added."
           : "The " + word + " address of the gateway through which a route to be removed";
   return MakeInputSpec({
-      {"network", Fabrik::CallSpec::String, "n", true, networkText},
-      {"gateway", Fabrik::CallSpec::String, "g", true, gatewayText},
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
+      {"network", "n", Fabrik::CallSpec::String, true, networkText},
+      {"gateway", "g", Fabrik::CallSpec::String, true, gatewayText},
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
   });
 }
 
 template <typename Family> std::shared_ptr<InputSpec> ListInputSpec() {
   return MakeInputSpec({
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
-      {"type", Fabrik::CallSpec::String, "t", false,
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
+      {"type", "t", Fabrik::CallSpec::String, false,
        std::string("List ") + Family::kUpperWord + " routes with given type(e.g. system)."},
   });
 }
@@ -276,11 +276,11 @@ std::shared_ptr<InputSpec> IpRouteIpv4List::GetInputSpecInternal() {
 
 std::shared_ptr<MetaStruct> IpRouteIpv4List::GetOutputStructure() {
   using Fabrik::MetaObj::String;
-  return MakeStructure("Ipv4Route", {{kNetwork.c_str(), String},
-                                     {kNetmask.c_str(), String},
-                                     {kGateway.c_str(), String},
-                                     {kInterface.c_str(), String},
-                                     {kSource.c_str(), String}});
+  return MakeStructure("Ipv4Route", {{kNetwork, FieldKind::String},
+                                     {kNetmask, FieldKind::String},
+                                     {kGateway, FieldKind::String},
+                                     {kInterface, FieldKind::String},
+                                     {kSource, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
@@ -357,10 +357,10 @@ std::shared_ptr<InputSpec> IpRouteIpv6List::GetInputSpecInternal() {
 
 std::shared_ptr<MetaStruct> IpRouteIpv6List::GetOutputStructure() {
   using Fabrik::MetaObj::String;
-  return MakeStructure("Ipv6Route", {{kNetwork.c_str(), String},
-                                     {kNetmask.c_str(), String},
-                                     {kGateway.c_str(), String},
-                                     {kInterface.c_str(), String}});
+  return MakeStructure("Ipv6Route", {{kNetwork, FieldKind::String},
+                                     {kNetmask, FieldKind::String},
+                                     {kGateway, FieldKind::String},
+                                     {kInterface, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {

@@ -14,6 +14,7 @@
 #include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/PnicImpl.h"
+#include "common/ParameterTable.h"
 
 #include <vector>
 
@@ -35,38 +36,22 @@ const std::string kBranchField = "Branch";
 const std::string kBranchMac = "Branch MAC";
 const std::string kVlanIdField = "VLAN ID";
 
-/// One parameter of the attachment commands.
-struct AttachmentParameter {
-  const std::string* name; ///< Long name.
-  const char* shortName;   ///< Short name.
-  bool required;           ///< Must be given.
-  const char* description; ///< Help text.
+const ParameterDef kAddParameters[] = {
+    {kTrunk, "t", CallSpec::String, true, "The name of the NIC to be configured as trunk uplink."},
+    {kBranch, "b", CallSpec::String, true, "The name of the NIC to be attached as branch uplink."},
+    // A branch takes a VLAN ID strictly between the bounds a port group admits.
+    {kVlanId, "v", CallSpec::Integer, true,
+     "The vlan ID for the branch uplink. Valid values: %ENUM%",
+     ParameterCheck::Range(HostCtl::Network::PortGroup::MIN_VLAN_ID + 1,
+                           HostCtl::Network::PortGroup::MAX_VLAN_ID - 1)},
 };
-
-const AttachmentParameter kAddParameters[] = {
-    {&kTrunk, "t", true, "The name of the NIC to be configured as trunk uplink."},
-    {&kBranch, "b", true, "The name of the NIC to be attached as branch uplink."},
+const ParameterDef kListParameters[] = {
+    {kTrunk, "t", CallSpec::String, false, "Show information only for the specified NIC."},
 };
-const AttachmentParameter kListParameters[] = {
-    {&kTrunk, "t", false, "Show information only for the specified NIC."},
+const ParameterDef kRemoveParameters[] = {
+    {kTrunk, "t", CallSpec::String, true, "The name of the trunk uplink."},
+    {kBranch, "b", CallSpec::String, true, "The name of the branch uplink."},
 };
-const AttachmentParameter kRemoveParameters[] = {
-    {&kTrunk, "t", true, "The name of the trunk uplink."},
-    {&kBranch, "b", true, "The name of the branch uplink."},
-};
-
-template <std::size_t N>
-std::shared_ptr<CallSpec::InputSpec> StringParameters(const AttachmentParameter (&rows)[N]) {
-  auto spec = CallSpec::InputSpec::New();
-  for (const AttachmentParameter& row : rows) {
-    auto parameter = CallSpec::ParameterSpec::New(*row.name, CallSpec::String);
-    parameter->SetShortName(row.shortName);
-    parameter->SetDescription(row.description);
-    parameter->SetRequired(row.required);
-    spec->AddParameter(parameter);
-  }
-  return spec;
-}
 
 std::shared_ptr<CallSpec::OutputSpec> BooleanResult() {
   auto spec = CallSpec::OutputSpec::New();
@@ -87,18 +72,7 @@ NicAttachmentAdd::NicAttachmentAdd() {
 NicAttachmentAdd::~NicAttachmentAdd() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentAdd::GetInputSpecInternal() {
-  auto spec = StringParameters(kAddParameters);
-  auto vlanId = CallSpec::ParameterSpec::New(kVlanId, CallSpec::Integer);
-  vlanId->SetShortName("v");
-  vlanId->SetDescription("The vlan ID for the branch uplink. Valid values: %ENUM%");
-  vlanId->SetRequired(true);
-  auto range = CallSpec::ParameterConstraint::New(CallSpec::IntRange);
-  // A branch takes a VLAN ID strictly between the bounds a port group admits.
-  range->SetIntRange(HostCtl::Network::PortGroup::MIN_VLAN_ID + 1,
-                     HostCtl::Network::PortGroup::MAX_VLAN_ID - 1);
-  vlanId->SetConstraint(range);
-  spec->AddParameter(vlanId);
-  return spec;
+  return MakeInputSpec(kAddParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentAdd::GetOutputSpecInternal() {
@@ -156,7 +130,7 @@ std::shared_ptr<MetaObj::MetaStruct> NicAttachmentList::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentList::GetInputSpecInternal() {
-  return StringParameters(kListParameters);
+  return MakeInputSpec(kListParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentList::GetOutputSpecInternal() {
@@ -215,7 +189,7 @@ NicAttachmentRemove::NicAttachmentRemove() {
 NicAttachmentRemove::~NicAttachmentRemove() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentRemove::GetInputSpecInternal() {
-  return StringParameters(kRemoveParameters);
+  return MakeInputSpec(kRemoveParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentRemove::GetOutputSpecInternal() {

@@ -35,7 +35,6 @@ using HostCtl::Network::NetworkInfo;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicNetqueueInfo;
 using HostCtl::Network::PnicNetqueuePluginInfo;
-using NicHw::Param;
 
 namespace {
 
@@ -94,7 +93,7 @@ const std::string kRSSLRO = "RSSLRO";
 /// One load-balancer setting, in record order (its index is its mask bit).
 struct LbSetting {
   const std::string& column; ///< Column of the settings list.
-  Param param;               ///< Parameter of the settings set.
+  ParameterDef param;        ///< Parameter of the settings set.
   bool supportShown;         ///< The list shows S/U; otherwise N.
 };
 
@@ -141,33 +140,33 @@ const LbSetting kLbSettings[kNetqueueSettingCount] = {
 const std::string* const kFilterClassFields[kNetqueueFilterClassCount] = {
     &kMacOnly, &kVlanOnly, &kVlanMac, &kVxlan, &kGeneve, &kGenericEncap};
 
-const Param kCountGetParams[] = {
+const ParameterDef kCountGetParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue count"}};
 
-const Param kCountSetParams[] = {
+const ParameterDef kCountSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to set netqueue count."},
     {kTx, "t", kBoolean, false, "Tx netqueue to set count."},
     {kRx, "r", kBoolean, false, "Rx netqueue to set count."},
     {kNum, "q", kInteger, true, "Number of queues to set."},
 };
 
-const Param kLbSetVmnic = {kVmnic, "n", kString, true,
-                           "Name of vmnic to update netqueue load balancer setting."};
+const ParameterDef kLbSetVmnic = {kVmnic, "n", kString, true,
+                                  "Name of vmnic to update netqueue load balancer setting."};
 
-const Param kPluginListParams[] = {
+const ParameterDef kPluginListParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue plugin details"}};
 
-const Param kPluginSetParams[] = {
+const ParameterDef kPluginSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to change netqueue balancer plugin state"},
     {kEnable, "e", kBoolean, true, "Netqueue balancer plugin state"},
     {kModule, "m", kString, true, "Name of netqueue balancer module"},
     {kPlugin, "p", kString, true, "Name of netqueue balancer plugin"},
 };
 
-const Param kStateListParams[] = {
+const ParameterDef kStateListParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue balancer state"}};
 
-const Param kStateSetParams[] = {
+const ParameterDef kStateSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to change netqueue balancer state"},
     {kEnable, "e", kBoolean, true, "Netqueue balancer state"},
 };
@@ -307,7 +306,7 @@ NicQueueCountGet::NicQueueCountGet() {
 NicQueueCountGet::~NicQueueCountGet() = default;
 
 std::shared_ptr<InputSpec> NicQueueCountGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCountGetParams);
+  return MakeInputSpec(kCountGetParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueCountGet::GetOutputStructure() {
@@ -345,7 +344,7 @@ NicQueueCountSet::NicQueueCountSet() {
 NicQueueCountSet::~NicQueueCountSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueCountSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCountSetParams);
+  return MakeInputSpec(kCountSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueCountSet::GetOutputSpecInternal() {
@@ -462,9 +461,9 @@ NicQueueLbSettingSet::NicQueueLbSettingSet() {
 NicQueueLbSettingSet::~NicQueueLbSettingSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbSettingSet::GetInputSpecInternal() {
-  auto spec = NicHw::InputSpecOf({&kLbSetVmnic, 1});
+  auto spec = MakeInputSpec({&kLbSetVmnic, 1});
   for (const LbSetting& setting : kLbSettings)
-    NicHw::AddParams(*spec, {&setting.param, 1});
+    AddParameters(*spec, {&setting.param, 1});
   return spec;
 }
 
@@ -476,7 +475,7 @@ void NicQueueLbSettingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                            const std::shared_ptr<Output>& output) {
   SetNetqueue(*input, *output, NicHw::PnicNotFound, [&](PnicNetqueueInfo& record) {
     for (std::size_t i = 0; i < kNetqueueSettingCount; ++i) {
-      const std::string& param = kLbSettings[i].param.name;
+      const std::string param(kLbSettings[i].param.name.View());
       if (!input->HasParameter(param))
         continue;
       record.settingAllowed[i] = input->GetParameterBool(param);
@@ -500,7 +499,7 @@ NicQueueLbStateList::NicQueueLbStateList() {
 NicQueueLbStateList::~NicQueueLbStateList() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbStateList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kStateListParams);
+  return MakeInputSpec(kStateListParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueLbStateList::GetOutputStructure() {
@@ -536,7 +535,7 @@ NicQueueLbStateSet::NicQueueLbStateSet() {
 NicQueueLbStateSet::~NicQueueLbStateSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbStateSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kStateSetParams);
+  return MakeInputSpec(kStateSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbStateSet::GetOutputSpecInternal() {
@@ -569,7 +568,7 @@ NicQueueLbPluginList::NicQueueLbPluginList() {
 NicQueueLbPluginList::~NicQueueLbPluginList() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbPluginList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPluginListParams);
+  return MakeInputSpec(kPluginListParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueLbPluginList::GetOutputStructure() {
@@ -619,7 +618,7 @@ NicQueueLbPluginSet::NicQueueLbPluginSet() {
 NicQueueLbPluginSet::~NicQueueLbPluginSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbPluginSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPluginSetParams);
+  return MakeInputSpec(kPluginSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbPluginSet::GetOutputSpecInternal() {

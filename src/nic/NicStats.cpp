@@ -14,6 +14,7 @@
 #include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/PnicImpl.h"
 #include "TvkCtl/Network/Switching.h"
+#include "common/ParameterTable.h"
 
 #include <algorithm>
 
@@ -68,13 +69,10 @@ const NicCounter kNicCounters[] = {
     {"Transmit window errors", &PnicStats::txWindowErrors},
 };
 
-std::shared_ptr<CallSpec::ParameterSpec> NicNameParameter() {
-  auto parameter = CallSpec::ParameterSpec::New(kNicName, CallSpec::String);
-  parameter->SetShortName("n");
-  parameter->SetDescription(kNicNameDescription);
-  parameter->SetRequired(true);
-  return parameter;
-}
+/// The one parameter of the commands that read one NIC's counters.
+const ParameterDef kNicNameParameters[] = {
+    {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+};
 
 /// The first switch, in the host's order, that has \p nic as an uplink.
 std::unique_ptr<HostCtl::Network::Portset>
@@ -116,9 +114,7 @@ std::shared_ptr<MetaObj::MetaStruct> NicStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicStatsGet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicStatsGet::GetOutputSpecInternal() {
@@ -167,9 +163,7 @@ std::shared_ptr<MetaObj::MetaStruct> NicVlanStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicVlanStatsGet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsGet::GetOutputSpecInternal() {
@@ -217,14 +211,10 @@ NicVlanStatsSet::NicVlanStatsSet() {
 NicVlanStatsSet::~NicVlanStatsSet() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicVlanStatsSet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  auto enabled = CallSpec::ParameterSpec::New(kEnabled, CallSpec::Boolean);
-  enabled->SetShortName("e");
-  enabled->SetDescription("Whether to enable or disable VLAN statistics");
-  enabled->SetRequired(true);
-  spec->AddParameter(enabled);
-  return spec;
+  return MakeInputSpec({
+      {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+      {kEnabled, "e", CallSpec::Boolean, true, "Whether to enable or disable VLAN statistics"},
+  });
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsSet::GetOutputSpecInternal() {

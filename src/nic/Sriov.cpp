@@ -14,6 +14,7 @@
 #include "HostCtl/Network/Sriov.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "common/IntFit.h"
+#include "common/ParameterTable.h"
 
 #include <cstdlib>
 
@@ -90,15 +91,6 @@ std::string VfCounterFields() {
   for (const VfCounter& counter : kVfCounters)
     fields += (fields.empty() ? "" : ",") + std::string(counter.field);
   return fields;
-}
-
-std::shared_ptr<CallSpec::ParameterSpec>
-StringParameter(const std::string& name, const char* shortName, const char* description) {
-  auto parameter = CallSpec::ParameterSpec::New(name, CallSpec::String);
-  parameter->SetShortName(shortName);
-  parameter->SetDescription(description);
-  parameter->SetRequired(true);
-  return parameter;
 }
 
 } // namespace
@@ -202,11 +194,9 @@ std::shared_ptr<MetaObj::MetaStruct> VfList::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> VfList::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(StringParameter(kNicName, "n",
-                                     "The name of the SRIOV NIC to configured. This must be one "
-                                     "of the cards listed in the sriovNic list command."));
-  return spec;
+  return MakeInputSpec({{kNicName, "n", CallSpec::String, true,
+                         "The name of the SRIOV NIC to configured. This must be one of the cards "
+                         "listed in the sriovNic list command."}});
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfList::GetOutputSpecInternal() {
@@ -262,17 +252,14 @@ std::shared_ptr<MetaObj::MetaStruct> VfStats::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> VfStats::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(StringParameter(kNicName, "n",
-                                     "The name of the SRIOV NIC. This must be one of the cards "
-                                     "listed in the sriovNic list command."));
-  auto vfId = CallSpec::ParameterSpec::New(kVfId, CallSpec::Integer);
-  vfId->SetShortName("v");
-  vfId->SetDescription("The VF ID of the virtual function whose stats are to be collected. This "
-                       "must be one of the VF IDs listed in the sriovnic vf list command.");
-  vfId->SetRequired(true);
-  spec->AddParameter(vfId);
-  return spec;
+  return MakeInputSpec({
+      {kNicName, "n", CallSpec::String, true,
+       "The name of the SRIOV NIC. This must be one of the cards listed in the sriovNic list "
+       "command."},
+      {kVfId, "v", CallSpec::Integer, true,
+       "The VF ID of the virtual function whose stats are to be collected. This must be one of "
+       "the VF IDs listed in the sriovnic vf list command."},
+  });
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfStats::GetOutputSpecInternal() {

@@ -75,8 +75,8 @@ VirtualSwitchDVSCorvexList::~VirtualSwitchDVSCorvexList() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchDVSCorvexList::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamKrxName, "v", Fabrik::CallSpec::String, false,
-                            "Limit the output of this command to only kRX with the given name."}});
+  AddParameters(*spec, {{kParamKrxName, "v", Fabrik::CallSpec::String, false,
+                         "Limit the output of this command to only kRX with the given name."}});
   return spec;
 }
 

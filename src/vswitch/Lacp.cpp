@@ -128,8 +128,8 @@ template <std::size_t N> std::string FieldText(const char (&field)[N]) {
 
 std::shared_ptr<InputSpec> DvsSpec() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,
-                            "The name of DVS to get configuration on"}});
+  AddParameters(*spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,
+                         "The name of DVS to get configuration on"}});
   return spec;
 }
 
@@ -511,13 +511,14 @@ LacpSetTimeout::~LacpSetTimeout() = default;
 
 std::shared_ptr<InputSpec> LacpSetTimeout::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(
-      spec, {{kParamTimeout, "t", Fabrik::CallSpec::Boolean, true,
-              "Set long or short timeout: 1 for short timeout and 0 for long timeout."},
-             {kParamNicName, "n", Fabrik::CallSpec::String, false,
-              "The nic name. If it is set, then only this vmnic in the lag will be configured."},
-             {kParamLagId, "l", Fabrik::CallSpec::Integer, true, "The ID of LAG to be configured."},
-             {kParamKrx, "s", Fabrik::CallSpec::String, true, "The name of KRX."}});
+  AddParameters(
+      *spec,
+      {{kParamTimeout, "t", Fabrik::CallSpec::Boolean, true,
+        "Set long or short timeout: 1 for short timeout and 0 for long timeout."},
+       {kParamNicName, "n", Fabrik::CallSpec::String, false,
+        "The nic name. If it is set, then only this vmnic in the lag will be configured."},
+       {kParamLagId, "l", Fabrik::CallSpec::Integer, true, "The ID of LAG to be configured."},
+       {kParamKrx, "s", Fabrik::CallSpec::String, true, "The name of KRX."}});
   return spec;
 }
 

@@ -35,7 +35,7 @@ const std::string kNoLegacySwitch = "Unable to find a legacy virtual switch with
 
 std::shared_ptr<InputSpec> SwitchNameSpec(const char* description) {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
+  AddParameters(*spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
   return spec;
 }
 
@@ -176,8 +176,8 @@ VirtualSwitchStandardPolicySecuritySet::~VirtualSwitchStandardPolicySecuritySet(
 std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecuritySet::GetInputSpecInternal() {
   auto spec = SwitchNameSpec(
       "The name of the virtual switch to use when setting the switch security policy.");
-  AddParameterTable(
-      spec,
+  AddParameters(
+      *spec,
       {{kParamAllowPromiscuous, "p", Fabrik::CallSpec::Boolean, false,
         "Allow ports on the virtual switch to enter promiscuous mode."},
        {kParamAllowMacChange, "m", Fabrik::CallSpec::Boolean, false,
