@@ -36,4 +36,18 @@ std::shared_ptr<MetaStruct> MakeStructure(const std::string& name,
   return MakeStructure(name, std::span<const FieldDef>(table.begin(), table.size()));
 }
 
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> ResultSpec(MetaObjectPtr root) {
+  auto spec = Fabrik::CallSpec::OutputSpec::New();
+  spec->SetRootObject(std::move(root));
+  return spec;
+}
+
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolResultSpec() {
+  return ResultSpec(MetaBool::New());
+}
+
+std::shared_ptr<Fabrik::CallSpec::OutputSpec> ListResultSpec(std::shared_ptr<MetaStruct> element) {
+  return ResultSpec(MetaList::New(Struct, std::move(element)));
+}
+
 } // namespace CorvexCli::NetworkNamespace

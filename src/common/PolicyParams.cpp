@@ -486,11 +486,4 @@ std::string JoinFields(const std::vector<std::string>& fields) {
     joined += (joined.empty() ? "" : ",") + field;
   return joined;
 }
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 } // namespace CorvexCli::NetworkNamespace

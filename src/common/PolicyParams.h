@@ -15,6 +15,7 @@
 #include "Fabrik/Call.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Policy.h"
+#include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 
 #include <cstdint>
@@ -158,8 +159,5 @@ void WithPolicyHolder(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
 
 /// Joins field names with ",".
 std::string JoinFields(const std::vector<std::string>& fields);
-
-/// The output specification of a command whose result is one boolean.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolResult();
 
 } // namespace CorvexCli::NetworkNamespace

@@ -9,7 +9,9 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"
 #include "TvkCtl/Network/DnsConfigImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <optional>
 
@@ -84,7 +86,7 @@ std::shared_ptr<MetaStruct> IpDNSServerList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerList::GetOutputSpecInternal() {
-  return MakeOutputSpec(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpDNSServerList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -121,7 +123,7 @@ std::shared_ptr<InputSpec> IpDNSServerAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpDNSServerAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -152,7 +154,7 @@ std::shared_ptr<InputSpec> IpDNSServerRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpDNSServerRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -193,7 +195,7 @@ std::shared_ptr<InputSpec> IpDNSSearchAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpDNSSearchAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -222,7 +224,7 @@ std::shared_ptr<InputSpec> IpDNSSearchRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpDNSSearchRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -254,7 +256,7 @@ std::shared_ptr<MetaStruct> IpDNSSearchList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchList::GetOutputSpecInternal() {
-  return MakeOutputSpec(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpDNSSearchList::ExecuteInternal(const std::shared_ptr<Input>& input,

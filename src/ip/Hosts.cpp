@@ -8,7 +8,9 @@
 
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/HostsFile.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -61,7 +63,7 @@ std::shared_ptr<MetaStruct> IpHostsList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpHostsList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -104,7 +106,7 @@ std::shared_ptr<InputSpec> IpHostsAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpHostsAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -138,7 +140,7 @@ std::shared_ptr<InputSpec> IpHostsRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpHostsRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

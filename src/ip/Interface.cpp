@@ -290,7 +290,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -347,7 +347,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -449,7 +449,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -527,7 +527,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -1,43 +1,21 @@
 //===- ip/InterfaceCommon.h - Tables shared by the kernel interface families ===//
 //
-// The kernel interface, IPv4, IPv6, tag, netstack and multicast commands
-// declare their parameters and result fields from tables; these helpers turn
-// a table into an input specification or a result structure.
+// The kernel interface, IPv4 and IPv6 commands share the choice of the
+// interfaces a listing shows and the loop that lists them; their parameter
+// and field tables are those of common/ParameterTable.h and FieldTable.h.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "HostCtl/Network/TvkNic.h"
 #include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 #include "ip/IpCommon.h"
 
-#include <initializer_list>
 #include <memory>
 #include <string>
-
-namespace CorvexCli::NetworkNamespace {
-
-/// An output specification whose root is a boolean (action commands).
-inline std::shared_ptr<Fabrik::CallSpec::OutputSpec> MakeBoolOutputSpec() {
-  auto spec = Fabrik::CallSpec::OutputSpec::New();
-  spec->SetRootObject(Fabrik::MetaObj::MetaBool::New());
-  return spec;
-}
-
-/// An output specification whose root is a list of \p element structures.
-inline std::shared_ptr<Fabrik::CallSpec::OutputSpec>
-MakeListOutputSpec(std::shared_ptr<Fabrik::MetaObj::MetaStruct> element) {
-  auto spec = Fabrik::CallSpec::OutputSpec::New();
-  spec->SetRootObject(Fabrik::MetaObj::MetaList::New(Fabrik::MetaObj::Struct, std::move(element)));
-  return spec;
-}
-
-} // namespace CorvexCli::NetworkNamespace
-
-#include "HostCtl/Network/TvkNic.h"
-
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace {

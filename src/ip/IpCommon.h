@@ -1,8 +1,7 @@
 //===- IpCommon.h - What every IP service family reads the same way -------===//
 //
 // The netstack a command works on and the "type" selector of the listings,
-// shared by the families that declare their parameters with ParamTable.h and
-// by those that use InterfaceCommon.h.
+// shared by every IP family.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
@@ -15,6 +14,10 @@
 #include <string>
 
 namespace CorvexCli::NetworkNamespace {
+
+/// The description of the "netstack" parameter.
+inline const char* const kNetstackDescription =
+    "The network stack instance; if unspecified, use the default netstack instance";
 
 /// The netstack a command works on: the "netstack" parameter when it is given
 /// and not empty, else the default instance.

@@ -10,7 +10,9 @@
 #include "HostCtl/Misc.h"
 #include "HostCtl/Network/Address.h"
 #include "TvkCtl/Network/IpSecConfigImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <sstream>
 
@@ -160,7 +162,7 @@ std::shared_ptr<InputSpec> IpIpsecSAAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpIpsecSAAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -224,7 +226,7 @@ std::shared_ptr<InputSpec> IpIpsecSARemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSARemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpIpsecSARemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -294,7 +296,7 @@ std::shared_ptr<MetaStruct> IpIpsecSAList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpIpsecSAList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -367,7 +369,7 @@ std::shared_ptr<InputSpec> IpIpsecSPAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpIpsecSPAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -419,7 +421,7 @@ std::shared_ptr<InputSpec> IpIpsecSPRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpIpsecSPRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -475,7 +477,7 @@ std::shared_ptr<MetaStruct> IpIpsecSPList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpIpsecSPList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,

@@ -82,7 +82,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Get::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv4Get::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv4Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -148,7 +148,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Set::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv4Set::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv4Set::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

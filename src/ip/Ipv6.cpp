@@ -171,7 +171,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6Get::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6Get::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv6Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -227,7 +227,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6Set::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6Set::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6Set::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -311,7 +311,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressList::GetInputSpecInt
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv6AddressList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -375,7 +375,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressAdd::GetInputSpecInte
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6AddressAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -402,7 +402,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressRemove::GetInputSpecI
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6AddressRemove::ExecuteInternal(

@@ -11,7 +11,9 @@
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/RoutingInfoImpl.h"
 #include "TvkCtl/Resource/ResourceInfoImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <array>
 
@@ -138,7 +140,7 @@ std::shared_ptr<MetaStruct> IpNeighborList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpNeighborList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpNeighborList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -201,7 +203,7 @@ std::shared_ptr<InputSpec> IpNeighborRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpNeighborRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpNeighborRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -269,7 +271,7 @@ std::shared_ptr<MetaStruct> IpConnectionList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpConnectionList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpConnectionList::ExecuteInternal(const std::shared_ptr<Input>& input,

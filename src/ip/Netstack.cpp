@@ -81,7 +81,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceList::GetInputSpecInterna
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNetstackInstanceList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,
@@ -122,7 +122,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceAdd::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -154,7 +154,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceRemove::GetInputSpecInter
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -204,7 +204,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceGet::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceGet::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNetstackInstanceGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -281,7 +281,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceSet::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -341,9 +341,7 @@ std::shared_ptr<CallSpec::InputSpec> IpGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,
@@ -374,7 +372,7 @@ std::shared_ptr<CallSpec::InputSpec> IpSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -9,7 +9,9 @@
 
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/RoutingInfoImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -226,7 +228,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Add::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpRouteIpv4Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -249,7 +251,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Remove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpRouteIpv4Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -284,7 +286,7 @@ std::shared_ptr<MetaStruct> IpRouteIpv4List::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -307,7 +309,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Add::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpRouteIpv6Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -330,7 +332,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Remove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return ResultSpec(MetaBool::New());
 }
 
 void IpRouteIpv6Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -364,7 +366,7 @@ std::shared_ptr<MetaStruct> IpRouteIpv6List::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void IpRouteIpv6List::ExecuteInternal(const std::shared_ptr<Input>& input,

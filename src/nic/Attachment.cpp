@@ -14,6 +14,7 @@
 #include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/PnicImpl.h"
+#include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 
 #include <vector>
@@ -52,13 +53,6 @@ const ParameterDef kRemoveParameters[] = {
     {kTrunk, "t", CallSpec::String, true, "The name of the trunk uplink."},
     {kBranch, "b", CallSpec::String, true, "The name of the branch uplink."},
 };
-
-std::shared_ptr<CallSpec::OutputSpec> BooleanResult() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
-}
-
 } // namespace
 
 // network nic attachment add
@@ -76,7 +70,7 @@ std::shared_ptr<CallSpec::InputSpec> NicAttachmentAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentAdd::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicAttachmentAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -134,9 +128,7 @@ std::shared_ptr<CallSpec::InputSpec> NicAttachmentList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void NicAttachmentList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -193,7 +185,7 @@ std::shared_ptr<CallSpec::InputSpec> NicAttachmentRemove::GetInputSpecInternal()
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentRemove::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicAttachmentRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -281,7 +281,7 @@ std::shared_ptr<MetaStruct> NicCoalesceGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicCoalesceGet::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicCoalesceGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -333,7 +333,7 @@ std::shared_ptr<InputSpec> NicCoalesceSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicCoalesceSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -378,7 +378,7 @@ void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
     return RegimeStructure(Kind);                                                                  \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::OutputSpecOf(GetOutputStructure());                                              \
+    return ResultSpec(GetOutputStructure());                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \
@@ -395,7 +395,7 @@ void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
     return MakeInputSpec(Kind.setParams);                                                          \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::BoolSpec();                                                                      \
+    return BoolResultSpec();                                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

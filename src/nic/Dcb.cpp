@@ -181,7 +181,7 @@ std::shared_ptr<MetaStruct> NicDcbStatusGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicDcbStatusGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicDcbStatusGet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -161,7 +161,7 @@ std::shared_ptr<MetaStruct> NicEepromDump::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicEepromDump::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicEepromDump::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -199,7 +199,7 @@ std::shared_ptr<InputSpec> NicEepromChange::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicEepromChange::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicEepromChange::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -251,7 +251,7 @@ std::shared_ptr<MetaStruct> NicRegisterDump::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRegisterDump::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicRegisterDump::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -290,7 +290,7 @@ std::shared_ptr<MetaStruct> NicSelfTestRun::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicSelfTestRun::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicSelfTestRun::ExecuteInternal(const std::shared_ptr<Input>& input,

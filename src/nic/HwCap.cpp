@@ -117,7 +117,7 @@ std::string HwCapText(uint64_t mask, std::string (*name)(int bit)) {
     return NicHw::StringStructure(kSettingsStruct, Kind.fields);                                   \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::ListSpecOf(GetOutputStructure());                                                \
+    return ListResultSpec(GetOutputStructure());                                                   \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

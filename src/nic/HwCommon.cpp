@@ -13,20 +13,6 @@ using Fabrik::MetaObj::MetaString;
 using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Network::Pnic;
 
-std::shared_ptr<OutputSpec> OutputSpecOf(Fabrik::MetaObj::MetaObjectPtr root) {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(std::move(root));
-  return spec;
-}
-
-std::shared_ptr<OutputSpec> ListSpecOf(std::shared_ptr<MetaStruct> element) {
-  return OutputSpecOf(MetaList::New(Fabrik::MetaObj::Struct, std::move(element)));
-}
-
-std::shared_ptr<OutputSpec> BoolSpec() {
-  return OutputSpecOf(MetaBool::New());
-}
-
 std::shared_ptr<MetaStruct> StringStructure(const std::string& name,
                                             std::span<const std::string* const> fields) {
   auto structure = MetaStruct::New(name);

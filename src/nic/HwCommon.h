@@ -12,6 +12,7 @@
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 
 #include <functional>
@@ -21,16 +22,6 @@
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace::NicHw {
-
-/// An output specification whose root is \p root.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> OutputSpecOf(Fabrik::MetaObj::MetaObjectPtr root);
-
-/// An output specification whose root is a list of \p element structures.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec>
-ListSpecOf(std::shared_ptr<Fabrik::MetaObj::MetaStruct> element);
-
-/// An output specification whose root is a boolean.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolSpec();
 
 /// A structure template named \p name with one empty string field per name.
 std::shared_ptr<Fabrik::MetaObj::MetaStruct>

@@ -318,7 +318,7 @@ std::shared_ptr<MetaStruct> NicQueueCountGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueCountGet::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueCountGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -348,7 +348,7 @@ std::shared_ptr<InputSpec> NicQueueCountSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueCountSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueCountSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -394,7 +394,7 @@ std::shared_ptr<MetaStruct> NicQueueFilterClassList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueFilterClassList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueFilterClassList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -436,7 +436,7 @@ std::shared_ptr<MetaStruct> NicQueueLbSettingList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbSettingList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbSettingList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -468,7 +468,7 @@ std::shared_ptr<InputSpec> NicQueueLbSettingSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbSettingSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbSettingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -510,7 +510,7 @@ std::shared_ptr<MetaStruct> NicQueueLbStateList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbStateList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbStateList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -539,7 +539,7 @@ std::shared_ptr<InputSpec> NicQueueLbStateSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbStateSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbStateSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -582,7 +582,7 @@ std::shared_ptr<MetaStruct> NicQueueLbPluginList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbPluginList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbPluginList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -622,7 +622,7 @@ std::shared_ptr<InputSpec> NicQueueLbPluginSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbPluginSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbPluginSet::ExecuteInternal(const std::shared_ptr<Input>& input,

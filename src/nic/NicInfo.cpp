@@ -185,13 +185,6 @@ const ParameterDef kSetParameters[] = {
 const ParameterDef kNicNameParameters[] = {
     {kNicName, "n", CallSpec::String, true, kNicNameDescription},
 };
-
-std::shared_ptr<CallSpec::OutputSpec> BooleanResult() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
-}
-
 /// Looks the NIC up; adds "There is no pnic with name " and the name when it
 /// is missing.
 std::unique_ptr<HostCtl::Network::Pnic> FindPnic(TvkCtl::Network::NetworkInfoImpl& info,
@@ -270,9 +263,7 @@ std::shared_ptr<CallSpec::InputSpec> NicGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -359,7 +350,7 @@ std::shared_ptr<CallSpec::InputSpec> NicSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicSet::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, PnicInfo& info) {
@@ -490,7 +481,7 @@ std::shared_ptr<CallSpec::InputSpec> NicUp::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicUp::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicUp::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -513,7 +504,7 @@ std::shared_ptr<CallSpec::InputSpec> NicDown::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicDown::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicDown::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -537,7 +528,7 @@ std::shared_ptr<CallSpec::InputSpec> NicNegotiationRestart::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicNegotiationRestart::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicNegotiationRestart::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

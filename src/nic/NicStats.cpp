@@ -5,6 +5,7 @@
 // uplink of a virtual switch.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "nic.h"
 
 #include "Fabrik/Call.h"
@@ -118,9 +119,7 @@ std::shared_ptr<CallSpec::InputSpec> NicStatsGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicStatsGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void NicStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -167,9 +166,7 @@ std::shared_ptr<CallSpec::InputSpec> NicVlanStatsGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void NicVlanStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -218,9 +215,7 @@ std::shared_ptr<CallSpec::InputSpec> NicVlanStatsSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsSet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
+  return ResultSpec(MetaObj::MetaBool::New());
 }
 
 void NicVlanStatsSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -178,7 +178,7 @@ void OffloadSet(const OffloadKind& kind, const Input& input, Output& output) {
     return OffloadStructure(Kind);                                                                 \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::ListSpecOf(GetOutputStructure());                                                \
+    return ListResultSpec(GetOutputStructure());                                                   \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \
@@ -195,7 +195,7 @@ void OffloadSet(const OffloadKind& kind, const Input& input, Output& output) {
     return MakeInputSpec(Kind.setParams);                                                          \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::BoolSpec();                                                                      \
+    return BoolResultSpec();                                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

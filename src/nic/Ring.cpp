@@ -201,7 +201,7 @@ std::shared_ptr<MetaStruct> NicRingPresetGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRingPresetGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicRingPresetGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -230,7 +230,7 @@ std::shared_ptr<MetaStruct> NicRingCurrentGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRingCurrentGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicRingCurrentGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -253,7 +253,7 @@ std::shared_ptr<InputSpec> NicRingCurrentSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicRingCurrentSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicRingCurrentSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -303,7 +303,7 @@ std::shared_ptr<MetaStruct> NicPauseParamsList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicPauseParamsList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicPauseParamsList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -364,7 +364,7 @@ std::shared_ptr<InputSpec> NicPauseParamsSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicPauseParamsSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicPauseParamsSet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -167,7 +167,7 @@ std::shared_ptr<MetaStruct> NicSoftwareList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicSoftwareList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicSoftwareList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -219,7 +219,7 @@ std::shared_ptr<InputSpec> NicSoftwareSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> NicSoftwareSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicSoftwareSet::ExecuteInternal(const std::shared_ptr<Input>& input,

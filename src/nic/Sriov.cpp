@@ -5,6 +5,7 @@
 // virtual function.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "nic.h"
 #include "nic/NicText.h"
 
@@ -132,9 +133,7 @@ std::shared_ptr<CallSpec::InputSpec> SriovNicList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> SriovNicList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void SriovNicList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -200,9 +199,7 @@ std::shared_ptr<CallSpec::InputSpec> VfList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void VfList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -263,9 +260,7 @@ std::shared_ptr<CallSpec::InputSpec> VfStats::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfStats::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
 }
 
 void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

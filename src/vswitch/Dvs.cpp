@@ -107,9 +107,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchDVSCorvexList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchDVSCorvexList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 std::shared_ptr<MetaList>

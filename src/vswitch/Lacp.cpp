@@ -293,9 +293,7 @@ std::shared_ptr<MetaStruct> LacpGetConfig::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetConfig::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void LacpGetConfig::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -398,9 +396,7 @@ std::shared_ptr<MetaStruct> LacpGetStatus::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStatus::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void LacpGetStatus::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -461,9 +457,7 @@ std::shared_ptr<MetaStruct> LacpGetStats::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStats::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void LacpGetStats::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -523,9 +517,7 @@ std::shared_ptr<InputSpec> LacpSetTimeout::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> LacpSetTimeout::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
+  return ResultSpec(MetaBool::New());
 }
 
 void LacpSetTimeout::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -210,9 +210,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void VirtualSwitchPortGroupList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -262,7 +260,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -288,7 +286,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupRemove::GetInputSpecInternal() 
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -317,7 +315,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -361,9 +359,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyShapingGet::GetOutputStr
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicyShapingGet::ExecuteInternal(
@@ -395,7 +391,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetInputSpecI
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicyShapingSet::ExecuteInternal(
@@ -443,9 +439,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSt
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicyFailoverGet::ExecuteInternal(
@@ -481,7 +475,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetInputSpec
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicyFailoverSet::ExecuteInternal(
@@ -522,9 +516,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSt
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicySecurityGet::ExecuteInternal(
@@ -556,7 +548,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetInputSpec
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicySecuritySet::ExecuteInternal(

@@ -140,7 +140,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -190,7 +190,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -278,9 +278,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
 }
 
 void VirtualSwitchStandardList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -352,7 +350,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -393,7 +391,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardUplinkAdd::GetInputSpecInternal(
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardUplinkAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardUplinkAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -423,7 +421,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardUplinkRemove::GetInputSpecIntern
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardUplinkRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardUplinkRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -228,7 +228,7 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
                        std::string& err) {
   std::size_t i = 0;
   auto value = [&](const std::string& name, std::string& into) -> bool {
-    std::string arg = args[i];
+    const std::string& arg = args[i];
     std::size_t eq = arg.find('=');
     if (eq != std::string::npos) {
       into = arg.substr(eq + 1);
@@ -417,8 +417,8 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
   // write one for a command that changes the host, so that it either waits
   // for the lock or changes nothing at all.
   if (!mode.inBatch) {
-    if (std::string problem = HostProblem(); !problem.empty()) {
-      err += problem;
+    if (std::string hostProblem = HostProblem(); !hostProblem.empty()) {
+      err += hostProblem;
       return ExitCommandError;
     }
   }
