@@ -52,6 +52,14 @@ fi
 mapfile -t files < <(printf '%s\n' "${files[@]}" | sort -u)
 echo "tidy: checking ${#files[@]} files with the compile commands of $db/"
 # One clang-tidy per core; each prints its findings and exits non-zero on one.
-printf '%s\0' "${files[@]}" |
-  xargs -0 -n 4 -P "$(nproc)" clang-tidy -p "$db" --quiet 2>/dev/null
+# Its counts of suppressed warnings (stderr) are left out; anything else it
+# says there is shown when it fails.
+errors=$(mktemp)
+trap 'rm -f "$errors"' EXIT
+if ! printf '%s\0' "${files[@]}" |
+  xargs -0 -n 4 -P "$(nproc)" clang-tidy -p "$db" --quiet 2>"$errors"; then
+  grep -v 'warnings\? generated\.$' "$errors" >&2 || true
+  echo "tidy: findings above" >&2
+  exit 1
+fi
 echo "tidy: ${#files[@]} files clean"
