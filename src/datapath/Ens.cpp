@@ -117,7 +117,7 @@ std::shared_ptr<InputSpec> EnsMaxlcoresSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsMaxlcoresSet::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsMaxlcoresSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -142,7 +142,7 @@ std::shared_ptr<InputSpec> EnsLcoreAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -166,7 +166,7 @@ std::shared_ptr<InputSpec> EnsLcoreRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -202,7 +202,7 @@ std::shared_ptr<MetaStruct> EnsLcoreList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void EnsLcoreList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -263,7 +263,7 @@ std::shared_ptr<InputSpec> EnsLcoreSwitchAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreSwitchAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreSwitchAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -290,7 +290,7 @@ std::shared_ptr<InputSpec> EnsLcoreSwitchRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreSwitchRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreSwitchRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -343,7 +343,7 @@ std::shared_ptr<InputSpec> EnsLcoreAffinitySet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreAffinitySet::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreAffinitySet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -52,7 +52,7 @@ std::shared_ptr<CallSpec::InputSpec> MulticastGroupList::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> MulticastGroupList::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void MulticastGroupList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,

@@ -162,7 +162,7 @@ std::shared_ptr<MetaStruct> PortStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> PortStatsGet::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void PortStatsGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -233,7 +233,7 @@ std::shared_ptr<MetaStruct> PortFilterStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> PortFilterStatsGet::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void PortFilterStatsGet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -112,7 +112,7 @@ std::shared_ptr<MetaStruct> VMList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VMList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VMList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -187,7 +187,7 @@ std::shared_ptr<MetaStruct> VMPortList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VMPortList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VMPortList::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -148,7 +148,7 @@ std::shared_ptr<InputSpec> FirewallRulesetSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetSet::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void FirewallRulesetSet::ExecuteInternal(const std::shared_ptr<Input>& input,

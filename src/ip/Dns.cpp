@@ -123,7 +123,7 @@ std::shared_ptr<InputSpec> IpDNSServerAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSServerAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -154,7 +154,7 @@ std::shared_ptr<InputSpec> IpDNSServerRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSServerRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -195,7 +195,7 @@ std::shared_ptr<InputSpec> IpDNSSearchAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSSearchAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -224,7 +224,7 @@ std::shared_ptr<InputSpec> IpDNSSearchRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSSearchRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -63,7 +63,7 @@ std::shared_ptr<MetaStruct> IpHostsList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpHostsList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -106,7 +106,7 @@ std::shared_ptr<InputSpec> IpHostsAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpHostsAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -140,7 +140,7 @@ std::shared_ptr<InputSpec> IpHostsRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpHostsRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -162,7 +162,7 @@ std::shared_ptr<InputSpec> IpIpsecSAAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSAAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -226,7 +226,7 @@ std::shared_ptr<InputSpec> IpIpsecSARemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSARemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSARemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -296,7 +296,7 @@ std::shared_ptr<MetaStruct> IpIpsecSAList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpIpsecSAList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -369,7 +369,7 @@ std::shared_ptr<InputSpec> IpIpsecSPAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPAdd::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSPAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -421,7 +421,7 @@ std::shared_ptr<InputSpec> IpIpsecSPRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSPRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -477,7 +477,7 @@ std::shared_ptr<MetaStruct> IpIpsecSPList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpIpsecSPList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,

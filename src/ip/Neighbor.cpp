@@ -140,7 +140,7 @@ std::shared_ptr<MetaStruct> IpNeighborList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpNeighborList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNeighborList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -203,7 +203,7 @@ std::shared_ptr<InputSpec> IpNeighborRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpNeighborRemove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpNeighborRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -271,7 +271,7 @@ std::shared_ptr<MetaStruct> IpConnectionList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpConnectionList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpConnectionList::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -228,7 +228,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Add::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv4Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -251,7 +251,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Remove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv4Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -286,7 +286,7 @@ std::shared_ptr<MetaStruct> IpRouteIpv4List::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -309,7 +309,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Add::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv6Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -332,7 +332,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Remove::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv6Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -366,7 +366,7 @@ std::shared_ptr<MetaStruct> IpRouteIpv6List::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpRouteIpv6List::ExecuteInternal(const std::shared_ptr<Input>& input,

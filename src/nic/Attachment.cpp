@@ -128,7 +128,7 @@ std::shared_ptr<CallSpec::InputSpec> NicAttachmentList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentList::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicAttachmentList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

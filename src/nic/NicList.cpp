@@ -110,7 +110,7 @@ std::shared_ptr<CallSpec::InputSpec> NicList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicList::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

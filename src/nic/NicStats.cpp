@@ -119,7 +119,7 @@ std::shared_ptr<CallSpec::InputSpec> NicStatsGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicStatsGet::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -166,7 +166,7 @@ std::shared_ptr<CallSpec::InputSpec> NicVlanStatsGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsGet::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicVlanStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -215,7 +215,7 @@ std::shared_ptr<CallSpec::InputSpec> NicVlanStatsSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsSet::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaBool::New());
+  return BoolResultSpec();
 }
 
 void NicVlanStatsSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -133,7 +133,7 @@ std::shared_ptr<CallSpec::InputSpec> SriovNicList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> SriovNicList::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void SriovNicList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -199,7 +199,7 @@ std::shared_ptr<CallSpec::InputSpec> VfList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfList::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VfList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -260,7 +260,7 @@ std::shared_ptr<CallSpec::InputSpec> VfStats::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfStats::GetOutputSpecInternal() {
-  return ResultSpec(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

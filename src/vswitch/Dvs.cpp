@@ -107,7 +107,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchDVSCorvexList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchDVSCorvexList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 std::shared_ptr<MetaList>

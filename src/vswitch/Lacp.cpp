@@ -293,7 +293,7 @@ std::shared_ptr<MetaStruct> LacpGetConfig::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetConfig::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetConfig::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -396,7 +396,7 @@ std::shared_ptr<MetaStruct> LacpGetStatus::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStatus::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetStatus::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -457,7 +457,7 @@ std::shared_ptr<MetaStruct> LacpGetStats::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStats::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetStats::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -517,7 +517,7 @@ std::shared_ptr<InputSpec> LacpSetTimeout::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> LacpSetTimeout::GetOutputSpecInternal() {
-  return ResultSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void LacpSetTimeout::ExecuteInternal(const std::shared_ptr<Input>& input,

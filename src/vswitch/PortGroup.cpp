@@ -210,7 +210,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupList::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -278,7 +278,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardList::GetOutputSpecInternal() {
-  return ResultSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchStandardList::ExecuteInternal(const std::shared_ptr<Input>& input,
