@@ -18,14 +18,14 @@ ordered_json ParseDescription(const std::string& text) {
   };
   std::vector<Frame> frames;
   auto path = [&frames] {
-    std::string text;
+    std::string where;
     for (const Frame& frame : frames) {
       if (frame.object && !frame.key.empty())
-        text += (text.empty() ? "" : ".") + frame.key;
+        where += (where.empty() ? "" : ".") + frame.key;
       else if (!frame.object && frame.count > 0)
-        text += "[" + std::to_string(frame.count - 1) + "]";
+        where += "[" + std::to_string(frame.count - 1) + "]";
     }
-    return text;
+    return where;
   };
   using Event = nlohmann::ordered_json::parse_event_t;
   auto callback = [&](int, Event event, ordered_json& parsed) {
