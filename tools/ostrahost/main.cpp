@@ -258,8 +258,8 @@ int main(int argc, char** argv) {
         return Fail("the file " + positional[0] + " exists already");
       // Always a new file: another init may make the same path meanwhile,
       // and its host must not be replaced (WriteHost would import into it).
-      nlohmann::ordered_json host = Model::Profile(profile);
-      CreateHost(positional[0], [&](Model::Store& store) { Model::ImportHost(store, host); });
+      nlohmann::ordered_json description = Model::Profile(profile);
+      CreateHost(positional[0], [&](Model::Store& store) { Model::ImportHost(store, description); });
       return 0;
     }
     if (command == "generate") {
