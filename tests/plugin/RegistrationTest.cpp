@@ -934,9 +934,9 @@ using StructureFields = std::map<std::string, std::set<std::string>>;
 void CollectStructures(const MetaObjectPtr& value, StructureFields& out) {
   if (auto structure = std::dynamic_pointer_cast<MetaStruct>(value)) {
     auto& fields = out[structure->GetName()];
-    for (const auto& field : structure->GetFields()) {
-      fields.insert(field.name);
-      CollectStructures(field.value, out);
+    for (std::size_t i = 0; i < structure->GetFieldCount(); ++i) {
+      fields.insert(structure->GetFieldName(i));
+      CollectStructures(structure->GetFieldValue(i).GetObject(), out);
     }
   } else if (auto list = std::dynamic_pointer_cast<MetaList>(value)) {
     if (list->GetElementTemplate())
@@ -1098,7 +1098,7 @@ TEST_F(RegistrationTest, OutputSpecificationsHaveTheResultKind) {
       auto structure = std::dynamic_pointer_cast<MetaStruct>(result);
       ASSERT_NE(structure, nullptr);
       EXPECT_EQ(structure->GetName(), expected.structure);
-      EXPECT_FALSE(structure->GetFields().empty());
+      EXPECT_NE(structure->GetFieldCount(), 0u);
       break;
     }
     case Result::StructureList: {
@@ -1109,7 +1109,7 @@ TEST_F(RegistrationTest, OutputSpecificationsHaveTheResultKind) {
       auto element = std::dynamic_pointer_cast<MetaStruct>(list->GetElementTemplate());
       ASSERT_NE(element, nullptr);
       EXPECT_EQ(element->GetName(), expected.structure);
-      EXPECT_FALSE(element->GetFields().empty());
+      EXPECT_NE(element->GetFieldCount(), 0u);
       break;
     }
     }
