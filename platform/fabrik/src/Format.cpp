@@ -349,6 +349,13 @@ std::string ValidUtf8(const std::string& text) {
 
 std::string EscapeControls(const std::string& text, Escapes which) {
   static const char* const kHex = "0123456789abcdef";
+  // Nearly every text is printable ASCII or UTF-8 without C1 controls
+  // (which are encoded with the lead byte 0xC2): it stays as it is.
+  if (which == Escapes::Controls && std::none_of(text.begin(), text.end(), [](char c) {
+        const auto byte = static_cast<unsigned char>(c);
+        return byte < 0x20 || byte == 0x7F || byte == 0xC2;
+      }))
+    return text;
   std::string escaped;
   escaped.reserve(text.size());
   std::size_t pos = 0;
@@ -485,14 +492,13 @@ void Spool::Spill() {
     }
   }
   WriteFully(fd_, memory_.data(), memory_.size());
+  inFile_ += memory_.size();
   memory_.clear();
 }
 
 void Spool::Append(const char* data, std::size_t size) {
-  size_ += size;
   memory_.append(data, size);
-  if (memory_.size() >= (fd_ < 0 ? SpoolMemory : SpoolChunk))
-    Spill();
+  Grown();
 }
 
 void Spool::AppendRecord(const std::string& text) {
@@ -522,10 +528,12 @@ bool Spool::Reader::Fill(std::size_t want) {
     return true;
   buffer_.erase(0, pos_);
   pos_ = 0;
-  std::string chunk(std::max(want, SpoolChunk), '\0');
+  std::string chunk;
   while (buffer_.size() < want) {
-    const std::size_t inFile = spool_.size_ - spool_.memory_.size();
+    const std::size_t inFile = spool_.inFile_;
     if (offset_ < inFile) {
+      if (chunk.empty())
+        chunk.resize(std::max(want, SpoolChunk));
       std::size_t got =
           ReadAt(spool_.fd_, chunk.data(), std::min(chunk.size(), inFile - offset_), offset_);
       if (got == 0)
@@ -559,18 +567,15 @@ bool Spool::Reader::Next(std::string& text) {
 
 // SpoolWriter
 
-void SpoolWriter::Pass() {
-  if (text_.size() >= 64 * 1024) {
-    spool_.Append(text_);
-    text_.clear();
-  }
+void Spool::Grown() {
+  if (memory_.size() >= (fd_ < 0 ? SpoolMemory : SpoolChunk))
+    Spill();
 }
 
 void SpoolWriter::Finish(std::ostream& out) {
-  End(text_, rows_);
+  End(spool_.Memory(), rows_);
+  spool_.Grown();
   spool_.CopyTo(out);
-  out.write(text_.data(), static_cast<std::streamsize>(text_.size()));
-  text_.clear();
 }
 
 } // namespace Detail

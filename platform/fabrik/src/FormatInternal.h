@@ -134,7 +134,12 @@ public:
   void Append(const std::string& text) { Append(text.data(), text.size()); }
   /// Appends \p text with its length in front, for Reader::Next.
   void AppendRecord(const std::string& text);
-  bool Empty() const { return size_ == 0; }
+  bool Empty() const { return inFile_ == 0 && memory_.empty(); }
+  /// The text not yet in the file: a writer may append to it and then call
+  /// Grown, instead of Append.
+  std::string& Memory() { return memory_; }
+  /// Moves the text to the file once it is large.
+  void Grown();
   /// Writes everything appended to \p out.
   void CopyTo(std::ostream& out);
 
@@ -155,30 +160,28 @@ public:
 
 private:
   void Spill();
-  std::string memory_;   ///< Text not (yet) in the file.
-  int fd_ = -1;          ///< The temporary file, once memory grew too large.
-  std::size_t size_ = 0; ///< Bytes appended.
+  std::string memory_;     ///< Text not (yet) in the file.
+  int fd_ = -1;            ///< The temporary file, once memory grew too large.
+  std::size_t inFile_ = 0; ///< Bytes in the file.
 };
 
-/// A list writer that formats rows as text into a spool: \p Begin and \p
-/// End surround them. Most formatters derive from it.
+/// A list writer that formats rows as text into a spool; End adds what
+/// follows the last row. Most formatters derive from it.
 class SpoolWriter : public ListWriter {
 public:
   void Finish(std::ostream& out) override;
 
 protected:
-  /// Appends the text \p text of the current row (the spool or a buffer in
-  /// front of it).
-  std::string& Text() { return text_; }
-  /// Moves the text gathered so far to the spool once it is large.
-  void Pass();
+  /// Where the text of the rows goes.
+  std::string& Text() { return spool_.Memory(); }
+  /// Moves the text gathered so far to the spool's file once it is large.
+  void Pass() { spool_.Grown(); }
   /// What comes after the last row; \p rows counts the rows handed over.
   virtual void End(std::string& text, std::size_t rows) = 0;
   std::size_t rows_ = 0; ///< Rows handed over so far.
 
 private:
-  std::string text_; ///< Text not yet in the spool.
-  Spool spool_;      ///< Text of the rows so far.
+  Spool spool_; ///< Text of the rows so far.
 };
 
 } // namespace Fabrik::Format::Detail

@@ -100,9 +100,14 @@ public:
     const std::vector<std::size_t>& fields = Fields(row);
     for (std::size_t c = 0; c < columns_.size(); ++c) {
       cell_.clear();
-      if (fields[c] != MetaObj::MetaLayout::npos)
-        cell_ = EscapeControls(WithUnit(CompactText(row.GetFieldValue(fields[c]), params_), row,
-                                        columns_[c], params_));
+      if (fields[c] != MetaObj::MetaLayout::npos) {
+        cell_ = CompactText(row.GetFieldValue(fields[c]), params_);
+        if (!cell_.empty() && units_[c]) {
+          cell_ += ' ';
+          cell_ += *units_[c];
+        }
+        cell_ = EscapeControls(cell_);
+      }
       widths_[c] = std::max(widths_[c], DisplayWidth(cell_));
       spool_.AppendRecord(cell_);
     }
@@ -172,8 +177,12 @@ private:
     if (layout != layout_) {
       layout_ = layout;
       fields_.clear();
-      for (const std::string& column : columns_)
+      units_.clear();
+      for (const std::string& column : columns_) {
         fields_.push_back(layout->Find(column));
+        const std::string* unit = params_.Find("units:" + layout->GetName() + "." + column);
+        units_.push_back(unit && !unit->empty() ? unit : nullptr);
+      }
     }
     return fields_;
   }
@@ -194,6 +203,7 @@ private:
   std::string cell_;                            ///< The cell being made.
   const MetaObj::MetaLayout* layout_ = nullptr; ///< Layout fields_ belongs to.
   std::vector<std::size_t> fields_;             ///< Field index of each column in layout_.
+  std::vector<const std::string*> units_;       ///< Unit of each column in layout_, or null.
 };
 
 class TableFormatter final : public Formatter {
