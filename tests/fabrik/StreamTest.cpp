@@ -129,7 +129,7 @@ TEST(StreamTest, LongListingsSpillToAnUnlinkedFile) {
   const std::string saved = before ? before : "";
   ::setenv("TMPDIR", directory.c_str(), 1);
   auto list = ManySwitches(40000, 90);
-  for (const std::string& formatter : {"json", "table", "csv"}) {
+  for (const char* formatter : {"json", "table", "csv"}) {
     const std::string streamed = RenderStreamed(formatter, *list);
     EXPECT_GT(streamed.size(), 4u << 20) << formatter;
     EXPECT_EQ(streamed, Render(formatter, list)) << formatter;
