@@ -287,9 +287,10 @@ bool BoolParameter(const Parameters& params, const std::string& key, bool fallba
 }
 
 std::size_t DisplayWidth(const std::string& text) {
-  return static_cast<std::size_t>(std::count_if(text.begin(), text.end(), [](char c) {
-    return (static_cast<unsigned char>(c) & 0xC0) != 0x80;
-  }));
+  std::size_t continuations = 0;
+  for (const char c : text)
+    continuations += (static_cast<unsigned char>(c) & 0xC0) == 0x80;
+  return text.size() - continuations;
 }
 
 std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos) {
@@ -347,14 +348,19 @@ std::string ValidUtf8(const std::string& text) {
   return valid;
 }
 
+bool NeedsEscapes(const std::string& text) {
+  // C1 controls are encoded with the lead byte 0xC2.
+  return std::any_of(text.begin(), text.end(), [](char c) {
+    const auto byte = static_cast<unsigned char>(c);
+    return byte < 0x20 || byte == 0x7F || byte == 0xC2;
+  });
+}
+
 std::string EscapeControls(const std::string& text, Escapes which) {
   static const char* const kHex = "0123456789abcdef";
-  // Nearly every text is printable ASCII or UTF-8 without C1 controls
-  // (which are encoded with the lead byte 0xC2): it stays as it is.
-  if (which == Escapes::Controls && std::none_of(text.begin(), text.end(), [](char c) {
-        const auto byte = static_cast<unsigned char>(c);
-        return byte < 0x20 || byte == 0x7F || byte == 0xC2;
-      }))
+  // Nearly every text is printable ASCII or UTF-8 without C1 controls: it
+  // stays as it is.
+  if (which == Escapes::Controls && !NeedsEscapes(text))
     return text;
   std::string escaped;
   escaped.reserve(text.size());

@@ -91,6 +91,10 @@ std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos);
 /// replaced by U+FFFD.
 std::string ValidUtf8(const std::string& text);
 
+/// True when \p text holds a character that EscapeControls writes as an
+/// escape with Escapes::Controls.
+bool NeedsEscapes(const std::string& text);
+
 /// Which characters EscapeControls writes as escapes.
 enum class Escapes {
   /// Every C0 control character, DEL and every C1 control character

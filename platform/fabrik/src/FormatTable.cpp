@@ -8,8 +8,11 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 #include <cstdlib>
+#include <cstring>
 #include <ostream>
+#include <string_view>
 
 namespace Fabrik::Format::Detail {
 
@@ -98,6 +101,8 @@ public:
     if (columns_.empty())
       return;
     const std::vector<std::size_t>& fields = Fields(row);
+    // One record per row: each cell's width and length, then its text.
+    record_.clear();
     for (std::size_t c = 0; c < columns_.size(); ++c) {
       cell_.clear();
       if (fields[c] != MetaObj::MetaLayout::npos) {
@@ -106,11 +111,16 @@ public:
           cell_ += ' ';
           cell_ += *units_[c];
         }
-        cell_ = EscapeControls(cell_);
+        if (NeedsEscapes(cell_))
+          cell_ = EscapeControls(cell_);
       }
-      widths_[c] = std::max(widths_[c], DisplayWidth(cell_));
-      spool_.AppendRecord(cell_);
+      const std::size_t width = DisplayWidth(cell_);
+      widths_[c] = std::max(widths_[c], width);
+      PutNumber(record_, width);
+      PutNumber(record_, cell_.size());
+      record_ += cell_;
     }
+    spool_.AppendRecord(record_);
     ++rows_;
   }
 
@@ -124,14 +134,14 @@ public:
       lastStart += widths_[c] + ColumnGap.size();
     const bool wrap = BoolParameter(params_, "wrap-last", false);
     std::size_t room = 0;
-    std::vector<std::string> cells(columns_.size());
+    std::vector<Cell> cells(columns_.size());
     if (wrap) {
       std::size_t terminal = TerminalWidth();
       room = std::max(terminal > lastStart ? terminal - lastStart : 0, MinWrapWidth);
       widths_[last] = showHeader_ ? DisplayWidth(columns_[last]) : 0;
       Spool::Reader reader(spool_);
       while (ReadRow(reader, cells))
-        for (const std::string& part : Wrap(cells[last], room))
+        for (const std::string& part : Wrap(std::string(cells[last].text), room))
           widths_[last] = std::max(widths_[last], DisplayWidth(part));
     }
     if (showHeader_) {
@@ -150,23 +160,29 @@ public:
     }
     Spool::Reader reader(spool_);
     std::string line;
+    std::string text;
     while (ReadRow(reader, cells)) {
       line.clear();
       for (std::size_t c = 0; c < last; ++c) {
-        line += cells[c];
-        line.append(widths_[c] - std::min(widths_[c], DisplayWidth(cells[c])), ' ');
+        line += cells[c].text;
+        line.append(widths_[c] - std::min(widths_[c], cells[c].width), ' ');
         line += ColumnGap;
       }
       if (!wrap) {
-        line += cells[last];
-        WriteLine(out, line);
-        continue;
+        line += cells[last].text;
+        AppendLine(text, line);
+      } else {
+        std::vector<std::string> parts = Wrap(std::string(cells[last].text), room);
+        AppendLine(text, line + parts.front());
+        for (std::size_t i = 1; i < parts.size(); ++i)
+          AppendLine(text, std::string(lastStart, ' ') + parts[i]);
       }
-      std::vector<std::string> parts = Wrap(cells[last], room);
-      WriteLine(out, line + parts.front());
-      for (std::size_t i = 1; i < parts.size(); ++i)
-        WriteLine(out, std::string(lastStart, ' ') + parts[i]);
+      if (text.size() >= 64 * 1024) {
+        out.write(text.data(), static_cast<std::streamsize>(text.size()));
+        text.clear();
+      }
     }
+    out.write(text.data(), static_cast<std::streamsize>(text.size()));
   }
 
 private:
@@ -187,11 +203,43 @@ private:
     return fields_;
   }
 
-  bool ReadRow(Spool::Reader& reader, std::vector<std::string>& cells) {
-    for (std::string& cell : cells)
-      if (!reader.Next(cell))
-        return false;
+  /// A cell of a row read back: its text (in record_) and its width.
+  struct Cell {
+    std::string_view text; ///< The cell's text.
+    std::size_t width = 0; ///< Its width in characters.
+  };
+
+  static void PutNumber(std::string& record, std::size_t number) {
+    const auto value = static_cast<std::uint32_t>(number);
+    record.append(reinterpret_cast<const char*>(&value), sizeof value);
+  }
+
+  static std::size_t TakeNumber(const std::string& record, std::size_t& pos) {
+    std::uint32_t value = 0;
+    std::memcpy(&value, record.data() + pos, sizeof value);
+    pos += sizeof value;
+    return value;
+  }
+
+  /// The cells of the next row, pointing into record_; false after the last.
+  bool ReadRow(Spool::Reader& reader, std::vector<Cell>& cells) {
+    if (!reader.Next(record_))
+      return false;
+    std::size_t pos = 0;
+    for (Cell& cell : cells) {
+      cell.width = TakeNumber(record_, pos);
+      const std::size_t size = TakeNumber(record_, pos);
+      cell.text = std::string_view(record_).substr(pos, size);
+      pos += size;
+    }
     return true;
+  }
+
+  /// Appends \p line without its trailing blanks, and a line break.
+  static void AppendLine(std::string& text, const std::string& line) {
+    const std::size_t end = line.find_last_not_of(' ') + 1;
+    text.append(line, 0, end);
+    text += '\n';
   }
 
   Parameters params_;                           ///< Formatter parameters.
@@ -201,6 +249,7 @@ private:
   std::size_t rows_ = 0;                        ///< Rows handed over.
   Spool spool_;                                 ///< Cells, row by row.
   std::string cell_;                            ///< The cell being made.
+  std::string record_;                          ///< The record of one row.
   const MetaObj::MetaLayout* layout_ = nullptr; ///< Layout fields_ belongs to.
   std::vector<std::size_t> fields_;             ///< Field index of each column in layout_.
   std::vector<const std::string*> units_;       ///< Unit of each column in layout_, or null.
