@@ -97,9 +97,16 @@ protected:
     return traits_type::not_eof(c);
   }
   std::streamsize xsputn(const char* data, std::streamsize count) override {
-    buffer_.append(data, static_cast<std::size_t>(count));
-    if (buffer_.size() >= kPiece)
-      Flush();
+    const auto size = static_cast<std::size_t>(count);
+    if (buffer_.size() + size < kPiece) {
+      buffer_.append(data, size);
+      return count;
+    }
+    // A large piece goes to the file as it is, not through the buffer.
+    if (Flush() && file_ && std::fwrite(data, 1, size, file_) != size) {
+      failed_ = true;
+      error_ = errno;
+    }
     return count;
   }
 

@@ -441,8 +441,6 @@ const std::string* ElementStructName(const MetaList& list) {
 
 namespace {
 
-/// Bytes a spool holds in memory before it moves to a file.
-constexpr std::size_t SpoolMemory = 4 << 20;
 /// Bytes written to or read from the file at a time.
 constexpr std::size_t SpoolChunk = 256 << 10;
 
@@ -503,6 +501,8 @@ void Spool::Spill() {
 }
 
 void Spool::Append(const char* data, std::size_t size) {
+  if (memory_.capacity() < Spool::SpoolMemory)
+    Reserve();
   memory_.append(data, size);
   Grown();
 }
@@ -573,8 +573,14 @@ bool Spool::Reader::Next(std::string& text) {
 
 // SpoolWriter
 
+void Spool::Reserve() {
+  // The whole of the memory at once: pages not written to are not used,
+  // and the text is never copied to grow.
+  memory_.reserve(Spool::SpoolMemory + SpoolChunk);
+}
+
 void Spool::Grown() {
-  if (memory_.size() >= (fd_ < 0 ? SpoolMemory : SpoolChunk))
+  if (memory_.size() >= (fd_ < 0 ? Spool::SpoolMemory : SpoolChunk))
     Spill();
 }
 

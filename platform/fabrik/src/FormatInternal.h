@@ -141,7 +141,11 @@ public:
   bool Empty() const { return inFile_ == 0 && memory_.empty(); }
   /// The text not yet in the file: a writer may append to it and then call
   /// Grown, instead of Append.
-  std::string& Memory() { return memory_; }
+  std::string& Memory() {
+    if (memory_.capacity() < SpoolMemory)
+      Reserve();
+    return memory_;
+  }
   /// Moves the text to the file once it is large.
   void Grown();
   /// Writes everything appended to \p out.
@@ -162,7 +166,11 @@ public:
     std::size_t offset_ = 0; ///< Bytes of the file read so far.
   };
 
+  /// Bytes a spool holds in memory before it moves to a file.
+  static constexpr std::size_t SpoolMemory = 4 << 20;
+
 private:
+  void Reserve();
   void Spill();
   std::string memory_;     ///< Text not (yet) in the file.
   int fd_ = -1;            ///< The temporary file, once memory grew too large.
