@@ -27,13 +27,36 @@ constexpr std::size_t IndentStep = 2;
 /// Bytes of text the writer keeps before passing them on to its sink.
 constexpr std::size_t FlushSize = 64 * 1024;
 
+/// The bytes that a JSON string holds as they are: printable ASCII but the
+/// quote and the backslash.
+struct PlainBytes {
+  bool plain[256] = {};
+  constexpr PlainBytes() {
+    for (int c = 0x20; c < 0x80; ++c)
+      plain[c] = c != '"' && c != '\\';
+  }
+};
+constexpr PlainBytes Plain;
+
 /// True for a byte that a JSON string holds as it is.
 inline bool IsPlain(unsigned char c) {
-  return c >= 0x20 && c < 0x80 && c != '"' && c != '\\';
+  return Plain.plain[c];
 }
 
 void WriteString(std::string& out, const std::string& text) {
   static const char Hex[] = "0123456789abcdef";
+  std::size_t plain = 0;
+  while (plain < text.size() && IsPlain(static_cast<unsigned char>(text[plain])))
+    ++plain;
+  if (plain == text.size()) {
+    // Nearly every text: copied whole, between its quotes.
+    const std::size_t at = out.size();
+    out.resize(at + text.size() + 2);
+    out[at] = '"';
+    text.copy(out.data() + at + 1, text.size());
+    out[at + text.size() + 1] = '"';
+    return;
+  }
   out += '"';
   std::size_t pos = 0;
   while (pos < text.size()) {
