@@ -135,6 +135,9 @@ TEST(StreamTest, LongListingsSpillToAnUnlinkedFile) {
     EXPECT_EQ(streamed, Render(formatter, list)) << formatter;
   }
   EXPECT_EQ(FilesIn(directory), 0u);
+  // Where no file can be made, the listing fails as a whole.
+  ::setenv("TMPDIR", (directory + "/missing").c_str(), 1);
+  EXPECT_THROW(RenderStreamed("json", *list), std::runtime_error);
   if (before)
     ::setenv("TMPDIR", saved.c_str(), 1);
   else
