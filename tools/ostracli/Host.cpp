@@ -118,6 +118,14 @@ private:
   int error_ = 0;                                   ///< errno of the failed write.
 };
 
+/// True for the result template of a command that changes the host: a
+/// command whose result is a boolean is an action; every other command
+/// reports what it reads. The walk of the whole tree in the registration
+/// test keeps this true.
+bool IsAction(const MetaObj::MetaObjectPtr& shape) {
+  return shape && shape->GetType() == MetaObj::Boolean;
+}
+
 /// The element template of a result that is a list of structures: the rows
 /// of such a result can stream. Null for any other result.
 const MetaObj::MetaStruct* StreamedElement(const MetaObj::MetaObjectPtr& shape) {
@@ -204,11 +212,8 @@ void SelectHost(const std::string& path, bool isDefault) {
 }
 
 bool ChangesHost(AutoCli::CommandSpec& command) {
-  // A command whose result is a boolean is an action; every other command
-  // reports what it reads. The walk of the whole tree in the registration
-  // test keeps this true.
   std::shared_ptr<CallSpec::OutputSpec> spec = command.GetOutputSpec();
-  return spec && spec->GetRootObject() && spec->GetRootObject()->GetType() == MetaObj::Boolean;
+  return IsAction(spec ? spec->GetRootObject() : nullptr);
 }
 
 std::string ShortenEchoes(std::string text, const std::vector<std::string>& words) {
@@ -469,12 +474,10 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
       return ExitCommandError;
     }
   }
-  // A command whose result is a boolean is an action; every other command
-  // reports what it reads (ChangesHost).
   const std::shared_ptr<CallSpec::OutputSpec> outputSpec = command->GetOutputSpec();
   const MetaObj::MetaObjectPtr shape = outputSpec ? outputSpec->GetRootObject() : nullptr;
   try {
-    HostCtl::Session::BeginCommand(shape && shape->GetType() == MetaObj::Boolean);
+    HostCtl::Session::BeginCommand(IsAction(shape));
   } catch (const HostCtl::Lib::HostCtlException& e) {
     err += (mode.inBatch ? "" : "ostracli: ") + std::string(e.what()) + "\n";
     return ExitCommandError;
