@@ -129,7 +129,7 @@ private:
 };
 
 /// Bytes of results a batch gathers before it writes them.
-constexpr std::size_t kOutputPiece = 64 * 1024;
+constexpr std::size_t kOutputPiece = std::size_t{64} * 1024;
 
 /// "ostracli: FILE:N: " in front of every line of \p messages.
 std::string NameLine(const std::string& messages, const std::string& where) {

@@ -111,11 +111,11 @@ protected:
   }
 
 private:
-  static constexpr std::size_t kPiece = 256 * 1024; ///< Bytes passed on at a time.
-  std::FILE* file_;                                 ///< Destination.
-  std::string buffer_;                              ///< Bytes not yet written.
-  bool failed_ = false;                             ///< A write failed.
-  int error_ = 0;                                   ///< errno of the failed write.
+  static constexpr std::size_t kPiece = std::size_t{256} * 1024; ///< Bytes passed on at a time.
+  std::FILE* file_;                                              ///< Destination.
+  std::string buffer_;                                           ///< Bytes not yet written.
+  bool failed_ = false;                                          ///< A write failed.
+  int error_ = 0;                                                ///< errno of the failed write.
 };
 
 /// True for the result template of a command that changes the host: a

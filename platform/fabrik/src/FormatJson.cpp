@@ -25,7 +25,7 @@ namespace {
 /// Blanks of indent per nesting level.
 constexpr std::size_t IndentStep = 2;
 /// Bytes of text the writer keeps before passing them on to its sink.
-constexpr std::size_t FlushSize = 64 * 1024;
+constexpr std::size_t FlushSize = std::size_t{64} * 1024;
 
 /// The bytes that a JSON string holds as they are: printable ASCII but the
 /// quote and the backslash.

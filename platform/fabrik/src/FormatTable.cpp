@@ -177,7 +177,7 @@ public:
         for (std::size_t i = 1; i < parts.size(); ++i)
           AppendLine(text, std::string(lastStart, ' ') + parts[i]);
       }
-      if (text.size() >= 64 * 1024) {
+      if (text.size() >= std::size_t{64} * 1024) {
         out.write(text.data(), static_cast<std::streamsize>(text.size()));
         text.clear();
       }

@@ -262,7 +262,7 @@ MetaValue& MetaStruct::Slot(const std::string& name) {
   return values_.emplace_back();
 }
 
-void MetaStruct::SetField(const std::string& name, MetaObjectPtr value) {
+void MetaStruct::SetField(const std::string& name, const MetaObjectPtr& value) {
   Slot(name).Assign(value);
 }
 

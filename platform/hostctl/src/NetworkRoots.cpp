@@ -308,9 +308,9 @@ RoutingInfoImpl::GetIpv6NeighborState(const HostCtl::Network::Ipv6Neighbor& neig
 
 // --- NetstackInstanceImpl.
 
-NetstackInstanceImpl::NetstackInstanceImpl(std::string key, uint32_t maxConnections,
-                                           std::string ccAlgorithm, bool ipv6Enabled,
-                                           uint32_t layoutVersion, std::string ecn)
+NetstackInstanceImpl::NetstackInstanceImpl(const std::string& key, uint32_t maxConnections,
+                                           const std::string& ccAlgorithm, bool ipv6Enabled,
+                                           uint32_t layoutVersion, const std::string& ecn)
     : ops_(Current().MakeNewNetstackInstance(key, maxConnections, ccAlgorithm, ipv6Enabled,
                                              layoutVersion, ecn)) {}
 NetstackInstanceImpl::~NetstackInstanceImpl() = default;
@@ -370,7 +370,8 @@ void NetstackInstanceImpl::SetEcnStatus(const std::string& status) {
 
 // --- DnsConfigImpl.
 
-DnsConfigImpl::DnsConfigImpl(std::string netstackKey) : ops_(Current().MakeDns(netstackKey)) {}
+DnsConfigImpl::DnsConfigImpl(const std::string& netstackKey)
+    : ops_(Current().MakeDns(netstackKey)) {}
 DnsConfigImpl::~DnsConfigImpl() = default;
 
 void DnsConfigImpl::Refresh() {
@@ -403,7 +404,7 @@ void DnsConfigImpl::SaveConfig() {
 
 // --- DcbInfoImpl.
 
-DcbInfoImpl::DcbInfoImpl(std::string nic) : ops_(Current().MakeDcb(nic)) {}
+DcbInfoImpl::DcbInfoImpl(const std::string& nic) : ops_(Current().MakeDcb(nic)) {}
 DcbInfoImpl::~DcbInfoImpl() = default;
 
 uint32_t DcbInfoImpl::GetMode() const {

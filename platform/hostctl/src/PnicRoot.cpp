@@ -7,7 +7,7 @@ namespace TvkCtl::Network {
 
 using HostCtl::Backend::Current;
 
-PnicImpl::PnicImpl(std::string name) : ops_(Current().MakePnic(name)) {}
+PnicImpl::PnicImpl(const std::string& name) : ops_(Current().MakePnic(name)) {}
 PnicImpl::~PnicImpl() = default;
 
 bool PnicImpl::IsValidPnic(const std::string& name) {

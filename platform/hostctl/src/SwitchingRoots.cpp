@@ -13,7 +13,7 @@ bool PortsetImpl::IsValidVirtualSwitch(const std::string& name) {
 
 // --- PortGroupImpl.
 
-PortGroupImpl::PortGroupImpl(std::string name) : ops_(Current().MakePortGroup(name)) {}
+PortGroupImpl::PortGroupImpl(const std::string& name) : ops_(Current().MakePortGroup(name)) {}
 PortGroupImpl::~PortGroupImpl() = default;
 
 std::string PortGroupImpl::GetPortsetName() const {
@@ -79,8 +79,9 @@ void PortGroupImpl::SetTrafficShapingPolicy(const HostCtl::Network::ShapingPolic
 
 // --- DVPortImpl.
 
-DVPortImpl::DVPortImpl(HostCtl::Network::DVPortParam param) : ops_(Current().MakeDVPort(param)) {}
-DVPortImpl::DVPortImpl(std::string switchId, std::string dvPortId)
+DVPortImpl::DVPortImpl(const HostCtl::Network::DVPortParam& param)
+    : ops_(Current().MakeDVPort(param)) {}
+DVPortImpl::DVPortImpl(const std::string& switchId, const std::string& dvPortId)
     : ops_(Current().MakeDVPort(switchId, dvPortId)) {}
 DVPortImpl::DVPortImpl(std::unique_ptr<HostCtl::Backend::DVPort> port) : ops_(std::move(port)) {}
 DVPortImpl::~DVPortImpl() = default;

@@ -242,8 +242,8 @@ private:
 
 class MetaStruct final : public MetaObject {
 public:
-  static std::shared_ptr<MetaStruct> New(std::string name) {
-    return std::make_shared<MetaStruct>(std::move(name));
+  static std::shared_ptr<MetaStruct> New(const std::string& name) {
+    return std::make_shared<MetaStruct>(name);
   }
   explicit MetaStruct(const std::string& name);
   MetaType GetType() const override { return Struct; }
@@ -252,7 +252,7 @@ public:
 
   /// Sets a field: replaces the value of an existing field in place, or
   /// appends a new field at the end.
-  void SetField(const std::string& name, MetaObjectPtr value);
+  void SetField(const std::string& name, const MetaObjectPtr& value);
   void SetField(const std::string& name, const char* value);
   void SetField(const std::string& name, const std::string& value);
   void SetField(const std::string& name, std::string&& value);

@@ -23,7 +23,7 @@ namespace TvkCtl::Network {
 class DcbInfoImpl {
 public:
   /// The DCB state of NIC \p nic; nothing is read until an operation is called.
-  explicit DcbInfoImpl(std::string nic);
+  explicit DcbInfoImpl(const std::string& nic);
   ~DcbInfoImpl();
 
   /// A HostCtl::Network::DcbMode code.

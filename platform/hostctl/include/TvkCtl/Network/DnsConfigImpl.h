@@ -24,7 +24,7 @@ namespace TvkCtl::Network {
 class DnsConfigImpl {
 public:
   /// The configuration of netstack \p netstackKey (checked when first used).
-  explicit DnsConfigImpl(std::string netstackKey);
+  explicit DnsConfigImpl(const std::string& netstackKey);
   ~DnsConfigImpl();
 
   /// Reads the stored configuration again; refuses a netstack that does not

@@ -20,8 +20,9 @@ class NetstackInstanceImpl : public HostCtl::Network::NetstackInstance {
 public:
   /// A new instance, not yet on the host. \p layoutVersion is the version of
   /// the settings layout (2 is the current one).
-  NetstackInstanceImpl(std::string key, uint32_t maxConnections, std::string ccAlgorithm,
-                       bool ipv6Enabled, uint32_t layoutVersion, std::string ecn);
+  NetstackInstanceImpl(const std::string& key, uint32_t maxConnections,
+                       const std::string& ccAlgorithm, bool ipv6Enabled, uint32_t layoutVersion,
+                       const std::string& ecn);
   ~NetstackInstanceImpl() override;
 
   /// The congestion control algorithms the host supports.

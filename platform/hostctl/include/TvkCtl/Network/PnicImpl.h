@@ -23,7 +23,7 @@ namespace TvkCtl::Network {
 class PnicImpl : public HostCtl::Network::Pnic {
 public:
   /// The NIC of that name (read when first used).
-  explicit PnicImpl(std::string name);
+  explicit PnicImpl(const std::string& name);
   ~PnicImpl() override;
 
   /// Whether the host has a physical NIC of that name.

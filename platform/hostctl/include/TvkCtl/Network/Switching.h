@@ -47,7 +47,7 @@ public:
 /// name; operations on one it does not have throw HostCtlException.
 class PortGroupImpl : public virtual HostCtl::Network::PortGroup {
 public:
-  explicit PortGroupImpl(std::string name);
+  explicit PortGroupImpl(const std::string& name);
   ~PortGroupImpl() override;
 
   // --- Connection point.
@@ -81,8 +81,8 @@ private:
 /// A distributed port, by switch UUID and port key.
 class DVPortImpl : public virtual HostCtl::Network::DVPort {
 public:
-  explicit DVPortImpl(HostCtl::Network::DVPortParam param);
-  DVPortImpl(std::string switchId, std::string dvPortId);
+  explicit DVPortImpl(const HostCtl::Network::DVPortParam& param);
+  DVPortImpl(const std::string& switchId, const std::string& dvPortId);
   /// A backend's port (how backends hand out the ports they list).
   explicit DVPortImpl(std::unique_ptr<HostCtl::Backend::DVPort> port);
   ~DVPortImpl() override;

@@ -277,9 +277,10 @@ std::vector<Feature> GetFeatures(Namespace& ns, const std::string& dev) {
     const auto strings = ReadStrings(ns, dev, ETH_SS_FEATURES, count, s);
     std::vector<std::string> names;
     const auto* p = reinterpret_cast<const char*>(strings.data()) + sizeof(ethtool_gstrings);
-    for (uint32_t i = 0; i < count; ++i)
-      names.emplace_back(p + i * ETH_GSTRING_LEN,
-                         strnlen(p + i * ETH_GSTRING_LEN, ETH_GSTRING_LEN));
+    for (std::size_t i = 0; i < count; ++i) {
+      const char* name = p + i * std::size_t{ETH_GSTRING_LEN};
+      names.emplace_back(name, strnlen(name, ETH_GSTRING_LEN));
+    }
     MsgPtr msg = Request(ns, ETHTOOL_MSG_FEATURES_GET, dev, ETHTOOL_FLAG_COMPACT_BITSETS);
     std::vector<Feature> features;
     ns.Internals().Genl().Request(

@@ -146,9 +146,8 @@ void CreateNamespace(const std::string& name) {
   // caller's thread stays where it is whatever happens.
   int err = 0;
   std::thread maker([&] {
-    if (unshare(CLONE_NEWNET) != 0)
-      err = errno;
-    else if (mount("/proc/thread-self/ns/net", path.c_str(), "none", MS_BIND, nullptr) != 0)
+    if (unshare(CLONE_NEWNET) != 0 ||
+        mount("/proc/thread-self/ns/net", path.c_str(), "none", MS_BIND, nullptr) != 0)
       err = errno;
   });
   maker.join();

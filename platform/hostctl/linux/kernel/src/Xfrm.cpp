@@ -136,7 +136,8 @@ XfrmAlgorithm ReadAlgorithm(xfrmnl_sa* sa, bool integrity) {
   if (rc < 0)
     return alg;
   alg.name = name;
-  alg.key.assign(key.begin(), key.begin() + std::min<std::size_t>((bits + 7) / 8, key.size()));
+  alg.key.assign(key.begin(), key.begin() + static_cast<std::ptrdiff_t>(
+                                                std::min<std::size_t>((bits + 7) / 8, key.size())));
   alg.truncationBits = truncation;
   return alg;
 }
@@ -246,7 +247,7 @@ std::vector<XfrmPolicy> ListXfrmPolicies(Namespace& ns) {
       tmpl.spi = static_cast<uint32_t>(xfrmnl_user_tmpl_get_spi(t));
       tmpl.reqid = static_cast<uint32_t>(xfrmnl_user_tmpl_get_reqid(t));
       tmpl.optional = xfrmnl_user_tmpl_get_optional(t) != 0;
-      p.templates.push_back(std::move(tmpl));
+      p.templates.push_back(tmpl);
     }
     policies.push_back(std::move(p));
   }
