@@ -40,8 +40,8 @@ using TvkCtl::Network::IpSecConfigImpl;
 using TvkCtl::Network::RoutingInfoImpl;
 
 const char* const kHostRows = R"sql(
-INSERT INTO netstack(key, ord, name) VALUES('defaultTcpipStack', 0, 'defaultTcpipStack'),
-  ('ops', 1, 'ops');
+INSERT INTO netstack(key, ord, name, state) VALUES('defaultTcpipStack', 0, 'defaultTcpipStack', 4660),
+  ('ops', 1, 'ops', 4660);
 INSERT INTO tvknic(name, ord, netstack, mac, system, ipv4_mode, ipv4_address, ipv4_netmask) VALUES
   ('vmk0', 0, 'defaultTcpipStack', '00:50:56:60:00:01', 0, 'static', '10.0.0.5', '255.255.255.0'),
   ('vmk1', 1, 'defaultTcpipStack', '00:50:56:60:00:02', 0, 'static', '10.0.0.77', '255.255.0.0'),
@@ -431,8 +431,9 @@ TEST_F(IpServicesTest, PoliciesLoseTheirSaWhenItIsRemoved) {
 }
 
 TEST_F(IpServicesTest, FaultsDeclaredForAnOperationAreThrown) {
-  Exec("INSERT INTO fault(operation, object, message) VALUES('GetCurrentTarvikRoutes', "
-       "'defaultTcpipStack', 'routing table unreadable')");
+  Exec("INSERT INTO setting(key, value) VALUES('faults', '[{\"operation\": "
+       "\"GetCurrentTarvikRoutes\", \"object\": \"defaultTcpipStack\", \"message\": "
+       "\"routing table unreadable\"}]')");
   Model::Store::CloseHost();
   RoutingInfoImpl routing("defaultTcpipStack");
   ExpectRefused([&] { routing.GetCurrentTarvikRoutes(PortsetGetRegular); },

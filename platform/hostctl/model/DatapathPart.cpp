@@ -39,14 +39,6 @@ using nlohmann::ordered_json;
 namespace {
 
 const char* const kDatapathSchema = R"sql(
--- VM ports (rows of port with client_kind 'vm'): the adapter's IPv4 address
--- and the uplink the team scheduler chose ('' for none).
-CREATE TABLE vm_port(
-  port_id INTEGER PRIMARY KEY REFERENCES port(id) ON DELETE CASCADE,
-  ipv4 TEXT NOT NULL DEFAULT '0.0.0.0',
-  team_uplink TEXT NOT NULL DEFAULT ''
-);
-
 -- MAC addresses of a VM port's adapter, in order.
 CREATE TABLE vm_port_mac(
   port_id INTEGER NOT NULL REFERENCES port(id) ON DELETE CASCADE,
@@ -54,17 +46,6 @@ CREATE TABLE vm_port_mac(
   mac TEXT NOT NULL,
   PRIMARY KEY(port_id, ord)
 ) WITHOUT ROWID;
-
--- Counters of a port (unsigned 64-bit values kept in signed columns). A port
--- without a row has all counters zero.
-CREATE TABLE port_counter(
-  port_id INTEGER PRIMARY KEY REFERENCES port(id) ON DELETE CASCADE,
-  rx_bytes INTEGER NOT NULL DEFAULT 0, tx_bytes INTEGER NOT NULL DEFAULT 0,
-  rx_packets INTEGER NOT NULL DEFAULT 0, rx_multicast INTEGER NOT NULL DEFAULT 0,
-  rx_broadcast INTEGER NOT NULL DEFAULT 0, tx_packets INTEGER NOT NULL DEFAULT 0,
-  tx_multicast INTEGER NOT NULL DEFAULT 0, tx_broadcast INTEGER NOT NULL DEFAULT 0,
-  rx_dropped INTEGER NOT NULL DEFAULT 0, tx_dropped INTEGER NOT NULL DEFAULT 0
-);
 
 -- Packet filters of a port, in the host's order, with their counters.
 CREATE TABLE port_filter(
@@ -151,8 +132,8 @@ void ExportEns(ordered_json& host, Store& store) {
   host["ens"] = std::move(ens);
 }
 
-/// Description keys of a port's counters, in the column order of
-/// port_counter.
+/// Description keys of a port's counters, in the order of the counter
+/// columns of port.
 const char* const kCounterKeys[] = {"rxBytes",     "txBytes",   "rxPackets",   "rxMulticast",
                                     "rxBroadcast", "txPackets", "txMulticast", "txBroadcast",
                                     "rxDropped",   "txDropped"};
@@ -259,8 +240,8 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
     if (!up.Step())
       port.Fail("teamUplink", "\"" + uplink + "\" is no uplink of the port's switch");
   }
-  store.Prepare("INSERT INTO vm_port(port_id, ipv4, team_uplink) VALUES(?, ?, ?)")
-      .BindAll(id, ipv4, uplink)
+  store.Prepare("UPDATE port SET ipv4 = ?, team_uplink = ? WHERE id = ?")
+      .BindAll(static_cast<int64_t>(HostCtl::Network::Ipv4Address(ipv4).GetValue()), uplink, id)
       .Run();
   int ord = 0;
   for (const std::string& mac : port.Strings("macs")) {
@@ -273,13 +254,13 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
   if (std::optional<JsonObject> stats = port.Object("stats")) {
     CheckPlainKeys(*stats, kCounterKeys);
     Statement counters = store.Prepare(
-        "INSERT INTO port_counter(port_id, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
-        "rx_broadcast, tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped) "
-        "VALUES(?,?,?,?,?,?,?,?,?,?,?)");
-    counters.Bind(1, id);
-    int column = 2;
+        "UPDATE port SET rx_bytes = ?, tx_bytes = ?, rx_packets = ?, rx_multicast = ?, "
+        "rx_broadcast = ?, tx_packets = ?, tx_multicast = ?, tx_broadcast = ?, rx_dropped = ?, "
+        "tx_dropped = ? WHERE id = ?");
+    int column = 1;
     for (const char* key : kCounterKeys)
       counters.Bind(column++, ReadCounter(*stats, key));
+    counters.Bind(column, id);
     // Multicast and broadcast packets are part of all packets, so that the
     // unicast count (the rest) is never negative.
     for (const char* direction : {"rx", "tx"}) {
@@ -337,15 +318,18 @@ ordered_json ExportPort(Store& store, const Statement& port) {
   while (mac.Step())
     macs.push_back(mac.Text(0));
   out["macs"] = std::move(macs);
-  Statement vmPort = store.Prepare("SELECT ipv4, team_uplink FROM vm_port WHERE port_id = ?");
+  Statement vmPort =
+      store.Prepare("SELECT ipv4, team_uplink FROM port WHERE id = ? AND ipv4 IS NOT NULL");
   vmPort.Bind(1, id);
   if (vmPort.Step()) {
-    out["ipv4"] = vmPort.Text(0);
+    out["ipv4"] = HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(0)))
+                      .GetStringAddress();
     out["teamUplink"] = vmPort.Text(1);
   }
   Statement counters = store.Prepare(
       "SELECT rx_bytes, tx_bytes, rx_packets, rx_multicast, rx_broadcast, tx_packets, "
-      "tx_multicast, tx_broadcast, rx_dropped, tx_dropped FROM port_counter WHERE port_id = ?");
+      "tx_multicast, tx_broadcast, rx_dropped, tx_dropped FROM port WHERE id = ? "
+      "AND rx_bytes IS NOT NULL");
   counters.Bind(1, id);
   if (counters.Step()) {
     ordered_json stats = ordered_json::object();

@@ -35,28 +35,23 @@ const char* const kFirewallSchema = R"sql(
 -- Kernel modules of the host and whether they are loaded.
 CREATE TABLE kmodule(
   name TEXT PRIMARY KEY,
-  loaded INTEGER NOT NULL DEFAULT 0,
+  loaded INTEGER NOT NULL,
   options TEXT NOT NULL DEFAULT ''
 ) WITHOUT ROWID;
 
--- The firewall's global state (one row). `filters_active` tells whether the
--- filters built from the rulesets are in place.
-CREATE TABLE fw_state(
-  id INTEGER PRIMARY KEY CHECK(id = 1),
-  enabled INTEGER NOT NULL,
-  default_pass INTEGER NOT NULL,
-  filters_active INTEGER NOT NULL
-);
+-- The firewall's global state is kept in `setting`: "firewall.enabled",
+-- "firewall.defaultPass" and "firewall.filtersActive" (whether the filters
+-- built from the rulesets are in place), each 0 or 1.
 
 -- Rulesets by label, in the host's order.
 CREATE TABLE fw_ruleset(
   id TEXT PRIMARY KEY,
   ord INTEGER NOT NULL,
-  enabled INTEGER NOT NULL DEFAULT 0,
-  allowed_all INTEGER NOT NULL DEFAULT 1,
-  enable_fixed INTEGER NOT NULL DEFAULT 0,
-  allowed_ip_fixed INTEGER NOT NULL DEFAULT 0,
-  clients INTEGER NOT NULL DEFAULT 0
+  enabled INTEGER NOT NULL,
+  allowed_all INTEGER NOT NULL,
+  enable_fixed INTEGER NOT NULL,
+  allowed_ip_fixed INTEGER NOT NULL,
+  clients INTEGER NOT NULL
 ) WITHOUT ROWID;
 
 -- Port rules of a ruleset, in order (codes as FirewallPortRule has them).
@@ -139,8 +134,8 @@ void ImportFirewall(const ordered_json& host, Store& store) {
       .BindAll(HostCtl::System::FirewallModuleName, loaded)
       .Run();
   store
-      .Prepare("INSERT INTO fw_state(id, enabled, default_pass, filters_active) "
-               "VALUES(1, ?, ?, ?)")
+      .Prepare("INSERT INTO setting(key, value) VALUES('firewall.enabled', ?), "
+               "('firewall.defaultPass', ?), ('firewall.filtersActive', ?)")
       .BindAll(enabled, pass, filters)
       .Run();
 
@@ -191,8 +186,9 @@ void ImportFirewall(const ordered_json& host, Store& store) {
 
 void ExportFirewall(ordered_json& host, Store& store) {
   Statement state =
-      store.Prepare("SELECT m.loaded, s.enabled, s.default_pass, s.filters_active FROM fw_state s "
-                    "JOIN kmodule m ON m.name = ? WHERE s.id = 1");
+      store.Prepare("SELECT m.loaded, e.value, p.value, f.value FROM kmodule m, setting e, "
+                    "setting p, setting f WHERE m.name = ? AND e.key = 'firewall.enabled' AND "
+                    "p.key = 'firewall.defaultPass' AND f.key = 'firewall.filtersActive'");
   state.Bind(1, HostCtl::System::FirewallModuleName);
   if (state.Step())
     host["firewall"] = {{"loaded", state.Bool(0)},

@@ -76,11 +76,10 @@ void GenerateRoutes(Store& store, int64_t count) {
   Statement insert = store.Prepare(
       "INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, interface, "
       "source) VALUES(?, 4, 0, ?, ?, ?, ?, 'user')");
-  const uint32_t base = 0x0A800000; // 10.128.0.0
-  const std::string gateways[] = {"10.20.0.251", "10.20.0.252", "10.20.0.253", "10.20.0.254"};
+  const int64_t base = 0x0A800000;    // 10.128.0.0
+  const int64_t gateways = 0x0A1400FB; // 10.20.0.251 to .254
   for (int64_t i = 0; i < count; ++i) {
-    insert.BindAll(kRouteNetstack, Dotted(base + static_cast<uint32_t>(i * step)), prefix,
-                   gateways[i % 4], kRouteInterface);
+    insert.BindAll(kRouteNetstack, base + i * step, prefix, gateways + i % 4, kRouteInterface);
     insert.Run();
     insert.Reset();
   }
@@ -230,14 +229,10 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
   Statement world = store.Prepare("INSERT INTO world(id, name) VALUES(?, ?)");
   Statement port = store.Prepare(
       "INSERT INTO port(id, portset_id, portgroup_id, dvport_key, client_kind, client, world_id, "
-      "port_type) VALUES(?, ?, ?, NULL, 'vm', ?, ?, 0)");
-  Statement vmPort =
-      store.Prepare("INSERT INTO vm_port(port_id, ipv4, team_uplink) VALUES(?, ?, ?)");
-  Statement mac = store.Prepare("INSERT INTO vm_port_mac(port_id, ord, mac) VALUES(?, 0, ?)");
-  Statement counters = store.Prepare(
-      "INSERT INTO port_counter(port_id, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
+      "port_type, ipv4, team_uplink, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
       "rx_broadcast, tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped) "
-      "VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)");
+      "VALUES(?, ?, ?, NULL, 'vm', ?, ?, 0, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)");
+  Statement mac = store.Prepare("INSERT INTO vm_port_mac(port_id, ord, mac) VALUES(?, 0, ?)");
   std::vector<int64_t> used(switches.size(), 0);
   int64_t serial = 0;
   for (int64_t vm = 0; vm < vms; ++vm) {
@@ -250,23 +245,19 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     world.Reset();
     for (int64_t adapter = 0; adapter < portsPerVm; ++adapter, ++serial, ++portId) {
       int64_t group = s.portgroups[used[which]++ % s.portgroups.size()];
-      port.BindAll(portId, s.id, group, name + ".eth" + std::to_string(adapter), worldId);
-      port.Run();
-      port.Reset();
       std::string uplink =
           s.uplinks.empty() ? std::string() : s.uplinks[adapter % s.uplinks.size()];
+      int64_t packets = 1000 + serial * 37 % 100000;
       // 10.64.0.0/10 holds the VMs' addresses, one per port.
-      vmPort.BindAll(portId, Dotted(0x0A400000 + static_cast<uint32_t>(serial) + 1), uplink);
-      vmPort.Run();
-      vmPort.Reset();
+      port.BindAll(portId, s.id, group, name + ".eth" + std::to_string(adapter), worldId,
+                   int64_t{0x0A400000} + serial + 1, uplink, packets * 900, packets * 600,
+                   packets, packets / 50, packets / 100, packets * 2 / 3, packets / 200,
+                   packets / 400, serial % 7, int64_t{0});
+      port.Run();
+      port.Reset();
       mac.BindAll(portId, Mac(0x00505A, static_cast<uint32_t>(serial)));
       mac.Run();
       mac.Reset();
-      int64_t packets = 1000 + serial * 37 % 100000;
-      counters.BindAll(portId, packets * 900, packets * 600, packets, packets / 50, packets / 100,
-                       packets * 2 / 3, packets / 200, packets / 400, serial % 7, 0);
-      counters.Run();
-      counters.Reset();
     }
   }
 }

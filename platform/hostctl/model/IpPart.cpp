@@ -13,6 +13,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Address.h"
+#include "HostCtl/Network/NetstackInstance.h"
 #include "TvkCtl/Network/TvkNicImpl.h"
 #include "model/CoreModel.h"
 #include "model/JsonRead.h"
@@ -26,6 +27,7 @@ using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Ipv4Address;
 using HostCtl::Network::Ipv6Address;
 using HostCtl::Network::MacAddress;
+using HostCtl::Network::NetstackInstance;
 using nlohmann::ordered_json;
 
 namespace Ip {
@@ -156,11 +158,11 @@ Attachment AttachmentOf(Store& store, const std::string& name) {
   Attachment a;
   Statement row = store.Prepare(
       "SELECT p.portset_id, s.name, s.kind, p.portgroup_id, pg.name, p.dvport_key, "
-      "coalesce(d.connection_id, 0), e.opaque_id, e.opaque_type, e.external_id, s.mtu "
+      "coalesce(d.connection_id, 0), t.opaque_id, t.opaque_type, t.external_id, s.mtu "
       "FROM tvknic t JOIN port p ON p.id = t.port_id JOIN portset s ON s.id = p.portset_id "
       "LEFT JOIN portgroup pg ON pg.id = p.portgroup_id "
       "LEFT JOIN dvport d ON d.portset_id = p.portset_id AND d.port_key = p.dvport_key "
-      "LEFT JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
+      "WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
     return a;
@@ -246,7 +248,7 @@ void DeleteInterface(Store& store, const std::string& name) {
     portId = port.Int(0);
   for (const char* sql :
        {"DELETE FROM tvknic_tag WHERE nic = ?", "DELETE FROM tvknic_mcast WHERE nic = ?",
-        "DELETE FROM tvknic_ipv6 WHERE nic = ?", "DELETE FROM tvknic_ext WHERE name = ?",
+        "DELETE FROM tvknic_ipv6 WHERE nic = ?",
         "DELETE FROM tvknic WHERE name = ?"})
     store.Prepare(sql).Bind(1, name).Run();
   if (portId)
@@ -258,24 +260,6 @@ void DeleteInterface(Store& store, const std::string& name) {
 namespace {
 
 const char* const kIpSchema = R"sql(
--- Further attributes of kernel interfaces: TSO segment size, receive queues,
--- the DHCP DNS and IPv6 switches, the IPv6 gateway ('::' for none), and the
--- opaque network of an interface attached to one.
-CREATE TABLE tvknic_ext(
-  name TEXT PRIMARY KEY REFERENCES tvknic(name) ON DELETE CASCADE,
-  tso_mss INTEGER NOT NULL DEFAULT 65535,
-  rx_queues INTEGER NOT NULL DEFAULT 1,
-  dhcp_dns INTEGER NOT NULL DEFAULT 0,
-  ipv6_enabled INTEGER NOT NULL DEFAULT 1,
-  ipv6_dhcp INTEGER NOT NULL DEFAULT 0,
-  ipv6_ra INTEGER NOT NULL DEFAULT 0,
-  ipv6_dhcp_dns INTEGER NOT NULL DEFAULT 0,
-  ipv6_gateway TEXT NOT NULL DEFAULT '::',
-  opaque_id TEXT NOT NULL DEFAULT '',
-  opaque_type TEXT NOT NULL DEFAULT '',
-  external_id TEXT NOT NULL DEFAULT ''
-) WITHOUT ROWID;
-
 -- Tags of kernel interfaces (tag types 1 to 12), in the order they were added.
 CREATE TABLE tvknic_tag(
   nic TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
@@ -326,7 +310,7 @@ void ImportNetstacks(const JsonObject& root, Store& store) {
     Statement insert = store.Prepare(
         "INSERT INTO netstack(key, ord, name, state, max_conn, cur_max_conn, ccalgo, ipv6, "
         "cur_ipv6, ecn, predefined) VALUES(?,?,?,?,?,?,?,?,?,?,?)");
-    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key), enabled ? 4660 : 0,
+    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key), enabled ? NetstackInstance::STATE_ENABLED : NetstackInstance::STATE_DISABLED,
                    maxConn, curMaxConn, cc, ipv6, curIpv6, ecn,
                    Contains(Ip::PredefinedNetstacks(), key));
     try {
@@ -336,8 +320,8 @@ void ImportNetstacks(const JsonObject& root, Store& store) {
     }
   }
   if (!haveDefault)
-    store.Prepare("INSERT INTO netstack(key, ord, name, predefined) VALUES(?, 0, ?, 0)")
-        .BindAll(Ip::kDefaultNetstack, Ip::kDefaultNetstack)
+    store.Prepare("INSERT INTO netstack(key, ord, name, state, predefined) VALUES(?, 0, ?, ?, 0)")
+        .BindAll(Ip::kDefaultNetstack, Ip::kDefaultNetstack, NetstackInstance::STATE_ENABLED)
         .Run();
 }
 
@@ -453,14 +437,14 @@ void ImportInterface(const JsonObject& nic, int ord, Store& store) {
 
   Ip::Attachment point = ReadConnectionPoint(nic, store);
   store
-      .Prepare("INSERT INTO tvknic_ext(name, tso_mss, rx_queues, dhcp_dns, ipv6_enabled, "
-               "ipv6_dhcp, ipv6_ra, ipv6_dhcp_dns, ipv6_gateway, opaque_id, opaque_type, "
-               "external_id) VALUES(?,?,?,?,?,?,?,?,?,?,?,?)")
-      .BindAll(name, nic.Int("tsoMss", 536, 65535, 65535), nic.Int("rxQueues", 1, 1000, 1),
+      .Prepare("UPDATE tvknic SET tso_mss = ?, rx_queues = ?, dhcp_dns = ?, ipv6_enabled = ?, "
+               "ipv6_dhcp = ?, ipv6_ra = ?, ipv6_dhcp_dns = ?, ipv6_gateway = ?, opaque_id = ?, "
+               "opaque_type = ?, external_id = ? WHERE name = ?")
+      .BindAll(nic.Int("tsoMss", 536, 65535, 65535), nic.Int("rxQueues", 1, 1000, 1),
                nic.Bool("dhcpDns", false), nic.Bool("ipv6Enabled", true), nic.Bool("dhcpv6", false),
                nic.Bool("routerAdv", false), nic.Bool("ipv6DhcpDns", false),
                Ipv6Address(ipv6Gateway).GetStringAddress(), point.opaqueId, point.opaqueType,
-               point.externalId)
+               point.externalId, name)
       .Run();
   if (point.kind != 0) {
     if (point.portsetId != 0 && mtu > 0) {
@@ -558,7 +542,7 @@ void ExportIp(ordered_json& host, Store& store) {
   while (rows.Step()) {
     stacks.push_back({{"key", rows.Text(0)},
                       {"name", rows.Text(1)},
-                      {"enabled", rows.Int(2) == 4660},
+                      {"enabled", rows.Int(2) == NetstackInstance::STATE_ENABLED},
                       {"maxConnections", rows.Int(3)},
                       {"currentMaxConnections", rows.Int(4)},
                       {"ccAlgorithm", rows.Text(5)},
@@ -573,11 +557,11 @@ void ExportIp(ordered_json& host, Store& store) {
   ordered_json nics = ordered_json::array();
   Statement nic = store.Prepare(
       "SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
-      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, coalesce(e.tso_mss, 65535), "
-      "coalesce(e.rx_queues, 1), coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), "
-      "coalesce(e.ipv6_dhcp, 0), coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), "
-      "coalesce(e.ipv6_gateway, '::'), t.port_id "
-      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name ORDER BY t.ord");
+      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, t.tso_mss, "
+      "t.rx_queues, t.dhcp_dns, t.ipv6_enabled, "
+      "t.ipv6_dhcp, t.ipv6_ra, t.ipv6_dhcp_dns, "
+      "t.ipv6_gateway, t.port_id "
+      "FROM tvknic t ORDER BY t.ord");
   while (nic.Step()) {
     std::string name = nic.Text(0);
     ordered_json out = ordered_json::object();

@@ -79,21 +79,28 @@ void RequireInterfaceOf(Store& store, const std::string& netstack, const std::st
     throw HostCtlException("Interface " + name + " is not on netstack " + netstack);
 }
 
-void StoreRoute(Store& store, const std::string& netstack, int family, const std::string& network,
-                int prefix, const std::string& gateway, const std::string& interfaceName,
+template <typename Address>
+void StoreRoute(Store& store, const std::string& netstack, int family, const Address& network,
+                int prefix, const Address& gateway, const std::string& interfaceName,
                 const std::string& source, bool system) {
-  store
-      .Prepare("INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, "
-               "interface, source) VALUES(?, ?, ?, ?, ?, ?, ?, ?)")
-      .BindAll(netstack, family, system, network, prefix, gateway, interfaceName, source)
-      .Run();
+  Statement insert =
+      store.Prepare("INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, "
+                    "interface, source) VALUES(?1, ?2, ?3, ?4, ?5, ?6, ?7, ?8)");
+  insert.BindAll(netstack, family, system);
+  BindAddress(insert, 4, network);
+  insert.Bind(5, prefix);
+  BindAddress(insert, 6, gateway);
+  insert.Bind(7, interfaceName).Bind(8, source).Run();
 }
 
+template <typename Address>
 bool RouteExists(Store& store, const std::string& netstack, int family, bool system,
-                 const std::string& network, int prefix) {
-  Statement row = store.Prepare("SELECT 1 FROM ipsvc_route WHERE netstack = ? AND family = ? AND "
-                                "system = ? AND network = ? AND prefix = ?");
-  row.BindAll(netstack, family, system, network, prefix);
+                 const Address& network, int prefix) {
+  Statement row = store.Prepare("SELECT 1 FROM ipsvc_route WHERE netstack = ?1 AND family = ?2 "
+                                "AND system = ?3 AND network = ?4 AND prefix = ?5");
+  row.BindAll(netstack, family, system);
+  BindAddress(row, 4, network);
+  row.Bind(5, prefix);
   return row.Step();
 }
 
@@ -132,6 +139,24 @@ std::string CanonicalIpv6(const std::string& text) {
 }
 
 } // namespace
+
+void BindAddress(Statement& statement, int index, const Ipv4Address& address) {
+  statement.Bind(index, static_cast<int64_t>(address.GetValue()));
+}
+
+void BindAddress(Statement& statement, int index, const Ipv6Address& address) {
+  statement.BindBlob(index, address.GetBytes().data(), 16);
+}
+
+Ipv4Address Ipv4Column(const Statement& row, int column) {
+  return Ipv4Address(static_cast<uint32_t>(row.Int(column)));
+}
+
+Ipv6Address Ipv6Column(const Statement& row, int column) {
+  std::array<uint8_t, 16> bytes{};
+  row.Blob(column, bytes.data(), bytes.size());
+  return Ipv6Address(bytes);
+}
 
 void RequireNetstack(Store& store, const std::string& netstack) {
   Statement row = store.Prepare("SELECT 1 FROM netstack WHERE key = ?");
@@ -224,13 +249,12 @@ void InsertRoute(Store& store, const std::string& netstack, const Ipv4Network& n
   } else {
     RequireInterfaceOf(store, netstack, interfaceName);
   }
-  std::string text = network.GetNetwork().GetStringAddress();
   int prefix = network.GetPrefixLength();
-  if (RouteExists(store, netstack, 4, system, text, prefix) ||
+  if (RouteExists(store, netstack, 4, system, network.GetNetwork(), prefix) ||
       (!system && IsConnectedNetwork(store, netstack, network)))
     throw HostCtlException("A route to " + Destination(network) + " already exists in netstack " +
                            netstack);
-  StoreRoute(store, netstack, 4, text, prefix, gateway.GetStringAddress(), interfaceName, source,
+  StoreRoute(store, netstack, 4, network.GetNetwork(), prefix, gateway, interfaceName, source,
              system);
 }
 
@@ -251,12 +275,11 @@ void InsertRoute(Store& store, const std::string& netstack, const Ipv6Network& n
   } else {
     RequireInterfaceOf(store, netstack, interfaceName);
   }
-  std::string text = network.GetAddress().GetStringAddress();
-  if (RouteExists(store, netstack, 6, system, text, prefix) ||
+  if (RouteExists(store, netstack, 6, system, network.GetAddress(), prefix) ||
       (!system && IsConnectedNetwork(store, netstack, network)))
     throw HostCtlException("A route to " + Destination(network) + " already exists in netstack " +
                            netstack);
-  StoreRoute(store, netstack, 6, text, prefix, gateway.GetStringAddress(), interfaceName, source,
+  StoreRoute(store, netstack, 6, network.GetAddress(), prefix, gateway, interfaceName, source,
              system);
 }
 
@@ -266,25 +289,22 @@ bool IsStoredRouteSource(const std::string& source) {
 }
 
 std::string ConfiguredGateway(Store& store, const std::string& netstack, int family) {
-  Statement row =
-      store.Prepare("SELECT gateway FROM ipsvc_gateway WHERE netstack = ? AND family = ?");
-  row.BindAll(netstack, family);
+  Statement row = store.Prepare(family == 4 ? "SELECT gateway4 FROM netstack WHERE key = ?"
+                                            : "SELECT gateway6 FROM netstack WHERE key = ?");
+  row.Bind(1, netstack);
   return row.Step() ? row.Text(0) : std::string();
 }
 
 void PutConfiguredGateway(Store& store, const std::string& netstack, int family,
                           const std::string& gateway) {
-  if (gateway.empty()) {
-    store.Prepare("DELETE FROM ipsvc_gateway WHERE netstack = ? AND family = ?")
-        .BindAll(netstack, family)
-        .Run();
-    return;
-  }
-  store
-      .Prepare("INSERT INTO ipsvc_gateway(netstack, family, gateway) VALUES(?, ?, ?) "
-               "ON CONFLICT(netstack, family) DO UPDATE SET gateway = excluded.gateway")
-      .BindAll(netstack, family, gateway)
-      .Run();
+  Statement update =
+      store.Prepare(family == 4 ? "UPDATE netstack SET gateway4 = ? WHERE key = ?"
+                                : "UPDATE netstack SET gateway6 = ? WHERE key = ?");
+  if (gateway.empty())
+    update.BindNull(1);
+  else
+    update.Bind(1, gateway);
+  update.Bind(2, netstack).Run();
 }
 
 void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>& servers,

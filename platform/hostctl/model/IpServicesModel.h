@@ -18,6 +18,14 @@
 
 namespace Model::IpSvc {
 
+/// Route addresses are kept as numbers: an IPv4 address as its value, an
+/// IPv6 address as its 16 bytes in network order (a blob).
+void BindAddress(Statement& statement, int index, const HostCtl::Network::Ipv4Address& address);
+void BindAddress(Statement& statement, int index, const HostCtl::Network::Ipv6Address& address);
+/// The address kept in \p column (the unspecified address for anything else).
+HostCtl::Network::Ipv4Address Ipv4Column(const Statement& row, int column);
+HostCtl::Network::Ipv6Address Ipv6Column(const Statement& row, int column);
+
 /// The key of the default netstack instance.
 inline constexpr const char* kDefaultNetstack = "defaultTcpipStack";
 

@@ -48,41 +48,19 @@ using TvkCtl::Network::RoutingInfoImpl;
 
 namespace {
 
-// The resolver tables, shared by the schema and the upgrade from layout 1.
-// The key columns come first: SQLite 3.40's integrity check misreads a
-// NOT NULL column placed between the key columns of a WITHOUT ROWID table.
-// The order index makes an addition at the end cost O(log n); the domain
-// index finds a domain in any case.
-#define DNS_TABLES                                                                                 \
-  "CREATE TABLE ipsvc_dns_server(\n"                                                               \
-  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
-  "  address TEXT NOT NULL,\n"                                                                     \
-  "  ord INTEGER NOT NULL,\n"                                                                      \
-  "  PRIMARY KEY(netstack, address)\n"                                                             \
-  ") WITHOUT ROWID;\n"                                                                             \
-  "CREATE UNIQUE INDEX ipsvc_dns_server_by_ord ON ipsvc_dns_server(netstack, ord);\n"              \
-  "CREATE TABLE ipsvc_dns_search(\n"                                                               \
-  "  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,\n"                         \
-  "  domain TEXT NOT NULL,\n"                                                                      \
-  "  ord INTEGER NOT NULL,\n"                                                                      \
-  "  PRIMARY KEY(netstack, domain)\n"                                                              \
-  ") WITHOUT ROWID;\n"                                                                             \
-  "CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);\n"              \
-  "CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE "          \
-  "NOCASE);\n"
-
 const char* const kIpServicesSchema = R"sql(
 -- Static and default routes of a netstack, one row each; the routes of the
 -- interfaces' own subnets are not stored (they follow the interfaces).
--- `source` is "user", "config" or "dhcp".
+-- Addresses are numbers: for family 4 the address's value, for family 6 its
+-- 16 bytes. `source` is "user", "config" or "dhcp".
 CREATE TABLE ipsvc_route(
   id INTEGER PRIMARY KEY,
   netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
-  family INTEGER NOT NULL CHECK(family IN (4, 6)),
-  system INTEGER NOT NULL DEFAULT 0,
-  network TEXT NOT NULL,
+  family INTEGER NOT NULL,
+  system INTEGER NOT NULL,
+  network NOT NULL,
   prefix INTEGER NOT NULL,
-  gateway TEXT NOT NULL,
+  gateway NOT NULL,
   interface TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
   source TEXT NOT NULL,
   UNIQUE(netstack, family, system, network, prefix)
@@ -90,16 +68,26 @@ CREATE TABLE ipsvc_route(
 CREATE INDEX ipsvc_route_list ON ipsvc_route(netstack, family, system, id);
 CREATE INDEX ipsvc_route_by_interface ON ipsvc_route(interface);
 
--- Configured default gateways of a netstack, per family.
-CREATE TABLE ipsvc_gateway(
+-- Resolver configuration of a netstack, in order. The key columns come
+-- first: SQLite 3.40's integrity check misreads a NOT NULL column placed
+-- between the key columns of a WITHOUT ROWID table. The order index makes an
+-- addition at the end cost O(log n); the domain index finds a domain in any
+-- case.
+CREATE TABLE ipsvc_dns_server(
   netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
-  family INTEGER NOT NULL,
-  gateway TEXT NOT NULL,
-  PRIMARY KEY(netstack, family)
+  address TEXT NOT NULL,
+  ord INTEGER NOT NULL,
+  PRIMARY KEY(netstack, address)
 ) WITHOUT ROWID;
-
--- Resolver configuration of a netstack, in order.
-)sql" DNS_TABLES R"sql(
+CREATE UNIQUE INDEX ipsvc_dns_server_by_ord ON ipsvc_dns_server(netstack, ord);
+CREATE TABLE ipsvc_dns_search(
+  netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
+  domain TEXT NOT NULL,
+  ord INTEGER NOT NULL,
+  PRIMARY KEY(netstack, domain)
+) WITHOUT ROWID;
+CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);
+CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE NOCASE);
 
 -- The hosts table; `aliases` are separated by blanks. System entries are the
 -- host's own and are not shown to or removable by users.
@@ -109,7 +97,7 @@ CREATE TABLE ipsvc_hosts(
   hostname TEXT NOT NULL,
   aliases TEXT NOT NULL DEFAULT '',
   comment TEXT NOT NULL DEFAULT '',
-  system INTEGER NOT NULL DEFAULT 0
+  system INTEGER NOT NULL
 );
 CREATE UNIQUE INDEX ipsvc_hosts_key ON ipsvc_hosts(address, hostname COLLATE NOCASE);
 CREATE INDEX ipsvc_hosts_list ON ipsvc_hosts(system, id);
@@ -118,13 +106,13 @@ CREATE INDEX ipsvc_hosts_list ON ipsvc_hosts(system, id);
 -- RoutingInfoImpl::NeighborTypeNames() and NeighborStateNames().
 CREATE TABLE ipsvc_neighbor(
   id INTEGER PRIMARY KEY,
-  family INTEGER NOT NULL CHECK(family IN (4, 6)),
+  family INTEGER NOT NULL,
   interface TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
   address TEXT NOT NULL,
   mac TEXT NOT NULL,
-  expiry INTEGER NOT NULL DEFAULT 0,
-  type INTEGER NOT NULL DEFAULT 1,
-  state INTEGER NOT NULL DEFAULT 0,
+  expiry INTEGER NOT NULL,
+  type INTEGER NOT NULL,
+  state INTEGER NOT NULL,
   UNIQUE(interface, family, address)
 );
 CREATE INDEX ipsvc_neighbor_by_address ON ipsvc_neighbor(family, address);
@@ -133,16 +121,16 @@ CREATE INDEX ipsvc_neighbor_by_address ON ipsvc_neighbor(family, address);
 CREATE TABLE ipsvc_connection(
   id INTEGER PRIMARY KEY,
   netstack TEXT NOT NULL REFERENCES netstack(key) ON DELETE CASCADE,
-  protocol INTEGER NOT NULL CHECK(protocol IN (0, 1, 2)),
+  protocol INTEGER NOT NULL,
   recv_queue INTEGER NOT NULL DEFAULT 0,
   send_queue INTEGER NOT NULL DEFAULT 0,
   local_address TEXT NOT NULL,
-  local_port INTEGER NOT NULL DEFAULT 0,
+  local_port INTEGER NOT NULL,
   foreign_address TEXT NOT NULL,
-  foreign_port INTEGER NOT NULL DEFAULT 0,
-  world_id INTEGER NOT NULL DEFAULT 0,
-  state INTEGER NOT NULL DEFAULT 0,
-  ccalgo TEXT NOT NULL DEFAULT ''
+  foreign_port INTEGER NOT NULL,
+  world_id INTEGER NOT NULL,
+  state INTEGER NOT NULL,
+  ccalgo TEXT NOT NULL
 );
 CREATE INDEX ipsvc_connection_list ON ipsvc_connection(netstack, protocol, id);
 
@@ -180,8 +168,8 @@ CREATE TABLE ipsvc_ipsec_sp(
   direction INTEGER NOT NULL,
   action INTEGER NOT NULL,
   mode INTEGER NOT NULL,
-  sa_name TEXT NOT NULL DEFAULT '',
-  sa_lost INTEGER NOT NULL DEFAULT 0
+  sa_name TEXT NOT NULL,
+  sa_lost INTEGER NOT NULL
 );
 CREATE INDEX ipsvc_ipsec_sp_by_sa ON ipsvc_ipsec_sp(sa_name);
 )sql";
@@ -449,10 +437,16 @@ void ExportIpServices(ordered_json& host, Store& store) {
                                   "source, system FROM ipsvc_route ORDER BY id");
   while (route.Step()) {
     ordered_json object = {{"netstack", route.Text(0)}};
-    bool isDefault = route.Int(3) == 0 && (route.Text(2) == "0.0.0.0" || route.Text(2) == "::");
-    object["network"] =
-        isDefault ? std::string("default") : route.Text(2) + "/" + std::to_string(route.Int(3));
-    object["gateway"] = route.Text(4);
+    bool ipv6 = route.Int(1) == 6;
+    auto address = [&](int column) {
+      return ipv6 ? IpSvc::Ipv6Column(route, column).GetStringAddress()
+                  : IpSvc::Ipv4Column(route, column).GetStringAddress();
+    };
+    // A route of prefix length 0 is a default route (host bits are refused).
+    object["network"] = route.Int(3) == 0
+                            ? std::string("default")
+                            : address(2) + "/" + std::to_string(route.Int(3));
+    object["gateway"] = address(4);
     object["interface"] = route.Text(5);
     object["source"] = route.Text(6);
     if (route.Bool(7))
@@ -462,12 +456,15 @@ void ExportIpServices(ordered_json& host, Store& store) {
   PutArray(host, "routes", std::move(routes));
 
   ordered_json gateways = ordered_json::array();
-  Statement gateway = store.Prepare("SELECT netstack, family, gateway FROM ipsvc_gateway ORDER BY "
-                                    "netstack, family");
+  Statement gateway = store.Prepare("SELECT key, gateway4, gateway6 FROM netstack WHERE gateway4 "
+                                    "IS NOT NULL OR gateway6 IS NOT NULL ORDER BY key");
   while (gateway.Step()) {
-    if (gateways.empty() || gateways.back()["netstack"] != gateway.Text(0))
-      gateways.push_back({{"netstack", gateway.Text(0)}});
-    gateways.back()[gateway.Int(1) == 4 ? "ipv4" : "ipv6"] = gateway.Text(2);
+    ordered_json object = {{"netstack", gateway.Text(0)}};
+    if (!gateway.IsNull(1))
+      object["ipv4"] = gateway.Text(1);
+    if (!gateway.IsNull(2))
+      object["ipv6"] = gateway.Text(2);
+    gateways.push_back(std::move(object));
   }
   PutArray(host, "defaultGateways", std::move(gateways));
 
@@ -584,21 +581,6 @@ void ExportIpServices(ordered_json& host, Store& store) {
   PutArray(host, "ipsecSPs", std::move(sps));
 }
 
-/// Layout 1 had the resolver tables' order column between their key
-/// columns, and no order index.
-void UpgradeIpServices(Store& store, int64_t from) {
-  if (from >= 2)
-    return;
-  store.Exec("ALTER TABLE ipsvc_dns_server RENAME TO ipsvc_dns_server_1;"
-             "ALTER TABLE ipsvc_dns_search RENAME TO ipsvc_dns_search_1;" DNS_TABLES
-             "INSERT INTO ipsvc_dns_server(netstack, address, ord) "
-             "  SELECT netstack, address, ord FROM ipsvc_dns_server_1;"
-             "INSERT INTO ipsvc_dns_search(netstack, domain, ord) "
-             "  SELECT netstack, domain, ord FROM ipsvc_dns_search_1;"
-             "DROP TABLE ipsvc_dns_server_1;"
-             "DROP TABLE ipsvc_dns_search_1;");
-}
-
 } // namespace
 
 extern const Part kIpServicesPart;
@@ -625,7 +607,6 @@ const Part kIpServicesPart = {
        "action", "mode", "saName"}}},
     ImportIpServices,
     ExportIpServices,
-    UpgradeIpServices,
 };
 
 } // namespace Model

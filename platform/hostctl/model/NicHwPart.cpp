@@ -1,7 +1,7 @@
 //===- model/NicHwPart.cpp - Hardware settings of the physical NICs -------===//
 //
 // The NIC hardware part keeps, per physical NIC, one JSON record of each
-// hardware kind in the side table pnic_hw (see NicHwModel.h). It imports the
+// hardware kind in the side table pnic_record (see NicHwModel.h). It imports the
 // keys of the same names inside each object of "nics" and exports them back.
 //
 //===----------------------------------------------------------------------===//
@@ -595,7 +595,7 @@ bool NicHwPnicExists(Store& store, const std::string& nic) {
 }
 
 bool LoadNicHwRecord(Store& store, const std::string& nic, const char* kind, std::string& text) {
-  Statement row = store.Prepare("SELECT value FROM pnic_hw WHERE nic = ? AND kind = ?");
+  Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = ?");
   row.BindAll(nic, kind);
   if (!row.Step())
     return false;
@@ -606,7 +606,7 @@ bool LoadNicHwRecord(Store& store, const std::string& nic, const char* kind, std
 void SaveNicHwRecord(Store& store, const std::string& nic, const char* kind,
                      const ordered_json& record) {
   store
-      .Prepare("INSERT INTO pnic_hw(nic, kind, value) VALUES(?, ?, ?) "
+      .Prepare("INSERT INTO pnic_record(nic, kind, value) VALUES(?, ?, ?) "
                "ON CONFLICT(nic, kind) DO UPDATE SET value = excluded.value")
       .BindAll(nic, kind, record.dump())
       .Run();
@@ -617,10 +617,12 @@ void SaveNicHwRecord(Store& store, const std::string& nic, const char* kind,
 namespace {
 
 const char* const kNicHwSchema = R"sql(
--- Hardware records of physical NICs, one JSON document per NIC and kind
--- (offload, coalesce, ring, netqueue, softwareSimulation, eeprom, registers,
--- selfTest, dcb, hwCap). A NIC without a record of a kind lacks the feature.
-CREATE TABLE pnic_hw(
+-- Records of physical NICs, one JSON document per NIC and kind: the generic
+-- information ("info") and counters ("stats") of the NIC part, and the
+-- hardware kinds (offload, coalesce, ring, netqueue, softwareSimulation,
+-- eeprom, registers, selfTest, dcb, hwCap). A NIC without a hardware record
+-- of a kind lacks the feature.
+CREATE TABLE pnic_record(
   nic TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
   kind TEXT NOT NULL,
   value TEXT NOT NULL,

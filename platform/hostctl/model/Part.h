@@ -42,10 +42,6 @@ struct Part {
   /// Adds the part's keys to \p host (inside a read transaction). Parts
   /// export in list order and may add keys to objects made by earlier parts.
   void (*exportFn)(nlohmann::ordered_json& host, Store& store);
-  /// Brings the part's tables from layout \p from to the current one
-  /// (inside the upgrade's write transaction), or null when it has nothing
-  /// to change.
-  void (*upgrade)(Store& store, int64_t from) = nullptr;
 };
 
 /// All parts, in import order.

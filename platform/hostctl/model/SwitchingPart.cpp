@@ -34,9 +34,9 @@ const char* const kSwitchingSchema = R"sql(
 -- the form of the host description (a field is present when it is set).
 CREATE TABLE vswitch(
   portset_id INTEGER PRIMARY KEY REFERENCES portset(id) ON DELETE CASCADE,
-  cdp INTEGER NOT NULL DEFAULT 1,
-  beacon_interval INTEGER NOT NULL DEFAULT 1,
-  beacon_threshold INTEGER NOT NULL DEFAULT 3,
+  cdp INTEGER NOT NULL,
+  beacon_interval INTEGER NOT NULL,
+  beacon_threshold INTEGER NOT NULL,
   teaming TEXT NOT NULL,
   security TEXT NOT NULL,
   shaping TEXT NOT NULL,
@@ -63,18 +63,6 @@ CREATE TABLE dvswitch(
   branded INTEGER NOT NULL,
   lacp_on_dpu INTEGER NOT NULL
 );
-
--- Names and LACP settings of distributed ports.
-CREATE TABLE dvport_lacp(
-  portset_id INTEGER NOT NULL,
-  port_key TEXT NOT NULL,
-  name TEXT NOT NULL DEFAULT '',
-  lacp_enabled INTEGER NOT NULL DEFAULT 0,
-  lacp_mode INTEGER NOT NULL DEFAULT 0,
-  uplink_pg_key TEXT NOT NULL DEFAULT '',
-  PRIMARY KEY(portset_id, port_key),
-  FOREIGN KEY(portset_id, port_key) REFERENCES dvport(portset_id, port_key) ON DELETE CASCADE
-) WITHOUT ROWID;
 
 -- Link aggregation groups of distributed switches.
 CREATE TABLE lag(
@@ -411,14 +399,11 @@ void ImportDistributed(const JsonObject& root, Store& store, const char* key, co
       bool isUplink = port.Bool("uplink", false) || port.Has("nic");
       store
           .Prepare("INSERT INTO dvport(portset_id, port_key, portgroup_key, connection_id, "
-                   "is_uplink, ord) VALUES(?, ?, ?, ?, ?, ?)")
+                   "is_uplink, ord, name, lacp_enabled, lacp_mode, uplink_pg_key) "
+                   "VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")
           .BindAll(id, portKey, port.String("portgroupKey", ""),
-                   port.Int("connectionId", 0, 4294967295, 0), isUplink, portOrd++)
-          .Run();
-      store
-          .Prepare("INSERT INTO dvport_lacp(portset_id, port_key, name, lacp_enabled, lacp_mode, "
-                   "uplink_pg_key) VALUES(?, ?, ?, ?, ?, ?)")
-          .BindAll(id, portKey, port.String("name", ""), port.Bool("lacpEnabled", false),
+                   port.Int("connectionId", 0, 4294967295, 0), isUplink, portOrd++,
+                   port.String("name", ""), port.Bool("lacpEnabled", false),
                    port.Int("lacpMode", 0, 2, 0), port.String("uplinkPortgroupKey", ""))
           .Run();
       if (port.Has("nic")) {
@@ -440,6 +425,11 @@ void ImportSwitching(const ordered_json& host, Store& store) {
   int ord = 0;
   ImportDistributed(root, store, "dvswitches", "dvs", ord);
   ImportDistributed(root, store, "opaqueSwitches", "opaque", ord);
+  // The NIC part checked that a NIC that turns VLAN statistics on is an
+  // uplink of a switch of the description; its uplink row exists now.
+  for (const JsonObject& nic : root.Objects("nics"))
+    if (nic.Bool("vlanStats", false))
+      store.Prepare("UPDATE uplink SET vlan_stats = 1 WHERE nic = ?").Bind(1, nic.String("name")).Run();
 }
 
 std::vector<std::string> UplinksOf(Store& store, int64_t id) {
@@ -566,11 +556,10 @@ void ExportDistributed(ordered_json& host, Store& store, const char* key, const 
     dvs["uplinks"] = UplinksOf(store, id);
     ordered_json ports = ordered_json::array();
     Statement port = store.Prepare(
-        "SELECT d.port_key, d.portgroup_key, d.connection_id, d.is_uplink, l.name, "
-        "l.lacp_enabled, l.lacp_mode, l.uplink_pg_key, "
+        "SELECT d.port_key, d.portgroup_key, d.connection_id, d.is_uplink, d.name, "
+        "d.lacp_enabled, d.lacp_mode, d.uplink_pg_key, "
         "(SELECT client FROM port WHERE portset_id = d.portset_id AND dvport_key = d.port_key "
-        " AND client_kind = 'uplink') FROM dvport d LEFT JOIN dvport_lacp l "
-        "ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+        " AND client_kind = 'uplink') FROM dvport d "
         "WHERE d.portset_id = ? ORDER BY d.ord");
     port.Bind(1, id);
     while (port.Step()) {

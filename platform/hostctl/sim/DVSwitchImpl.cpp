@@ -117,8 +117,7 @@ std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
       clients[users.Text(0)].push_back(users.Text(1));
     std::vector<std::unique_ptr<DVPort>> ports;
     Statement rows = store.Prepare(
-        "SELECT d.port_key, d.connection_id, coalesce(l.name, ''), d.portgroup_key FROM dvport d "
-        "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+        "SELECT d.port_key, d.connection_id, d.name, d.portgroup_key FROM dvport d "
         "WHERE d.portset_id = ? ORDER BY d.ord");
     rows.Bind(1, data_.id);
     while (rows.Step()) {
@@ -180,9 +179,8 @@ std::vector<DVUplinkPortLacp> DVSwitchImpl::GetUplinkPortLacp() const {
   return store.Read([&] {
     std::vector<DVUplinkPortLacp> ports;
     Statement rows = store.Prepare(
-        "SELECT d.port_key, coalesce(l.lacp_enabled, 0), coalesce(l.lacp_mode, 0), "
-        "coalesce(l.uplink_pg_key, '') FROM dvport d LEFT JOIN dvport_lacp l ON l.portset_id = "
-        "d.portset_id AND l.port_key = d.port_key WHERE d.portset_id = ? AND d.is_uplink = 1 "
+        "SELECT d.port_key, d.lacp_enabled, d.lacp_mode, "
+        "d.uplink_pg_key FROM dvport d WHERE d.portset_id = ? AND d.is_uplink = 1 "
         "ORDER BY d.ord");
     rows.Bind(1, data_.id);
     while (rows.Step())
@@ -297,8 +295,7 @@ std::optional<DVPortRow> FindDVPort(Store& store, const DVPortParam& param) {
   if (!portset)
     return std::nullopt;
   Statement row = store.Prepare(
-      "SELECT d.portgroup_key, d.connection_id, coalesce(l.name, '') FROM dvport d "
-      "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+      "SELECT d.portgroup_key, d.connection_id, d.name FROM dvport d "
       "WHERE d.portset_id = ? AND d.port_key = ?");
   row.BindAll(portset->id, param.portId);
   if (!row.Step())

@@ -72,7 +72,7 @@ void ModuleImpl::Unload() {
         .Run();
     // Unloading the firewall module takes its filters with it.
     if (name_ == HostCtl::System::FirewallModuleName)
-      store.Prepare("UPDATE fw_state SET filters_active = 0 WHERE id = 1").Run();
+      store.Prepare("UPDATE setting SET value = 0 WHERE key = 'firewall.filtersActive'").Run();
   });
   stale_ = true;
 }

@@ -237,7 +237,7 @@ void PnicImpl::GetPnicStats(PnicStats& stats) const {
   store.CheckFault("GetPnicStats", data_.name);
   Data();
   std::string text = store.Read([&] {
-    Statement row = store.Prepare("SELECT counters FROM pnic_stats WHERE nic = ?");
+    Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'stats'");
     row.Bind(1, data_.name);
     return row.Step() ? row.Text(0) : std::string("{}");
   });

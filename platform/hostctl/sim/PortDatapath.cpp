@@ -59,14 +59,14 @@ Ipv4Address PortImpl::GetPortClientIpv4Address() const {
   Store& store = Store::Host();
   store.CheckFault("GetPortClientIpv4Address", PortObject(data_.id));
   return store.Read([&] {
-    const char* sql = nullptr;
-    if (data_.clientKind == "vm")
-      sql = "SELECT ipv4 FROM vm_port WHERE port_id = ?";
-    else if (data_.clientKind == "tvknic")
-      sql = "SELECT ipv4_address FROM tvknic WHERE port_id = ?";
-    else
+    if (data_.clientKind == "vm") {
+      Statement row = store.Prepare("SELECT ipv4 FROM port WHERE id = ? AND ipv4 IS NOT NULL");
+      row.Bind(1, data_.id);
+      return row.Step() ? Ipv4Address(static_cast<uint32_t>(row.Int(0))) : Ipv4Address();
+    }
+    if (data_.clientKind != "tvknic")
       return Ipv4Address();
-    Statement row = store.Prepare(sql);
+    Statement row = store.Prepare("SELECT ipv4_address FROM tvknic WHERE port_id = ?");
     row.Bind(1, data_.id);
     if (!row.Step() || !Ipv4Address::IsValidAddress(row.Text(0)))
       return Ipv4Address();
@@ -78,7 +78,7 @@ std::string PortImpl::GetSchedTeamUplink() const {
   Store& store = Store::Host();
   store.CheckFault("GetSchedTeamUplink", PortObject(data_.id));
   return store.Read([&] {
-    Statement row = store.Prepare("SELECT team_uplink FROM vm_port WHERE port_id = ?");
+    Statement row = store.Prepare("SELECT coalesce(team_uplink, '') FROM port WHERE id = ?");
     row.Bind(1, data_.id);
     return row.Step() ? row.Text(0) : std::string();
   });
@@ -119,7 +119,7 @@ void PortImpl::GetPortStats(HostCtl::Network::PortStats& stats) const {
   Store& store = Store::Host();
   store.CheckFault("GetPortStats", PortObject(data_.id));
   store.Read([&] {
-    Statement row = store.Prepare("SELECT rx_bytes, tx_bytes FROM port_counter WHERE port_id = ?");
+    Statement row = store.Prepare("SELECT rx_bytes, tx_bytes FROM port WHERE id = ?");
     row.Bind(1, data_.id);
     stats = {};
     if (row.Step()) {
@@ -135,7 +135,7 @@ void PortImpl::GetPacketStats(HostCtl::Network::PacketStats& stats) const {
   store.Read([&] {
     Statement row = store.Prepare(
         "SELECT tx_packets, tx_multicast, tx_broadcast, rx_packets, rx_multicast, rx_broadcast, "
-        "tx_dropped, rx_dropped FROM port_counter WHERE port_id = ?");
+        "tx_dropped, rx_dropped FROM port WHERE id = ?");
     row.Bind(1, data_.id);
     stats = {};
     if (row.Step()) {

@@ -7,6 +7,9 @@
 #include "model/IpServicesModel.h"
 #include "model/Store.h"
 
+#include <optional>
+#include <type_traits>
+
 namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
@@ -119,10 +122,10 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
         "AND family = 4 AND system = ? ORDER BY id");
     rows.BindAll(netstack_, system);
     while (rows.Step()) {
-      Ipv4Network network(Ipv4Address(rows.Text(0)),
+      Ipv4Network network(IpSvc::Ipv4Column(rows, 0),
                           Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));
       sources_.emplace(SourceKey(network), rows.Text(4));
-      routes.emplace_back(network, Ipv4Address(rows.Text(2)), rows.Text(3));
+      routes.emplace_back(network, IpSvc::Ipv4Column(rows, 2), rows.Text(3));
     }
   });
   return routes;
@@ -140,12 +143,14 @@ void RoutingInfoImpl::RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Ad
   store.CheckFault("RemoveTarvikRoute", netstack_);
   store.Write([&] {
     IpSvc::RequireNetstack(store, netstack_);
-    store
-        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
-                 "network = ? AND prefix = ? AND gateway = ?")
-        .BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength(),
-                 gateway.GetStringAddress())
-        .Run();
+    Statement remove =
+        store.Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 "
+                      "AND network = ? AND prefix = ? AND gateway = ?");
+    remove.Bind(1, netstack_);
+    IpSvc::BindAddress(remove, 2, network.GetNetwork());
+    remove.Bind(3, network.GetPrefixLength());
+    IpSvc::BindAddress(remove, 4, gateway);
+    remove.Run();
     if (store.Changes() == 0)
       throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV4_ROUTE) +
                              " through " + gateway.GetStringAddress() + " in netstack " +
@@ -155,13 +160,19 @@ void RoutingInfoImpl::RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Ad
 
 namespace {
 
-/// The gateway of the ordinary default route of one family, or "".
-std::string RunningGateway(Store& store, const std::string& netstack, int family) {
-  Statement row = store.Prepare(
-      "SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? AND system = 0 AND "
-      "prefix = 0 AND network IN ('0.0.0.0', '::')");
+/// The gateway of the ordinary default route of one family, if any (a route
+/// of prefix length 0 has network 0.0.0.0 or ::, since host bits are refused).
+template <typename Address>
+std::optional<Address> RunningGateway(Store& store, const std::string& netstack, int family) {
+  Statement row = store.Prepare("SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? "
+                                "AND system = 0 AND prefix = 0");
   row.BindAll(netstack, family);
-  return row.Step() ? row.Text(0) : std::string();
+  if (!row.Step())
+    return std::nullopt;
+  if constexpr (std::is_same_v<Address, Ipv4Address>)
+    return IpSvc::Ipv4Column(row, 0);
+  else
+    return IpSvc::Ipv6Column(row, 0);
 }
 
 } // namespace
@@ -169,11 +180,10 @@ std::string RunningGateway(Store& store, const std::string& netstack, int family
 Ipv4Address RoutingInfoImpl::GetTvKernelDefaultGateway() {
   Store& store = Store::Host();
   store.CheckFault("GetTvKernelDefaultGateway", netstack_);
-  std::string gateway = store.Read([&] {
+  return store.Read([&] {
     IpSvc::RequireNetstack(store, netstack_);
-    return RunningGateway(store, netstack_, 4);
+    return RunningGateway<Ipv4Address>(store, netstack_, 4).value_or(Ipv4Address());
   });
-  return gateway.empty() ? Ipv4Address() : Ipv4Address(gateway);
 }
 
 Ipv4Address RoutingInfoImpl::GetTvKernelConfigDefaultGateway() {
@@ -193,7 +203,7 @@ void RoutingInfoImpl::SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool
     IpSvc::RequireNetstack(store, netstack_);
     store
         .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
-                 "network = '0.0.0.0' AND prefix = 0")
+                 "prefix = 0")
         .Bind(1, netstack_)
         .Run();
     bool clear = gateway.GetValue() == 0;
@@ -214,7 +224,9 @@ std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network)
     Statement row = store.Prepare(
         "SELECT source FROM ipsvc_route WHERE netstack = ? AND family = 4 AND network = ? AND "
         "prefix = ? ORDER BY system");
-    row.BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength());
+    row.Bind(1, netstack_);
+    IpSvc::BindAddress(row, 2, network.GetNetwork());
+    row.Bind(3, network.GetPrefixLength());
     if (row.Step())
       return row.Text(0);
     Statement nics = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack "
@@ -262,8 +274,8 @@ std::vector<Ipv6Route> RoutingInfoImpl::GetCurrentIpv6TarvikRoutes(PortsetGetTyp
         "family = 6 AND system = ? ORDER BY id");
     rows.BindAll(netstack_, system);
     while (rows.Step())
-      routes.emplace_back(Ipv6Network(Ipv6Address(rows.Text(0)), static_cast<int>(rows.Int(1))),
-                          Ipv6Address(rows.Text(2)), rows.Text(3));
+      routes.emplace_back(Ipv6Network(IpSvc::Ipv6Column(rows, 0), static_cast<int>(rows.Int(1))),
+                          IpSvc::Ipv6Column(rows, 2), rows.Text(3));
   });
   return routes;
 }
@@ -285,12 +297,14 @@ void RoutingInfoImpl::RemoveIpv6TarvikRoute(const Ipv6Network& network,
   store.Write([&] {
     IpSvc::RequireNetstack(store, netstack_);
     IpSvc::RequireIpv6(store, netstack_);
-    store
-        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
-                 "network = ? AND prefix = ? AND gateway = ?")
-        .BindAll(netstack_, network.GetAddress().GetStringAddress(), network.GetNetmask(),
-                 gateway.GetStringAddress())
-        .Run();
+    Statement remove =
+        store.Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 "
+                      "AND network = ? AND prefix = ? AND gateway = ?");
+    remove.Bind(1, netstack_);
+    IpSvc::BindAddress(remove, 2, network.GetAddress());
+    remove.Bind(3, network.GetNetmask());
+    IpSvc::BindAddress(remove, 4, gateway);
+    remove.Run();
     if (store.Changes() == 0)
       throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV6_ROUTE) +
                              " through " + gateway.GetStringAddress() + " in netstack " +
@@ -301,13 +315,12 @@ void RoutingInfoImpl::RemoveIpv6TarvikRoute(const Ipv6Network& network,
 Ipv6Address RoutingInfoImpl::GetIpv6TvKernelDefaultGateway() {
   Store& store = Store::Host();
   store.CheckFault("GetIpv6TvKernelDefaultGateway", netstack_);
-  std::string gateway = store.Read([&] {
+  return store.Read([&] {
     IpSvc::RequireNetstack(store, netstack_);
     if (!IpSvc::Ipv6Running(store, netstack_))
-      return std::string();
-    return RunningGateway(store, netstack_, 6);
+      return Ipv6Address();
+    return RunningGateway<Ipv6Address>(store, netstack_, 6).value_or(Ipv6Address());
   });
-  return gateway.empty() ? Ipv6Address() : Ipv6Address(gateway);
 }
 
 Ipv6Address RoutingInfoImpl::GetIpv6TvKernelConfigDefaultGateway() {
@@ -330,7 +343,7 @@ void RoutingInfoImpl::SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) 
       IpSvc::RequireIpv6(store, netstack_);
     store
         .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
-                 "network = '::' AND prefix = 0")
+                 "prefix = 0")
         .Bind(1, netstack_)
         .Run();
     if (!clear)

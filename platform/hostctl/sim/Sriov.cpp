@@ -2,7 +2,7 @@
 //
 // The SR-IOV operations of the network root: the NICs with SR-IOV enabled,
 // their virtual functions and the counters of one virtual function, over the
-// sriov_nic and sriov_vf tables of model/NicPart.cpp.
+// sriov column of pnic and the sriov_vf table of model/NicPart.cpp.
 //
 //===----------------------------------------------------------------------===//
 #include "sim/NetworkInfoImpl.h"
@@ -26,7 +26,7 @@ using namespace HostCtl::Network;
 namespace {
 
 bool IsSriovNic(Store& store, const std::string& name) {
-  Statement row = store.Prepare("SELECT 1 FROM sriov_nic WHERE nic = ?");
+  Statement row = store.Prepare("SELECT 1 FROM pnic WHERE name = ? AND sriov = 1");
   row.Bind(1, name);
   return row.Step();
 }
@@ -48,7 +48,7 @@ std::vector<std::unique_ptr<Pnic>> NetworkInfoImpl::GetSriovNics() {
   return store.Read([&] {
     std::vector<std::string> names;
     Statement rows = store.Prepare(
-        "SELECT pnic.name FROM pnic JOIN sriov_nic ON sriov_nic.nic = pnic.name ORDER BY ord");
+        "SELECT name FROM pnic WHERE sriov = 1 ORDER BY ord");
     while (rows.Step())
       names.push_back(rows.Text(0));
     std::vector<std::unique_ptr<Pnic>> nics;

@@ -21,8 +21,8 @@ namespace {
 
 /// Columns read for each listed interface, in the order ReadRow expects.
 #define TVKNIC_COLUMNS                                                                             \
-  "t.name, t.netstack, t.mac, t.mtu, coalesce(e.tso_mss, 65535), coalesce(e.rx_queues, 1), "       \
-  "t.enabled, coalesce(t.port_id, 0) FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name "
+  "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "       \
+  "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
 
 std::unique_ptr<TvkNic> ReadRow(const Statement& row) {
   TvkNicData data;

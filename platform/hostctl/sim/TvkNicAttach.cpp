@@ -213,9 +213,9 @@ TvKernelNicInfoImpl::AddTvKernelNic(ConnectionPoint* point, const std::string& n
         .BindAll(nicName, ord.Int(0), netstack, macText, nicMtu)
         .Run();
     store
-        .Prepare("INSERT INTO tvknic_ext(name, rx_queues, opaque_id, opaque_type, external_id) "
-                 "VALUES(?, ?, ?, ?, ?)")
-        .BindAll(nicName, rxQueues != 0 ? rxQueues : 1u, a.opaqueId, a.opaqueType, a.externalId)
+        .Prepare("UPDATE tvknic SET rx_queues = ?, opaque_id = ?, opaque_type = ?, external_id = ? "
+                 "WHERE name = ?")
+        .BindAll(rxQueues != 0 ? rxQueues : 1u, a.opaqueId, a.opaqueType, a.externalId, nicName)
         .Run();
     int64_t portId = Ip::AttachPort(store, nicName, a, std::nullopt);
     store.Prepare("UPDATE tvknic SET port_id = ? WHERE name = ?").BindAll(portId, nicName).Run();

@@ -32,8 +32,8 @@ using Model::Store;
 /// Reads the attributes of interface \p name; false when there is none.
 bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
   Statement row = store.Prepare(
-      "SELECT t.netstack, t.mac, t.mtu, coalesce(e.tso_mss, 65535), coalesce(e.rx_queues, 1), "
-      "t.enabled, coalesce(t.port_id, 0) FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name "
+      "SELECT t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "
+      "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
       "WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
@@ -53,9 +53,9 @@ bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
 IpConfig ReadIpConfig(Store& store, const std::string& name, bool running) {
   Statement row = store.Prepare(
       "SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
-      "coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), coalesce(e.ipv6_dhcp, 0), "
-      "coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), coalesce(e.ipv6_gateway, '::') "
-      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
+      "t.dhcp_dns, t.ipv6_enabled, t.ipv6_dhcp, "
+      "t.ipv6_ra, t.ipv6_dhcp_dns, t.ipv6_gateway "
+      "FROM tvknic t WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Tarvik network interface " + name + " does not exist");
@@ -143,9 +143,8 @@ void WriteIpConfig(Store& store, const std::string& name, const IpConfig& config
                Ipv4Address(netmask).GetStringAddress(), Ipv4Address(gateway).GetStringAddress(),
                name)
       .Run();
-  store.Prepare("INSERT OR IGNORE INTO tvknic_ext(name) VALUES(?)").Bind(1, name).Run();
   store
-      .Prepare("UPDATE tvknic_ext SET dhcp_dns = ?, ipv6_enabled = ?, ipv6_dhcp = ?, ipv6_ra = ?, "
+      .Prepare("UPDATE tvknic SET dhcp_dns = ?, ipv6_enabled = ?, ipv6_dhcp = ?, ipv6_ra = ?, "
                "ipv6_dhcp_dns = ?, ipv6_gateway = ? WHERE name = ?")
       .BindAll(config.GetDhcpDns(), config.GetUseIpv6(), config.GetUseIpv6Dhcp(),
                config.GetUseIpv6RouterAdvertised(), config.GetIpv6DhcpDns(),
