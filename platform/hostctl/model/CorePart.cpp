@@ -124,7 +124,9 @@ CREATE TABLE dvport(
 -- A VM's port has its adapter's IPv4 address (a number) and the uplink the
 -- team scheduler chose ('' for none); other ports have them NULL. The
 -- counters are unsigned 64-bit values kept in signed columns, all NULL for
--- a port whose counters were never set (they read as zero).
+-- a port whose counters were never set (they read as zero). `filters` holds
+-- the port's packet filters in the host's order with their counters, a JSON
+-- array in the form of the host description (NULL for none).
 CREATE TABLE port(
   id INTEGER PRIMARY KEY,
   portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
@@ -137,7 +139,8 @@ CREATE TABLE port(
   ipv4 INTEGER,
   team_uplink TEXT,
   rx_bytes, tx_bytes, rx_packets, rx_multicast, rx_broadcast,
-  tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped
+  tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped,
+  filters TEXT
 );
 CREATE INDEX port_by_portset ON port(portset_id);
 CREATE INDEX port_by_portgroup ON port(portgroup_id);
@@ -176,7 +179,6 @@ CREATE TABLE tvknic(
   opaque_type TEXT NOT NULL DEFAULT '',
   external_id TEXT NOT NULL DEFAULT ''
 ) WITHOUT ROWID;
-CREATE INDEX tvknic_by_netstack ON tvknic(netstack);
 
 -- IPv6 addresses of kernel interfaces, in order.
 CREATE TABLE tvknic_ipv6(

@@ -47,29 +47,12 @@ CREATE TABLE vm_port_mac(
   PRIMARY KEY(port_id, ord)
 ) WITHOUT ROWID;
 
--- Packet filters of a port, in the host's order, with their counters.
-CREATE TABLE port_filter(
-  port_id INTEGER NOT NULL REFERENCES port(id) ON DELETE CASCADE,
-  ord INTEGER NOT NULL,
-  name TEXT NOT NULL,
-  sort_key TEXT NOT NULL DEFAULT '',
-  active INTEGER NOT NULL DEFAULT 1,
-  direction INTEGER NOT NULL DEFAULT 0,
-  extended INTEGER NOT NULL DEFAULT 0,
-  packets_in INTEGER NOT NULL DEFAULT 0, packets_out INTEGER NOT NULL DEFAULT 0,
-  packets_dropped INTEGER NOT NULL DEFAULT 0, packets_filtered INTEGER NOT NULL DEFAULT 0,
-  packets_faulted INTEGER NOT NULL DEFAULT 0, packets_queued INTEGER NOT NULL DEFAULT 0,
-  packets_injected INTEGER NOT NULL DEFAULT 0, packet_errors INTEGER NOT NULL DEFAULT 0,
-  PRIMARY KEY(port_id, ord)
-) WITHOUT ROWID;
-
 -- ENS contexts: the switch they serve (none when NULL) and their NUMA node.
 CREATE TABLE ens_lcore(
   id INTEGER PRIMARY KEY,
   portset_id INTEGER REFERENCES portset(id) ON DELETE SET NULL,
   affinity INTEGER NOT NULL DEFAULT 0
 );
-CREATE INDEX ens_lcore_by_portset ON ens_lcore(portset_id);
 )sql";
 
 void ImportEns(const JsonObject& root, Store& store) {
@@ -138,8 +121,7 @@ const char* const kCounterKeys[] = {"rxBytes",     "txBytes",   "rxPackets",   "
                                     "rxBroadcast", "txPackets", "txMulticast", "txBroadcast",
                                     "rxDropped",   "txDropped"};
 
-/// Description keys of a filter's counters, in the column order of
-/// port_filter.
+/// Description keys of a filter's counters.
 const char* const kFilterCounterKeys[] = {"packetsIn",       "packetsOut",     "packetsDropped",
                                           "packetsFiltered", "packetsFaulted", "packetsQueued",
                                           "packetsInjected", "packetErrors"};
@@ -273,20 +255,20 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
     }
     counters.Run();
   }
-  int filterOrd = 0;
+  // The packet filters, in the host's order, as the description has them.
+  ordered_json filters = ordered_json::array();
   for (const JsonObject& filter : port.Objects("filters")) {
-    Statement insertFilter = store.Prepare(
-        "INSERT INTO port_filter(port_id, ord, name, sort_key, active, direction, extended, "
-        "packets_in, packets_out, packets_dropped, packets_filtered, packets_faulted, "
-        "packets_queued, packets_injected, packet_errors) VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
-    insertFilter.BindAll(id, filterOrd++, filter.String("name"), filter.String("sortKey", ""),
-                         filter.Bool("active", true), filter.Bool("outbound", false),
-                         filter.Bool("extended", false));
-    int column = 8;
+    ordered_json f = {{"name", filter.String("name")},
+                      {"sortKey", filter.String("sortKey", "")},
+                      {"active", filter.Bool("active", true)},
+                      {"outbound", filter.Bool("outbound", false)},
+                      {"extended", filter.Bool("extended", false)}};
     for (const char* key : kFilterCounterKeys)
-      insertFilter.Bind(column++, ReadCounter(filter, key));
-    insertFilter.Run();
+      f[key] = static_cast<uint64_t>(ReadCounter(filter, key));
+    filters.push_back(std::move(f));
   }
+  if (!filters.empty())
+    store.Prepare("UPDATE port SET filters = ? WHERE id = ?").BindAll(filters.dump(), id).Run();
 }
 
 void ImportVms(const JsonObject& root, Store& store) {
@@ -338,23 +320,10 @@ ordered_json ExportPort(Store& store, const Statement& port) {
       stats[key] = static_cast<uint64_t>(counters.Int(column++));
     out["stats"] = std::move(stats);
   }
-  ordered_json filters = ordered_json::array();
-  Statement filter = store.Prepare(
-      "SELECT name, sort_key, active, direction, extended, packets_in, packets_out, "
-      "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
-      "packet_errors FROM port_filter WHERE port_id = ? ORDER BY ord");
+  Statement filter = store.Prepare("SELECT filters FROM port WHERE id = ?");
   filter.Bind(1, id);
-  while (filter.Step()) {
-    ordered_json f = {{"name", filter.Text(0)},
-                      {"sortKey", filter.Text(1)},
-                      {"active", filter.Bool(2)},
-                      {"outbound", filter.Bool(3)},
-                      {"extended", filter.Bool(4)}};
-    int column = 5;
-    for (const char* key : kFilterCounterKeys)
-      f[key] = static_cast<uint64_t>(filter.Int(column++));
-    filters.push_back(std::move(f));
-  }
+  ordered_json filters = filter.Step() && !filter.IsNull(0) ? ordered_json::parse(filter.Text(0))
+                                                             : ordered_json::array();
   out["filters"] = std::move(filters);
   return out;
 }

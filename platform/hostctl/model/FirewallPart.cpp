@@ -75,7 +75,6 @@ CREATE TABLE fw_allowed_ip(
   ord INTEGER NOT NULL,
   PRIMARY KEY(ruleset, kind, value)
 ) WITHOUT ROWID;
-CREATE INDEX fw_allowed_ip_by_ord ON fw_allowed_ip(ruleset, ord);
 )sql";
 
 /// A word of the description and the code it stands for.

@@ -267,7 +267,6 @@ CREATE TABLE tvknic_tag(
   ord INTEGER NOT NULL,
   PRIMARY KEY(nic, tag)
 ) WITHOUT ROWID;
-CREATE INDEX tvknic_tag_by_tag ON tvknic_tag(tag);
 
 -- Multicast group memberships of kernel interfaces.
 CREATE TABLE tvknic_mcast(

@@ -132,7 +132,6 @@ CREATE TABLE ipsvc_connection(
   state INTEGER NOT NULL,
   ccalgo TEXT NOT NULL
 );
-CREATE INDEX ipsvc_connection_list ON ipsvc_connection(netstack, protocol, id);
 
 -- Worlds of host services (the VMs are in the core table `world`).
 CREATE TABLE ipsvc_world(id INTEGER PRIMARY KEY, name TEXT NOT NULL);
@@ -171,7 +170,6 @@ CREATE TABLE ipsvc_ipsec_sp(
   sa_name TEXT NOT NULL,
   sa_lost INTEGER NOT NULL
 );
-CREATE INDEX ipsvc_ipsec_sp_by_sa ON ipsvc_ipsec_sp(sa_name);
 )sql";
 
 /// Runs \p fn, turning a refusal of the host into an ImportError on \p key.

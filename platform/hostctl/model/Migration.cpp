@@ -74,10 +74,10 @@ void CopyUnchanged(Store& store) {
       "setting",          "portset",         "uplink",           "portgroup",
       "world",            "tvknic_ipv6",     "sriov_vf",         "pnic_attachment",
       "pnic_vlan_counter", "vswitch",        "portgroup_policy", "dvswitch",
-      "lag",              "lacp_nic",        "tvknic_tag",       "tvknic_mcast",
+      "tvknic_tag",       "tvknic_mcast",
       "ipsvc_dns_server", "ipsvc_dns_search", "ipsvc_hosts",     "ipsvc_neighbor",
       "ipsvc_connection", "ipsvc_world",     "ipsvc_ipsec_sa",   "ipsvc_ipsec_sp",
-      "vm_port_mac",      "port_filter",     "ens_lcore",        "kmodule",
+      "vm_port_mac",      "ens_lcore",       "kmodule",
       "fw_ruleset",       "fw_rule",         "fw_allowed_ip"};
   for (const char* table : kTables) {
     std::string columns;
@@ -212,6 +212,91 @@ void CopyNicInfo(Store& store) {
   }
 }
 
+/// The LACP state of the NICs of each LAG becomes the LAG's "nics" document.
+void CopyLags(Store& store) {
+  store.Exec("INSERT INTO lag(portset_id, lag_id, name, mode, load_balancing, uplink_count, ord, "
+             "nics) SELECT portset_id, lag_id, name, mode, load_balancing, uplink_count, ord, "
+             "'[]' FROM layout2_lag");
+  Statement row = store.Prepare(
+      "SELECT portset_id, lag_id, nic, state, actor_port_number, actor_port_priority, "
+      "actor_admin_key, actor_oper_key, actor_state, partner_age, partner_port_number, "
+      "partner_port_priority, partner_oper_key, partner_state, partner_device_id, rx_lacpdus, "
+      "tx_lacpdus, rx_errors, tx_errors FROM layout2_lacp_nic ORDER BY portset_id, lag_id, ord");
+  enum { kPortset, kLag, kNic, kState, kFirstField };
+  static const char* const kFields[] = {
+      "actorPortNumber",     "actorPortPriority", "actorAdminKey", "actorOperKey",
+      "actorState",          "partnerAge",        "partnerPortNumber",
+      "partnerPortPriority", "partnerOperKey",    "partnerState"};
+  static const char* const kCounters[] = {"rxLacpdus", "txLacpdus", "rxErrors", "txErrors"};
+  Statement update = store.Prepare("UPDATE lag SET nics = ? WHERE portset_id = ? AND lag_id = ?");
+  auto flush = [&](int64_t portset, int64_t lag, nlohmann::ordered_json& nics) {
+    update.BindAll(nics.dump(), portset, lag);
+    update.Run();
+    update.Reset();
+    nics = nlohmann::ordered_json::array();
+  };
+  nlohmann::ordered_json nics = nlohmann::ordered_json::array();
+  int64_t portset = -1;
+  int64_t lag = -1;
+  while (row.Step()) {
+    if (row.Int(kPortset) != portset || row.Int(kLag) != lag) {
+      if (!nics.empty())
+        flush(portset, lag, nics);
+      portset = row.Int(kPortset);
+      lag = row.Int(kLag);
+    }
+    nlohmann::ordered_json nic = {{"name", row.Text(kNic)}, {"state", row.Text(kState)}};
+    int column = kFirstField;
+    for (const char* field : kFields)
+      nic[field] = row.Int(column++);
+    nic["partnerDeviceId"] = row.Text(column++);
+    for (const char* counter : kCounters)
+      nic[counter] = static_cast<uint64_t>(row.Int(column++));
+    nics.push_back(std::move(nic));
+  }
+  if (!nics.empty())
+    flush(portset, lag, nics);
+}
+
+/// The packet filters of each port become the port's "filters" document.
+void CopyFilters(Store& store) {
+  Statement row = store.Prepare(
+      "SELECT port_id, name, sort_key, active, direction, extended, packets_in, packets_out, "
+      "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
+      "packet_errors FROM layout2_port_filter ORDER BY port_id, ord");
+  enum { kPort, kName, kSortKey, kActive, kOutbound, kExtended, kFirstCounter };
+  static const char* const kCounters[] = {"packetsIn",       "packetsOut",     "packetsDropped",
+                                          "packetsFiltered", "packetsFaulted", "packetsQueued",
+                                          "packetsInjected", "packetErrors"};
+  Statement update = store.Prepare("UPDATE port SET filters = ? WHERE id = ?");
+  auto flush = [&](int64_t port, nlohmann::ordered_json& filters) {
+    update.BindAll(filters.dump(), port);
+    update.Run();
+    update.Reset();
+    filters = nlohmann::ordered_json::array();
+  };
+  nlohmann::ordered_json filters = nlohmann::ordered_json::array();
+  int64_t port = -1;
+  while (row.Step()) {
+    if (row.Int(kPort) != port) {
+      if (!filters.empty())
+        flush(port, filters);
+      port = row.Int(kPort);
+    }
+    nlohmann::ordered_json filter = {{"name", row.Text(kName)},
+                                     {"sortKey", row.Text(kSortKey)},
+                                     {"active", row.Bool(kActive)},
+                                     {"outbound", row.Bool(kOutbound)},
+                                     {"extended", row.Bool(kExtended)}};
+    int column = kFirstCounter;
+    for (const char* counter : kCounters)
+      filter[counter] = static_cast<uint64_t>(row.Int(column++));
+    filters.push_back(std::move(filter));
+  }
+  if (!filters.empty())
+    flush(port, filters);
+}
+
 /// The IPv4 address of each VM port becomes a number.
 void CopyVmPortAddresses(Store& store) {
   Statement row = store.Prepare("SELECT port_id, ipv4 FROM layout2_vm_port");
@@ -270,6 +355,8 @@ void MigrateLayout(Store& store, int64_t from) {
   CopyMerged(store);
   CopyFaults(store);
   CopyNicInfo(store);
+  CopyLags(store);
+  CopyFilters(store);
   CopyVmPortAddresses(store);
   CopyRoutes(store);
   for (const std::string& table :

@@ -114,7 +114,6 @@ CREATE TABLE pnic_attachment(
   ord INTEGER NOT NULL,
   UNIQUE(trunk, vlan_id)
 ) WITHOUT ROWID;
-CREATE INDEX pnic_attachment_by_trunk ON pnic_attachment(trunk, ord);
 
 -- Per-VLAN packet counters of an uplink NIC; they are shown while VLAN
 -- statistics are enabled on the uplink (uplink.vlan_stats).

@@ -64,7 +64,9 @@ CREATE TABLE dvswitch(
   lacp_on_dpu INTEGER NOT NULL
 );
 
--- Link aggregation groups of distributed switches.
+-- Link aggregation groups of distributed switches. `nics` holds the LACP
+-- runtime state of each NIC of the LAG, a JSON array of objects in the form
+-- of the host description (bit 1 of actorState is the short timeout).
 CREATE TABLE lag(
   portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
   lag_id INTEGER NOT NULL,
@@ -73,35 +75,10 @@ CREATE TABLE lag(
   load_balancing INTEGER NOT NULL,
   uplink_count INTEGER NOT NULL,
   ord INTEGER NOT NULL,
+  nics TEXT NOT NULL,
   PRIMARY KEY(portset_id, lag_id)
 ) WITHOUT ROWID;
 
--- LACP runtime state of each NIC of a LAG. Bit 1 of actor_state is the
--- short timeout.
-CREATE TABLE lacp_nic(
-  portset_id INTEGER NOT NULL,
-  lag_id INTEGER NOT NULL,
-  nic TEXT NOT NULL,
-  ord INTEGER NOT NULL,
-  state TEXT NOT NULL,
-  actor_port_number INTEGER NOT NULL,
-  actor_port_priority INTEGER NOT NULL,
-  actor_admin_key INTEGER NOT NULL,
-  actor_oper_key INTEGER NOT NULL,
-  actor_state INTEGER NOT NULL,
-  partner_age INTEGER NOT NULL,
-  partner_port_number INTEGER NOT NULL,
-  partner_port_priority INTEGER NOT NULL,
-  partner_oper_key INTEGER NOT NULL,
-  partner_state INTEGER NOT NULL,
-  partner_device_id TEXT NOT NULL,
-  rx_lacpdus INTEGER NOT NULL,
-  tx_lacpdus INTEGER NOT NULL,
-  rx_errors INTEGER NOT NULL,
-  tx_errors INTEGER NOT NULL,
-  PRIMARY KEY(portset_id, lag_id, nic),
-  FOREIGN KEY(portset_id, lag_id) REFERENCES lag(portset_id, lag_id) ON DELETE CASCADE
-) WITHOUT ROWID;
 )sql";
 
 /// CDP status names of standard switches, by index.
@@ -312,13 +289,8 @@ void ImportLags(Store& store, const JsonObject& dvs, int64_t id) {
     std::string name = lag.String("name");
     if (name.empty() || name.size() >= sizeof(HostCtl::Network::LagConfig::lagName))
       lag.Fail("name", "expected 1 to 63 bytes");
-    store
-        .Prepare("INSERT INTO lag(portset_id, lag_id, name, mode, load_balancing, uplink_count, "
-                 "ord) VALUES(?, ?, ?, ?, ?, ?, ?)")
-        .BindAll(id, lagId, name, mode == "active" ? 1 : 2, lag.Int("loadBalancing", 0, 20, 0),
-                 lag.Int("uplinkCount", 0, 32, 0), ord++)
-        .Run();
-    int nicOrd = 0;
+    ordered_json nics = ordered_json::array();
+    std::set<std::string> names;
     for (const JsonObject& nic : lag.Objects("nics")) {
       std::string nicName = nic.String("name");
       if (nicName.empty() || nicName.size() >= 32)
@@ -329,25 +301,22 @@ void ImportLags(Store& store, const JsonObject& dvs, int64_t id) {
       std::string device = nic.String("partnerDeviceId", "");
       if (device.size() >= 32)
         nic.Fail("partnerDeviceId", "expected at most 31 bytes");
-      Statement insert = store.Prepare(
-          "INSERT INTO lacp_nic(portset_id, lag_id, nic, ord, state, actor_port_number, "
-          "actor_port_priority, actor_admin_key, actor_oper_key, actor_state, partner_age, "
-          "partner_port_number, partner_port_priority, partner_oper_key, partner_state, "
-          "partner_device_id, rx_lacpdus, tx_lacpdus, rx_errors, tx_errors) "
-          "VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
-      insert.BindAll(id, lagId, nicName, nicOrd++, state);
-      int column = 6;
-      for (const LacpField& field : kLacpFields)
-        insert.Bind(column++, nic.Int(field.key, 0, field.max, 0));
-      insert.Bind(column++, device);
-      for (const char* counter : kLacpCounters)
-        insert.Bind(column++, static_cast<int64_t>(nic.Counter(counter)));
-      try {
-        insert.Run();
-      } catch (const HostCtl::Lib::HostCtlException&) {
+      if (!names.insert(nicName).second)
         nic.Fail("name", "\"" + nicName + "\" is listed twice in the LAG");
-      }
+      ordered_json entry = {{"name", nicName}, {"state", state}};
+      for (const LacpField& field : kLacpFields)
+        entry[field.key] = nic.Int(field.key, 0, field.max, 0);
+      entry["partnerDeviceId"] = device;
+      for (const char* counter : kLacpCounters)
+        entry[counter] = nic.Counter(counter);
+      nics.push_back(std::move(entry));
     }
+    store
+        .Prepare("INSERT INTO lag(portset_id, lag_id, name, mode, load_balancing, uplink_count, "
+                 "ord, nics) VALUES(?, ?, ?, ?, ?, ?, ?, ?)")
+        .BindAll(id, lagId, name, mode == "active" ? 1 : 2, lag.Int("loadBalancing", 0, 20, 0),
+                 lag.Int("uplinkCount", 0, 32, 0), ord++, nics.dump())
+        .Run();
   }
 }
 
@@ -495,8 +464,8 @@ void ExportStandard(ordered_json& host, Store& store) {
 
 ordered_json ExportLags(Store& store, int64_t id) {
   ordered_json lags = ordered_json::array();
-  Statement rows = store.Prepare("SELECT lag_id, name, mode, load_balancing, uplink_count FROM "
-                                 "lag WHERE portset_id = ? ORDER BY ord");
+  Statement rows = store.Prepare("SELECT lag_id, name, mode, load_balancing, uplink_count, nics "
+                                 "FROM lag WHERE portset_id = ? ORDER BY ord");
   rows.Bind(1, id);
   while (rows.Step()) {
     ordered_json lag = ordered_json::object();
@@ -505,25 +474,7 @@ ordered_json ExportLags(Store& store, int64_t id) {
     lag["mode"] = rows.Int(2) == 2 ? "passive" : "active";
     lag["loadBalancing"] = rows.Int(3);
     lag["uplinkCount"] = rows.Int(4);
-    ordered_json nics = ordered_json::array();
-    Statement nic = store.Prepare(
-        "SELECT nic, state, actor_port_number, actor_port_priority, actor_admin_key, "
-        "actor_oper_key, actor_state, partner_age, partner_port_number, partner_port_priority, "
-        "partner_oper_key, partner_state, partner_device_id, rx_lacpdus, tx_lacpdus, rx_errors, "
-        "tx_errors FROM lacp_nic WHERE portset_id = ? AND lag_id = ? ORDER BY ord");
-    nic.BindAll(id, rows.Int(0));
-    while (nic.Step()) {
-      ordered_json entry = ordered_json::object();
-      entry["name"] = nic.Text(0);
-      entry["state"] = nic.Text(1);
-      int column = 2;
-      for (const LacpField& field : kLacpFields)
-        entry[field.key] = nic.Int(column++);
-      entry["partnerDeviceId"] = nic.Text(column++);
-      for (const char* counter : kLacpCounters)
-        entry[counter] = static_cast<uint64_t>(nic.Int(column++));
-      nics.push_back(std::move(entry));
-    }
+    ordered_json nics = ordered_json::parse(rows.Text(5));
     lag["nics"] = std::move(nics);
     lags.push_back(std::move(lag));
   }

@@ -2,6 +2,8 @@
 #include "HostCtl/Lib.h"
 #include "sim/SwitchingStore.h"
 
+#include <nlohmann/json.hpp>
+
 #include <cstring>
 #include <map>
 
@@ -194,43 +196,36 @@ void DVSwitchImpl::GetLacpInfo(std::vector<LacpLagInfo>& lags) const {
   Store& store = Store::Host();
   store.CheckFault("GetLacpInfo", data_.name);
   store.Read([&] {
-    Statement rows =
-        store.Prepare("SELECT lag_id, name, mode FROM lag WHERE portset_id = ? ORDER BY ord");
+    Statement rows = store.Prepare(
+        "SELECT lag_id, name, mode, nics FROM lag WHERE portset_id = ? ORDER BY ord");
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       LacpLagInfo& lag = lags.emplace_back();
       lag.lagId = static_cast<uint32_t>(rows.Int(0));
       lag.mode = static_cast<uint32_t>(rows.Int(2));
       CopyText(lag.lagName, rows.Text(1));
-      Statement nics = store.Prepare(
-          "SELECT nic, state, actor_port_number, actor_port_priority, actor_admin_key, "
-          "actor_oper_key, actor_state, partner_age, partner_port_number, "
-          "partner_port_priority, partner_oper_key, partner_state, partner_device_id, "
-          "rx_lacpdus, tx_lacpdus, rx_errors, tx_errors FROM lacp_nic "
-          "WHERE portset_id = ? AND lag_id = ? ORDER BY ord");
-      nics.BindAll(data_.id, rows.Int(0));
-      while (nics.Step()) {
+      for (const nlohmann::json& entry : nlohmann::json::parse(rows.Text(3))) {
         auto nic = std::make_unique<LacpNicInfo>();
         std::memset(nic.get(), 0, sizeof(LacpNicInfo));
-        CopyText(nic->nicName, nics.Text(0));
-        CopyText(nic->state, nics.Text(1));
-        nic->actorPortNumber = static_cast<uint16_t>(nics.Int(2));
-        nic->actorPortPriority = static_cast<uint16_t>(nics.Int(3));
-        nic->actorAdminKey = static_cast<uint16_t>(nics.Int(4));
-        nic->actorOperKey = static_cast<uint16_t>(nics.Int(5));
-        nic->actorState = static_cast<uint8_t>(nics.Int(6));
+        CopyText(nic->nicName, entry.at("name").get<std::string>());
+        CopyText(nic->state, entry.at("state").get<std::string>());
+        nic->actorPortNumber = entry.at("actorPortNumber").get<uint16_t>();
+        nic->actorPortPriority = entry.at("actorPortPriority").get<uint16_t>();
+        nic->actorAdminKey = entry.at("actorAdminKey").get<uint16_t>();
+        nic->actorOperKey = entry.at("actorOperKey").get<uint16_t>();
+        nic->actorState = entry.at("actorState").get<uint8_t>();
         CopyText(nic->actorFlags, FlagLetters(nic->actorState));
-        nic->partnerAge = static_cast<uint32_t>(nics.Int(7));
-        nic->partnerPortNumber = static_cast<uint16_t>(nics.Int(8));
-        nic->partnerPortPriority = static_cast<uint16_t>(nics.Int(9));
-        nic->partnerOperKey = static_cast<uint16_t>(nics.Int(10));
-        nic->partnerState = static_cast<uint8_t>(nics.Int(11));
-        CopyText(nic->partnerDeviceId, nics.Text(12));
+        nic->partnerAge = entry.at("partnerAge").get<uint32_t>();
+        nic->partnerPortNumber = entry.at("partnerPortNumber").get<uint16_t>();
+        nic->partnerPortPriority = entry.at("partnerPortPriority").get<uint16_t>();
+        nic->partnerOperKey = entry.at("partnerOperKey").get<uint16_t>();
+        nic->partnerState = entry.at("partnerState").get<uint8_t>();
+        CopyText(nic->partnerDeviceId, entry.at("partnerDeviceId").get<std::string>());
         CopyText(nic->partnerFlags, FlagLetters(nic->partnerState));
-        nic->rxLacpdus = static_cast<uint64_t>(nics.Int(13));
-        nic->txLacpdus = static_cast<uint64_t>(nics.Int(14));
-        nic->rxErrors = static_cast<uint64_t>(nics.Int(15));
-        nic->txErrors = static_cast<uint64_t>(nics.Int(16));
+        nic->rxLacpdus = entry.at("rxLacpdus").get<uint64_t>();
+        nic->txLacpdus = entry.at("txLacpdus").get<uint64_t>();
+        nic->rxErrors = entry.at("rxErrors").get<uint64_t>();
+        nic->txErrors = entry.at("txErrors").get<uint64_t>();
         lag.nics.push_back(std::move(nic));
       }
     }
@@ -242,27 +237,28 @@ void DVSwitchImpl::SetLacpTimeout(uint32_t lagId, bool shortTimeout, const std::
   store.CheckFault("SetLacpTimeout", data_.name);
   store.Write([&] {
     std::string displayName = ReadDvs(store, data_).displayName;
-    Statement lag = store.Prepare("SELECT 1 FROM lag WHERE portset_id = ? AND lag_id = ?");
+    Statement lag = store.Prepare("SELECT nics FROM lag WHERE portset_id = ? AND lag_id = ?");
     lag.BindAll(data_.id, static_cast<int64_t>(lagId));
     if (!lag.Step())
       throw HostCtlException("Unable to set the LACP timeout: " + displayName +
                              " has no LAG with ID " + std::to_string(lagId));
-    if (shortTimeout)
-      store
-          .Prepare("UPDATE lacp_nic SET actor_state = actor_state | 2 WHERE portset_id = ? AND "
-                   "lag_id = ? AND (? = '' OR nic = ?)")
-          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
-          .Run();
-    else
-      store
-          .Prepare("UPDATE lacp_nic SET actor_state = actor_state & ~2 WHERE portset_id = ? AND "
-                   "lag_id = ? AND (? = '' OR nic = ?)")
-          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
-          .Run();
-    if (!nicName.empty() && store.Changes() == 0)
+    // Bit 1 of the actor state is the short timeout.
+    nlohmann::ordered_json nics = nlohmann::ordered_json::parse(lag.Text(0));
+    bool found = false;
+    for (nlohmann::ordered_json& nic : nics) {
+      if (!nicName.empty() && nic.at("name") != nicName)
+        continue;
+      found = true;
+      uint64_t state = nic.at("actorState").get<uint64_t>();
+      nic["actorState"] = shortTimeout ? (state | 2u) : (state & ~uint64_t{2});
+    }
+    if (!nicName.empty() && !found)
       throw HostCtlException("Unable to set the LACP timeout: " + nicName +
                              " is not a NIC of LAG " + std::to_string(lagId) + " on " +
                              displayName);
+    store.Prepare("UPDATE lag SET nics = ? WHERE portset_id = ? AND lag_id = ?")
+        .BindAll(nics.dump(), data_.id, static_cast<int64_t>(lagId))
+        .Run();
   });
 }
 

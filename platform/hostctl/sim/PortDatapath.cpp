@@ -9,6 +9,7 @@
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
 #include "model/Store.h"
+#include <nlohmann/json.hpp>
 #include "sim/PnicImpl.h"
 #include "sim/Switching.h"
 #include "sim/WorldImpl.h"
@@ -89,26 +90,25 @@ std::vector<std::unique_ptr<FilterStats>> PortImpl::GetFilterStats() const {
   store.CheckFault("GetFilterStats", PortObject(data_.id));
   return store.Read([&] {
     std::vector<std::unique_ptr<FilterStats>> filters;
-    Statement rows = store.Prepare(
-        "SELECT name, sort_key, active, direction, extended, packets_in, packets_out, "
-        "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
-        "packet_errors FROM port_filter WHERE port_id = ? ORDER BY ord");
-    rows.Bind(1, data_.id);
-    while (rows.Step()) {
+    Statement row = store.Prepare("SELECT filters FROM port WHERE id = ? AND filters IS NOT NULL");
+    row.Bind(1, data_.id);
+    if (!row.Step())
+      return filters;
+    for (const nlohmann::json& entry : nlohmann::json::parse(row.Text(0))) {
       auto filter = std::make_unique<FilterStats>();
-      filter->name = rows.Text(0);
-      filter->sortKey = rows.Text(1);
-      filter->active = rows.Bool(2);
-      filter->direction = rows.Bool(3);
-      filter->extended = rows.Bool(4);
-      filter->packetsIn = Counter(rows, 5);
-      filter->packetsOut = Counter(rows, 6);
-      filter->packetsDropped = Counter(rows, 7);
-      filter->packetsFiltered = Counter(rows, 8);
-      filter->packetsFaulted = Counter(rows, 9);
-      filter->packetsQueued = Counter(rows, 10);
-      filter->packetsInjected = Counter(rows, 11);
-      filter->packetErrors = Counter(rows, 12);
+      filter->name = entry.at("name").get<std::string>();
+      filter->sortKey = entry.at("sortKey").get<std::string>();
+      filter->active = entry.at("active").get<bool>();
+      filter->direction = entry.at("outbound").get<bool>();
+      filter->extended = entry.at("extended").get<bool>();
+      filter->packetsIn = entry.at("packetsIn").get<uint64_t>();
+      filter->packetsOut = entry.at("packetsOut").get<uint64_t>();
+      filter->packetsDropped = entry.at("packetsDropped").get<uint64_t>();
+      filter->packetsFiltered = entry.at("packetsFiltered").get<uint64_t>();
+      filter->packetsFaulted = entry.at("packetsFaulted").get<uint64_t>();
+      filter->packetsQueued = entry.at("packetsQueued").get<uint64_t>();
+      filter->packetsInjected = entry.at("packetsInjected").get<uint64_t>();
+      filter->packetErrors = entry.at("packetErrors").get<uint64_t>();
       filters.push_back(std::move(filter));
     }
     return filters;
