@@ -26,6 +26,7 @@
 #include <fcntl.h>
 #include <new>
 #include <string>
+#include <string_view>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <utility>
@@ -186,6 +187,124 @@ void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) 
   CreateHost(path, [&](Model::Store& store) { Model::GenerateHost(store, sizes); });
 }
 
+/// The command line, parsed once for every command.
+struct Options {
+  std::vector<std::string> positional;   ///< Arguments that are no options.
+  std::string host;                      ///< --host.
+  std::string profile = "demo";          ///< --profile.
+  Model::HostSizes sizes;                ///< generate's sizes.
+  bool sized = false;                    ///< A size was given.
+  int64_t maxImport = kDefaultMaxImport; ///< --max-size.
+  bool limited = false;                  ///< --max-size was given.
+};
+
+int RunInit(const Options& options) {
+  const std::string& path = options.positional[0];
+  if (Exists(path))
+    return Fail("the file " + path + " exists already");
+  WriteHost(path, Model::Profile(options.profile));
+  return 0;
+}
+
+int RunGenerate(const Options& options) {
+  const std::string& path = options.positional[0];
+  if (Exists(path))
+    return Fail("the file " + path + " exists already");
+  WriteGeneratedHost(path, options.sizes);
+  return 0;
+}
+
+int RunImport(const Options& options) {
+  std::string text;
+  if (std::string problem = ReadLimited(options.positional[0], options.maxImport, text);
+      !problem.empty())
+    return Fail(problem);
+  nlohmann::ordered_json doc = Model::ParseDescription(text);
+  text = std::string();
+  WriteHost(HostPath(options.host), doc);
+  return 0;
+}
+
+/// A write to standard output failed (errno tells why).
+struct OutputFailed {};
+
+int RunExport(const Options& options) {
+  Model::Store store(HostPath(options.host));
+  try {
+    Model::WriteHostDescription(store, [](std::string_view text) {
+      if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size())
+        throw OutputFailed{};
+    });
+    if (std::fflush(stdout) != 0)
+      throw OutputFailed{};
+  } catch (const OutputFailed&) {
+    return Fail(std::string("cannot write the output: ") + std::strerror(errno));
+  }
+  return 0;
+}
+
+int RunProfile(const Options& options) {
+  return Write(Model::Profile(options.positional[0]).dump(2) + "\n");
+}
+
+/// One command of ostrahost (Usage.cpp describes them to the user).
+struct Subcommand {
+  const char* name;       ///< First word of the command line.
+  std::size_t positional; ///< Arguments it takes.
+  const char* misuse;     ///< Its refusal of another number of arguments.
+  int (*run)(const Options& options);
+};
+
+const Subcommand kSubcommands[] = {
+    {"init", 1, "init takes one PATH", RunInit},
+    {"generate", 1, "generate takes one PATH", RunGenerate},
+    {"import", 1, "import takes one FILE", RunImport},
+    {"export", 0, "export takes no arguments", RunExport},
+    {"profile", 1, "profile takes one NAME", RunProfile},
+};
+
+/// Reads the options after the command word into \p options; "" on success,
+/// else the refusal.
+std::string ParseOptions(const std::vector<std::string>& args, Options& options) {
+  Model::HostSizes& sizes = options.sizes;
+  const std::pair<const char*, int64_t*> sizeOptions[] = {
+      {"--routes", &sizes.routes},
+      {"--portgroups", &sizes.portgroups},
+      {"--vms", &sizes.vms},
+      {"--ports-per-vm", &sizes.portsPerVm},
+      {"--neighbours", &sizes.neighbours},
+      {"--hosts-entries", &sizes.hostsEntries},
+  };
+  for (std::size_t i = 1; i < args.size(); ++i) {
+    const std::string& arg = args[i];
+    int64_t* size = nullptr;
+    for (const auto& [name, target] : sizeOptions)
+      if (arg == name)
+        size = target;
+    bool takesValue = size || arg == "--host" || arg == "--profile" || arg == "--max-size";
+    if (takesValue && i + 1 >= args.size())
+      return "option " + arg + " requires a value";
+    if (size) {
+      if (!ParseCount(args[++i], *size))
+        return "option " + arg + " takes a count, not \"" + args[i] + "\"";
+      options.sized = true;
+    } else if (arg == "--host" || arg == "--profile") {
+      (arg == "--host" ? options.host : options.profile) = args[++i];
+    } else if (arg == "--max-size") {
+      options.maxImport = ParseSize(args[++i]);
+      if (options.maxImport < 0)
+        return "option --max-size takes a size in bytes with an optional K, M or G, not \"" +
+               args[i] + "\"";
+      options.limited = true;
+    } else if (arg.size() > 1 && arg[0] == '-' && arg != "-") {
+      return "unknown option " + arg;
+    } else {
+      options.positional.push_back(arg);
+    }
+  }
+  return "";
+}
+
 } // namespace
 
 int main(int argc, char** argv) {
@@ -201,96 +320,24 @@ int main(int argc, char** argv) {
     std::fwrite(text.data(), 1, text.size(), stdout);
     return 0;
   }
-  std::string command = args[0];
-  std::vector<std::string> positional;
-  std::string host, profile = "demo";
-  Model::HostSizes sizes;
-  const std::pair<const char*, int64_t*> sizeOptions[] = {
-      {"--routes", &sizes.routes},
-      {"--portgroups", &sizes.portgroups},
-      {"--vms", &sizes.vms},
-      {"--ports-per-vm", &sizes.portsPerVm},
-      {"--neighbours", &sizes.neighbours},
-      {"--hosts-entries", &sizes.hostsEntries},
-  };
-  bool sized = false;
-  int64_t maxImport = kDefaultMaxImport;
-  bool limited = false;
-  for (std::size_t i = 1; i < args.size(); ++i) {
-    const std::string& arg = args[i];
-    int64_t* size = nullptr;
-    for (const auto& [name, target] : sizeOptions)
-      if (arg == name)
-        size = target;
-    if (size) {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      if (!ParseCount(args[++i], *size))
-        return Usage("option " + arg + " takes a count, not \"" + args[i] + "\"");
-      sized = true;
-    } else if (arg == "--host" || arg == "--profile") {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      (arg == "--host" ? host : profile) = args[++i];
-    } else if (arg == "--max-size") {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      maxImport = ParseSize(args[++i]);
-      if (maxImport < 0)
-        return Usage("option --max-size takes a size in bytes with an optional K, M or G, not \"" +
-                     args[i] + "\"");
-      limited = true;
-    } else if (arg.size() > 1 && arg[0] == '-' && arg != "-") {
-      return Usage("unknown option " + arg);
-    } else {
-      positional.push_back(arg);
-    }
-  }
-  if (sized && command != "generate")
+  const std::string& command = args[0];
+  Options options;
+  if (std::string refusal = ParseOptions(args, options); !refusal.empty())
+    return Usage(refusal);
+  if (options.sized && command != "generate")
     return Usage("only generate takes sizes");
-  if (limited && command != "import")
+  if (options.limited && command != "import")
     return Usage("only import takes --max-size");
-  try {
-    if (command == "init") {
-      if (positional.size() != 1)
-        return Usage("init takes one PATH");
-      if (Exists(positional[0]))
-        return Fail("the file " + positional[0] + " exists already");
-      WriteHost(positional[0], Model::Profile(profile));
-      return 0;
-    }
-    if (command == "generate") {
-      if (positional.size() != 1)
-        return Usage("generate takes one PATH");
-      if (Exists(positional[0]))
-        return Fail("the file " + positional[0] + " exists already");
-      WriteGeneratedHost(positional[0], sizes);
-      return 0;
-    }
-    if (command == "import") {
-      if (positional.size() != 1)
-        return Usage("import takes one FILE");
-      std::string text;
-      if (std::string problem = ReadLimited(positional[0], maxImport, text); !problem.empty())
-        return Fail(problem);
-      nlohmann::ordered_json doc = Model::ParseDescription(text);
-      text = std::string();
-      WriteHost(HostPath(host), doc);
-      return 0;
-    }
-    if (command == "export") {
-      if (!positional.empty())
-        return Usage("export takes no arguments");
-      Model::Store store(HostPath(host));
-      std::string text = Model::ExportHost(store).dump(2) + "\n";
-      return Write(text);
-    }
-    if (command == "profile") {
-      if (positional.size() != 1)
-        return Usage("profile takes one NAME");
-      return Write(Model::Profile(positional[0]).dump(2) + "\n");
-    }
+  const Subcommand* subcommand = nullptr;
+  for (const Subcommand& candidate : kSubcommands)
+    if (command == candidate.name)
+      subcommand = &candidate;
+  if (!subcommand)
     return Usage("unknown command " + command);
+  if (options.positional.size() != subcommand->positional)
+    return Usage(subcommand->misuse);
+  try {
+    return subcommand->run(options);
   } catch (const Model::ImportError& e) {
     return Fail(std::string("invalid host description: ") + e.what());
   } catch (const HostCtl::Lib::HostCtlException& e) {

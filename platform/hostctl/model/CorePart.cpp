@@ -239,7 +239,7 @@ void ImportCore(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportCore(ordered_json& host, Store& store) {
+void ExportCore(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ordered_json nics = ordered_json::array();
   Statement rows = store.Prepare(
       "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, speed, "

@@ -304,8 +304,8 @@ ordered_json ExportPort(Store& store, const Statement& port) {
       store.Prepare("SELECT ipv4, team_uplink FROM port WHERE id = ? AND ipv4 IS NOT NULL");
   vmPort.Bind(1, id);
   if (vmPort.Step()) {
-    out["ipv4"] = HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(0)))
-                      .GetStringAddress();
+    out["ipv4"] =
+        HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(0))).GetStringAddress();
     out["teamUplink"] = vmPort.Text(1);
   }
   Statement counters = store.Prepare(
@@ -323,7 +323,7 @@ ordered_json ExportPort(Store& store, const Statement& port) {
   Statement filter = store.Prepare("SELECT filters FROM port WHERE id = ?");
   filter.Bind(1, id);
   ordered_json filters = filter.Step() && !filter.IsNull(0) ? ordered_json::parse(filter.Text(0))
-                                                             : ordered_json::array();
+                                                            : ordered_json::array();
   out["filters"] = std::move(filters);
   return out;
 }
@@ -353,7 +353,7 @@ void ImportDatapath(const ordered_json& host, Store& store) {
   ImportEns(root, store);
 }
 
-void ExportDatapath(ordered_json& host, Store& store) {
+void ExportDatapath(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ExportVms(host, store);
   ExportEns(host, store);
 }

@@ -183,7 +183,7 @@ void ImportFirewall(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportFirewall(ordered_json& host, Store& store) {
+void ExportFirewall(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   Statement state =
       store.Prepare("SELECT m.loaded, e.value, p.value, f.value FROM kmodule m, setting e, "
                     "setting p, setting f WHERE m.name = ? AND e.key = 'firewall.enabled' AND "

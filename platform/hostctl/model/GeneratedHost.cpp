@@ -76,7 +76,7 @@ void GenerateRoutes(Store& store, int64_t count) {
   Statement insert = store.Prepare(
       "INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, interface, "
       "source) VALUES(?, 4, 0, ?, ?, ?, ?, 'user')");
-  const int64_t base = 0x0A800000;    // 10.128.0.0
+  const int64_t base = 0x0A800000;     // 10.128.0.0
   const int64_t gateways = 0x0A1400FB; // 10.20.0.251 to .254
   for (int64_t i = 0; i < count; ++i) {
     insert.BindAll(kRouteNetstack, base + i * step, prefix, gateways + i % 4, kRouteInterface);
@@ -250,9 +250,9 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
       int64_t packets = 1000 + serial * 37 % 100000;
       // 10.64.0.0/10 holds the VMs' addresses, one per port.
       port.BindAll(portId, s.id, group, name + ".eth" + std::to_string(adapter), worldId,
-                   int64_t{0x0A400000} + serial + 1, uplink, packets * 900, packets * 600,
-                   packets, packets / 50, packets / 100, packets * 2 / 3, packets / 200,
-                   packets / 400, serial % 7, int64_t{0});
+                   int64_t{0x0A400000} + serial + 1, uplink, packets * 900, packets * 600, packets,
+                   packets / 50, packets / 100, packets * 2 / 3, packets / 200, packets / 400,
+                   serial % 7, int64_t{0});
       port.Run();
       port.Reset();
       mac.BindAll(portId, Mac(0x00505A, static_cast<uint32_t>(serial)));

@@ -11,6 +11,7 @@
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -25,6 +26,13 @@ void ImportHost(Store& store, const nlohmann::ordered_json& host);
 
 /// The whole host as a description.
 nlohmann::ordered_json ExportHost(Store& store);
+
+/// Writes the whole host as a description, as ExportHost(store).dump(2)
+/// followed by a newline would, in pieces of about 64 KiB handed to \p write.
+/// The large collections (routes, hosts entries, neighbours) are read and
+/// written element by element, so memory stays small whatever the host's
+/// size. Stops at the first exception \p write throws.
+void WriteHostDescription(Store& store, const std::function<void(std::string_view)>& write);
 
 /// Merges \p fragment into \p into: objects key by key, arrays of objects that
 /// carry "name" (or "key") element by element on that value, other values

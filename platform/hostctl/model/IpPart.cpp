@@ -248,8 +248,7 @@ void DeleteInterface(Store& store, const std::string& name) {
     portId = port.Int(0);
   for (const char* sql :
        {"DELETE FROM tvknic_tag WHERE nic = ?", "DELETE FROM tvknic_mcast WHERE nic = ?",
-        "DELETE FROM tvknic_ipv6 WHERE nic = ?",
-        "DELETE FROM tvknic WHERE name = ?"})
+        "DELETE FROM tvknic_ipv6 WHERE nic = ?", "DELETE FROM tvknic WHERE name = ?"})
     store.Prepare(sql).Bind(1, name).Run();
   if (portId)
     store.Prepare("DELETE FROM port WHERE id = ?").Bind(1, *portId).Run();
@@ -309,7 +308,8 @@ void ImportNetstacks(const JsonObject& root, Store& store) {
     Statement insert = store.Prepare(
         "INSERT INTO netstack(key, ord, name, state, max_conn, cur_max_conn, ccalgo, ipv6, "
         "cur_ipv6, ecn, predefined) VALUES(?,?,?,?,?,?,?,?,?,?,?)");
-    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key), enabled ? NetstackInstance::STATE_ENABLED : NetstackInstance::STATE_DISABLED,
+    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key),
+                   enabled ? NetstackInstance::STATE_ENABLED : NetstackInstance::STATE_DISABLED,
                    maxConn, curMaxConn, cc, ipv6, curIpv6, ecn,
                    Contains(Ip::PredefinedNetstacks(), key));
     try {
@@ -533,7 +533,7 @@ void ImportIp(const ordered_json& host, Store& store) {
     ImportInterface(nic, ord++, store);
 }
 
-void ExportIp(ordered_json& host, Store& store) {
+void ExportIp(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ordered_json stacks = ordered_json::array();
   Statement rows =
       store.Prepare("SELECT key, name, state, max_conn, cur_max_conn, ccalgo, ipv6, cur_ipv6, ecn "
@@ -554,13 +554,13 @@ void ExportIp(ordered_json& host, Store& store) {
                     {"ipv6Configured", GetSetting(store, Ip::kIpv6ConfiguredSetting) != "0"}};
 
   ordered_json nics = ordered_json::array();
-  Statement nic = store.Prepare(
-      "SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
-      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, t.tso_mss, "
-      "t.rx_queues, t.dhcp_dns, t.ipv6_enabled, "
-      "t.ipv6_dhcp, t.ipv6_ra, t.ipv6_dhcp_dns, "
-      "t.ipv6_gateway, t.port_id "
-      "FROM tvknic t ORDER BY t.ord");
+  Statement nic =
+      store.Prepare("SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
+                    "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, t.tso_mss, "
+                    "t.rx_queues, t.dhcp_dns, t.ipv6_enabled, "
+                    "t.ipv6_dhcp, t.ipv6_ra, t.ipv6_dhcp_dns, "
+                    "t.ipv6_gateway, t.port_id "
+                    "FROM tvknic t ORDER BY t.ord");
   while (nic.Step()) {
     std::string name = nic.Text(0);
     ordered_json out = ordered_json::object();

@@ -297,9 +297,8 @@ std::string ConfiguredGateway(Store& store, const std::string& netstack, int fam
 
 void PutConfiguredGateway(Store& store, const std::string& netstack, int family,
                           const std::string& gateway) {
-  Statement update =
-      store.Prepare(family == 4 ? "UPDATE netstack SET gateway4 = ? WHERE key = ?"
-                                : "UPDATE netstack SET gateway6 = ? WHERE key = ?");
+  Statement update = store.Prepare(family == 4 ? "UPDATE netstack SET gateway4 = ? WHERE key = ?"
+                                               : "UPDATE netstack SET gateway6 = ? WHERE key = ?");
   if (gateway.empty())
     update.BindNull(1);
   else

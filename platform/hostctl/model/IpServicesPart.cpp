@@ -429,29 +429,77 @@ void PutArray(ordered_json& host, const char* key, ordered_json array) {
     host[key] = std::move(array);
 }
 
-void ExportIpServices(ordered_json& host, Store& store) {
-  ordered_json routes = ordered_json::array();
+/// The routes, in the order they were added.
+void EmitRoutes(Store& store, const ExportStreams::Emit& emit) {
   Statement route = store.Prepare("SELECT netstack, family, network, prefix, gateway, interface, "
                                   "source, system FROM ipsvc_route ORDER BY id");
+  enum { kNetstack, kFamily, kNetwork, kPrefix, kGateway, kInterface, kSource, kSystem };
   while (route.Step()) {
-    ordered_json object = {{"netstack", route.Text(0)}};
-    bool ipv6 = route.Int(1) == 6;
+    ordered_json object = {{"netstack", route.Text(kNetstack)}};
+    bool ipv6 = route.Int(kFamily) == 6;
     auto address = [&](int column) {
       return ipv6 ? IpSvc::Ipv6Column(route, column).GetStringAddress()
                   : IpSvc::Ipv4Column(route, column).GetStringAddress();
     };
     // A route of prefix length 0 is a default route (host bits are refused).
-    object["network"] = route.Int(3) == 0
-                            ? std::string("default")
-                            : address(2) + "/" + std::to_string(route.Int(3));
-    object["gateway"] = address(4);
-    object["interface"] = route.Text(5);
-    object["source"] = route.Text(6);
-    if (route.Bool(7))
+    int64_t prefix = route.Int(kPrefix);
+    object["network"] =
+        prefix == 0 ? std::string("default") : address(kNetwork) + "/" + std::to_string(prefix);
+    object["gateway"] = address(kGateway);
+    object["interface"] = route.Text(kInterface);
+    object["source"] = route.Text(kSource);
+    if (route.Bool(kSystem))
       object["system"] = true;
-    routes.push_back(std::move(object));
+    emit(object);
   }
-  PutArray(host, "routes", std::move(routes));
+}
+
+/// The hosts entries, in the order they were added.
+void EmitHostsEntries(Store& store, const ExportStreams::Emit& emit) {
+  Statement entry = store.Prepare(
+      "SELECT address, hostname, aliases, comment, system FROM ipsvc_hosts ORDER BY id");
+  enum { kAddress, kHostname, kAliases, kComment, kSystem };
+  while (entry.Step()) {
+    ordered_json object = {{"address", entry.Text(kAddress)}, {"hostname", entry.Text(kHostname)}};
+    std::vector<std::string> aliases = HostCtl::Misc::StringTokenize(entry.Text(kAliases), " ");
+    if (!aliases.empty())
+      object["aliases"] = aliases;
+    if (std::string comment = entry.Text(kComment); !comment.empty())
+      object["comment"] = comment;
+    if (entry.Bool(kSystem))
+      object["system"] = true;
+    emit(object);
+  }
+}
+
+/// The neighbour caches, in the order the entries were added.
+void EmitNeighbors(Store& store, const ExportStreams::Emit& emit) {
+  Statement neighbor = store.Prepare("SELECT family, interface, address, mac, expiry, type, state "
+                                     "FROM ipsvc_neighbor ORDER BY id");
+  enum { kFamily, kInterface, kAddress, kMac, kExpiry, kType, kState };
+  while (neighbor.Step()) {
+    ordered_json object = {{"interface", neighbor.Text(kInterface)},
+                           {"address", neighbor.Text(kAddress)},
+                           {"mac", neighbor.Text(kMac)},
+                           {"expiry", neighbor.Int(kExpiry)},
+                           {"type", RoutingInfoImpl::NeighborTypeNames().at(neighbor.Int(kType))}};
+    if (neighbor.Int(kFamily) == 6)
+      object["state"] = RoutingInfoImpl::NeighborStateNames().at(neighbor.Int(kState));
+    emit(object);
+  }
+}
+
+/// Puts the array that \p rows emits under \p key when \p table has rows.
+void PutStream(ordered_json& host, Store& store, ExportStreams& streams, const char* key,
+               const char* table, ExportStreams::Rows rows) {
+  Statement any =
+      store.Prepare((std::string("SELECT EXISTS(SELECT 1 FROM ") + table + ")").c_str());
+  if (any.Step() && any.Bool(0))
+    streams.Put(host, key, std::move(rows));
+}
+
+void ExportIpServices(ordered_json& host, Store& store, ExportStreams& streams) {
+  PutStream(host, store, streams, "routes", "ipsvc_route", EmitRoutes);
 
   ordered_json gateways = ordered_json::array();
   Statement gateway = store.Prepare("SELECT key, gateway4, gateway6 FROM netstack WHERE gateway4 "
@@ -479,36 +527,8 @@ void ExportIpServices(ordered_json& host, Store& store) {
   }
   PutArray(host, "dns", std::move(dns));
 
-  ordered_json entries = ordered_json::array();
-  Statement entry = store.Prepare(
-      "SELECT address, hostname, aliases, comment, system FROM ipsvc_hosts ORDER BY id");
-  while (entry.Step()) {
-    ordered_json object = {{"address", entry.Text(0)}, {"hostname", entry.Text(1)}};
-    std::vector<std::string> aliases = HostCtl::Misc::StringTokenize(entry.Text(2), " ");
-    if (!aliases.empty())
-      object["aliases"] = aliases;
-    if (!entry.Text(3).empty())
-      object["comment"] = entry.Text(3);
-    if (entry.Bool(4))
-      object["system"] = true;
-    entries.push_back(std::move(object));
-  }
-  PutArray(host, "hostsEntries", std::move(entries));
-
-  ordered_json neighbors = ordered_json::array();
-  Statement neighbor = store.Prepare("SELECT family, interface, address, mac, expiry, type, state "
-                                     "FROM ipsvc_neighbor ORDER BY id");
-  while (neighbor.Step()) {
-    ordered_json object = {{"interface", neighbor.Text(1)},
-                           {"address", neighbor.Text(2)},
-                           {"mac", neighbor.Text(3)},
-                           {"expiry", neighbor.Int(4)},
-                           {"type", RoutingInfoImpl::NeighborTypeNames().at(neighbor.Int(5))}};
-    if (neighbor.Int(0) == 6)
-      object["state"] = RoutingInfoImpl::NeighborStateNames().at(neighbor.Int(6));
-    neighbors.push_back(std::move(object));
-  }
-  PutArray(host, "neighbors", std::move(neighbors));
+  PutStream(host, store, streams, "hostsEntries", "ipsvc_hosts", EmitHostsEntries);
+  PutStream(host, store, streams, "neighbors", "ipsvc_neighbor", EmitNeighbors);
 
   ordered_json worlds = ordered_json::array();
   Statement world = store.Prepare("SELECT id, name FROM ipsvc_world ORDER BY id");

@@ -70,15 +70,34 @@ void SetOldTablesAside(Store& store) {
 
 /// Copies the rows of every table that kept its name and columns.
 void CopyUnchanged(Store& store) {
-  static const char* const kTables[] = {
-      "setting",          "portset",         "uplink",           "portgroup",
-      "world",            "tvknic_ipv6",     "sriov_vf",         "pnic_attachment",
-      "pnic_vlan_counter", "vswitch",        "portgroup_policy", "dvswitch",
-      "tvknic_tag",       "tvknic_mcast",
-      "ipsvc_dns_server", "ipsvc_dns_search", "ipsvc_hosts",     "ipsvc_neighbor",
-      "ipsvc_connection", "ipsvc_world",     "ipsvc_ipsec_sa",   "ipsvc_ipsec_sp",
-      "vm_port_mac",      "ens_lcore",       "kmodule",
-      "fw_ruleset",       "fw_rule",         "fw_allowed_ip"};
+  static const char* const kTables[] = {"setting",
+                                        "portset",
+                                        "uplink",
+                                        "portgroup",
+                                        "world",
+                                        "tvknic_ipv6",
+                                        "sriov_vf",
+                                        "pnic_attachment",
+                                        "pnic_vlan_counter",
+                                        "vswitch",
+                                        "portgroup_policy",
+                                        "dvswitch",
+                                        "tvknic_tag",
+                                        "tvknic_mcast",
+                                        "ipsvc_dns_server",
+                                        "ipsvc_dns_search",
+                                        "ipsvc_hosts",
+                                        "ipsvc_neighbor",
+                                        "ipsvc_connection",
+                                        "ipsvc_world",
+                                        "ipsvc_ipsec_sa",
+                                        "ipsvc_ipsec_sp",
+                                        "vm_port_mac",
+                                        "ens_lcore",
+                                        "kmodule",
+                                        "fw_ruleset",
+                                        "fw_rule",
+                                        "fw_allowed_ip"};
   for (const char* table : kTables) {
     std::string columns;
     for (const std::string& column : Columns(store, table))
@@ -224,9 +243,9 @@ void CopyLags(Store& store) {
       "tx_lacpdus, rx_errors, tx_errors FROM layout2_lacp_nic ORDER BY portset_id, lag_id, ord");
   enum { kPortset, kLag, kNic, kState, kFirstField };
   static const char* const kFields[] = {
-      "actorPortNumber",     "actorPortPriority", "actorAdminKey", "actorOperKey",
-      "actorState",          "partnerAge",        "partnerPortNumber",
-      "partnerPortPriority", "partnerOperKey",    "partnerState"};
+      "actorPortNumber", "actorPortPriority", "actorAdminKey",     "actorOperKey",
+      "actorState",      "partnerAge",        "partnerPortNumber", "partnerPortPriority",
+      "partnerOperKey",  "partnerState"};
   static const char* const kCounters[] = {"rxLacpdus", "txLacpdus", "rxErrors", "txErrors"};
   Statement update = store.Prepare("UPDATE lag SET nics = ? WHERE portset_id = ? AND lag_id = ?");
   auto flush = [&](int64_t portset, int64_t lag, nlohmann::ordered_json& nics) {
@@ -365,10 +384,10 @@ void MigrateLayout(Store& store, int64_t from) {
     store.Exec(("DROP TABLE \"" + table + "\"").c_str());
   Statement broken = store.Prepare("PRAGMA foreign_key_check");
   if (broken.Step())
-    throw HostCtlException("The host state at " + store.GetPath() + " cannot be brought to layout " +
-                           std::to_string(kLayoutVersion) + ": a row of " + broken.Text(0) +
-                           " refers to a missing row of " + broken.Text(2) +
-                           "; it was left as it was");
+    throw HostCtlException("The host state at " + store.GetPath() +
+                           " cannot be brought to layout " + std::to_string(kLayoutVersion) +
+                           ": a row of " + broken.Text(0) + " refers to a missing row of " +
+                           broken.Text(2) + "; it was left as it was");
 }
 
 } // namespace Model

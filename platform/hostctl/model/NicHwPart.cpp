@@ -689,7 +689,7 @@ void ImportNicHw(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportNicHw(ordered_json& host, Store& store) {
+void ExportNicHw(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   if (!host.contains("nics"))
     return;
   for (ordered_json& nic : host["nics"]) {

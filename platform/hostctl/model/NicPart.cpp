@@ -386,7 +386,7 @@ void ImportNic(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportNic(ordered_json& host, Store& store) {
+void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   if (!host.contains("nics"))
     return;
   for (ordered_json& nic : host["nics"]) {

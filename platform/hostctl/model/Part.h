@@ -10,7 +10,9 @@
 
 #include "model/Store.h"
 
-#include <nlohmann/json_fwd.hpp>
+#include <nlohmann/json.hpp>
+
+#include <functional>
 
 #include <string>
 #include <utility>
@@ -27,6 +29,28 @@ struct PartKeys {
   std::vector<std::string> keys; ///< The keys this part reads there.
 };
 
+/// Collections that export writes element by element as it reads them,
+/// instead of holding them in memory: the ones that grow to millions of rows.
+/// A part puts a placeholder where such an array goes; the writer of the
+/// description replaces it by the elements its rows function emits, in the
+/// same read transaction.
+class ExportStreams {
+public:
+  /// Hands one element of the array to the writer.
+  using Emit = std::function<void(const nlohmann::ordered_json&)>;
+  /// Emits every element of one array, in order.
+  using Rows = std::function<void(Store&, const Emit&)>;
+
+  /// Sets \p object[\p key] to the placeholder of an array that \p rows
+  /// fills.
+  void Put(nlohmann::ordered_json& object, const char* key, Rows rows);
+  /// The rows function of a placeholder, or null when \p value is none.
+  const Rows* Find(const nlohmann::ordered_json& value) const;
+
+private:
+  std::vector<Rows> rows_; ///< Indexed by the placeholder's number.
+};
+
 /// One part of the host model.
 struct Part {
   /// Short name, such as "nic".
@@ -40,8 +64,9 @@ struct Part {
   /// rows of the parts before it. Throws ImportError on a bad value.
   void (*importFn)(const nlohmann::ordered_json& host, Store& store);
   /// Adds the part's keys to \p host (inside a read transaction). Parts
-  /// export in list order and may add keys to objects made by earlier parts.
-  void (*exportFn)(nlohmann::ordered_json& host, Store& store);
+  /// export in list order and may add keys to objects made by earlier parts;
+  /// large arrays go to \p streams.
+  void (*exportFn)(nlohmann::ordered_json& host, Store& store, ExportStreams& streams);
 };
 
 /// All parts, in import order.

@@ -398,7 +398,9 @@ void ImportSwitching(const ordered_json& host, Store& store) {
   // uplink of a switch of the description; its uplink row exists now.
   for (const JsonObject& nic : root.Objects("nics"))
     if (nic.Bool("vlanStats", false))
-      store.Prepare("UPDATE uplink SET vlan_stats = 1 WHERE nic = ?").Bind(1, nic.String("name")).Run();
+      store.Prepare("UPDATE uplink SET vlan_stats = 1 WHERE nic = ?")
+          .Bind(1, nic.String("name"))
+          .Run();
 }
 
 std::vector<std::string> UplinksOf(Store& store, int64_t id) {
@@ -535,7 +537,7 @@ void ExportDistributed(ordered_json& host, Store& store, const char* key, const 
     host[key] = std::move(list);
 }
 
-void ExportSwitching(ordered_json& host, Store& store) {
+void ExportSwitching(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ExportStandard(host, store);
   ExportDistributed(host, store, "dvswitches", "dvs");
   ExportDistributed(host, store, "opaqueSwitches", "opaque");

@@ -118,9 +118,9 @@ std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
     while (users.Step())
       clients[users.Text(0)].push_back(users.Text(1));
     std::vector<std::unique_ptr<DVPort>> ports;
-    Statement rows = store.Prepare(
-        "SELECT d.port_key, d.connection_id, d.name, d.portgroup_key FROM dvport d "
-        "WHERE d.portset_id = ? ORDER BY d.ord");
+    Statement rows =
+        store.Prepare("SELECT d.port_key, d.connection_id, d.name, d.portgroup_key FROM dvport d "
+                      "WHERE d.portset_id = ? ORDER BY d.ord");
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       std::string key = rows.Text(0);
@@ -180,10 +180,10 @@ std::vector<DVUplinkPortLacp> DVSwitchImpl::GetUplinkPortLacp() const {
   store.CheckFault("GetUplinkPortLacp", data_.name);
   return store.Read([&] {
     std::vector<DVUplinkPortLacp> ports;
-    Statement rows = store.Prepare(
-        "SELECT d.port_key, d.lacp_enabled, d.lacp_mode, "
-        "d.uplink_pg_key FROM dvport d WHERE d.portset_id = ? AND d.is_uplink = 1 "
-        "ORDER BY d.ord");
+    Statement rows =
+        store.Prepare("SELECT d.port_key, d.lacp_enabled, d.lacp_mode, "
+                      "d.uplink_pg_key FROM dvport d WHERE d.portset_id = ? AND d.is_uplink = 1 "
+                      "ORDER BY d.ord");
     rows.Bind(1, data_.id);
     while (rows.Step())
       ports.push_back(DVUplinkPortLacp{rows.Text(0), rows.Bool(1),
@@ -196,8 +196,8 @@ void DVSwitchImpl::GetLacpInfo(std::vector<LacpLagInfo>& lags) const {
   Store& store = Store::Host();
   store.CheckFault("GetLacpInfo", data_.name);
   store.Read([&] {
-    Statement rows = store.Prepare(
-        "SELECT lag_id, name, mode, nics FROM lag WHERE portset_id = ? ORDER BY ord");
+    Statement rows =
+        store.Prepare("SELECT lag_id, name, mode, nics FROM lag WHERE portset_id = ? ORDER BY ord");
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       LacpLagInfo& lag = lags.emplace_back();
@@ -290,9 +290,8 @@ std::optional<DVPortRow> FindDVPort(Store& store, const DVPortParam& param) {
   auto portset = FindPortsetByIdentifier(store, param.switchUuid);
   if (!portset)
     return std::nullopt;
-  Statement row = store.Prepare(
-      "SELECT d.portgroup_key, d.connection_id, d.name FROM dvport d "
-      "WHERE d.portset_id = ? AND d.port_key = ?");
+  Statement row = store.Prepare("SELECT d.portgroup_key, d.connection_id, d.name FROM dvport d "
+                                "WHERE d.portset_id = ? AND d.port_key = ?");
   row.BindAll(portset->id, param.portId);
   if (!row.Step())
     return std::nullopt;

@@ -9,10 +9,10 @@
 //===----------------------------------------------------------------------===//
 #include "HostCtl/Lib.h"
 #include "model/Store.h"
-#include <nlohmann/json.hpp>
 #include "sim/PnicImpl.h"
 #include "sim/Switching.h"
 #include "sim/WorldImpl.h"
+#include <nlohmann/json.hpp>
 
 namespace Sim {
 

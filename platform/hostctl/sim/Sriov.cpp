@@ -47,8 +47,7 @@ std::vector<std::unique_ptr<Pnic>> NetworkInfoImpl::GetSriovNics() {
   store.CheckFault("GetSriovNics", "*");
   return store.Read([&] {
     std::vector<std::string> names;
-    Statement rows = store.Prepare(
-        "SELECT name FROM pnic WHERE sriov = 1 ORDER BY ord");
+    Statement rows = store.Prepare("SELECT name FROM pnic WHERE sriov = 1 ORDER BY ord");
     while (rows.Step())
       names.push_back(rows.Text(0));
     std::vector<std::unique_ptr<Pnic>> nics;

@@ -55,19 +55,23 @@ bool SystemInfoImpl::IsFirewallEnabled() {
 }
 
 bool SystemInfoImpl::GetFirewallDefaultAction() {
-  return ReadState("GetFirewallDefaultAction", "SELECT value FROM setting WHERE key = 'firewall.defaultPass'");
+  return ReadState("GetFirewallDefaultAction",
+                   "SELECT value FROM setting WHERE key = 'firewall.defaultPass'");
 }
 
 bool SystemInfoImpl::AreFirewallFiltersActive() {
-  return ReadState("AreFirewallFiltersActive", "SELECT value FROM setting WHERE key = 'firewall.filtersActive'");
+  return ReadState("AreFirewallFiltersActive",
+                   "SELECT value FROM setting WHERE key = 'firewall.filtersActive'");
 }
 
 void SystemInfoImpl::SetFirewallEnabled(bool enabled) {
-  WriteState("SetFirewallEnabled", "UPDATE setting SET value = ? WHERE key = 'firewall.enabled'", enabled);
+  WriteState("SetFirewallEnabled", "UPDATE setting SET value = ? WHERE key = 'firewall.enabled'",
+             enabled);
 }
 
 void SystemInfoImpl::SetFirewallDefaultAction(bool pass) {
-  WriteState("SetFirewallDefaultAction", "UPDATE setting SET value = ? WHERE key = 'firewall.defaultPass'", pass);
+  WriteState("SetFirewallDefaultAction",
+             "UPDATE setting SET value = ? WHERE key = 'firewall.defaultPass'", pass);
 }
 
 void SystemInfoImpl::LoadFirewallRulesets() {
@@ -84,8 +88,8 @@ void SystemInfoImpl::LoadFirewallRulesets() {
 }
 
 void SystemInfoImpl::DestroyFirewallFilters() {
-  WriteState("DestroyFirewallFilters", "UPDATE setting SET value = ? WHERE key = 'firewall.filtersActive'",
-             false);
+  WriteState("DestroyFirewallFilters",
+             "UPDATE setting SET value = ? WHERE key = 'firewall.filtersActive'", false);
 }
 
 std::vector<std::unique_ptr<FirewallRuleset>> SystemInfoImpl::GetFirewallRulesets() {

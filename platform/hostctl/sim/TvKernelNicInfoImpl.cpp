@@ -21,7 +21,7 @@ namespace {
 
 /// Columns read for each listed interface, in the order ReadRow expects.
 #define TVKNIC_COLUMNS                                                                             \
-  "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "       \
+  "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "                                     \
   "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
 
 std::unique_ptr<TvkNic> ReadRow(const Statement& row) {

@@ -31,10 +31,9 @@ using Model::Store;
 
 /// Reads the attributes of interface \p name; false when there is none.
 bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
-  Statement row = store.Prepare(
-      "SELECT t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "
-      "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
-      "WHERE t.name = ?");
+  Statement row = store.Prepare("SELECT t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "
+                                "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
+                                "WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
     return false;
@@ -51,11 +50,11 @@ bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
 
 /// The running (\p running true) or configured IP configuration of \p name.
 IpConfig ReadIpConfig(Store& store, const std::string& name, bool running) {
-  Statement row = store.Prepare(
-      "SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
-      "t.dhcp_dns, t.ipv6_enabled, t.ipv6_dhcp, "
-      "t.ipv6_ra, t.ipv6_dhcp_dns, t.ipv6_gateway "
-      "FROM tvknic t WHERE t.name = ?");
+  Statement row =
+      store.Prepare("SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
+                    "t.dhcp_dns, t.ipv6_enabled, t.ipv6_dhcp, "
+                    "t.ipv6_ra, t.ipv6_dhcp_dns, t.ipv6_gateway "
+                    "FROM tvknic t WHERE t.name = ?");
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Tarvik network interface " + name + " does not exist");
