@@ -24,6 +24,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
+#include <memory>
 #include <new>
 #include <string>
 #include <string_view>
@@ -92,13 +93,38 @@ int64_t ParseSize(const std::string& text) {
   }
 }
 
-/// Reads \p file ("-": standard input) into \p text, at most \p limit bytes;
-/// "" on success, else the reason.
-std::string ReadLimited(const std::string& file, int64_t limit, std::string& text) {
+/// The refusal of input beyond the import limit.
+std::string TooLarge(const std::string& file, int64_t limit) {
+  return (file == "-" ? std::string("the standard input") : file) +
+         " holds more than the import limit of " + std::to_string(limit) +
+         " bytes (raise it with --max-size)";
+}
+
+/// Opens \p file ("-": standard input) for reading from its start as often as
+/// needed, refusing more than \p limit bytes; "" on success, else the reason.
+/// A regular file is read in place; anything else (a pipe, a device) is
+/// copied to a temporary file first, at most \p limit bytes of it.
+std::string OpenLimited(const std::string& file, int64_t limit, std::FILE*& out) {
   int fd = file == "-" ? 0 : ::open(file.c_str(), O_RDONLY | O_CLOEXEC);
   if (fd < 0)
     return "cannot read " + file + ": " + std::strerror(errno);
+  struct stat st {};
+  if (::fstat(fd, &st) == 0 && S_ISREG(st.st_mode) && fd != 0) {
+    if (st.st_size > limit) {
+      ::close(fd);
+      return TooLarge(file, limit);
+    }
+    out = ::fdopen(fd, "r");
+    return out ? "" : "cannot read " + file + ": " + std::strerror(errno);
+  }
+  std::FILE* copy = std::tmpfile();
+  if (!copy) {
+    if (fd != 0)
+      ::close(fd);
+    return std::string("cannot make a temporary file: ") + std::strerror(errno);
+  }
   std::string problem;
+  int64_t total = 0;
   char buffer[1 << 16];
   for (;;) {
     ssize_t got = ::read(fd, buffer, sizeof buffer);
@@ -110,17 +136,26 @@ std::string ReadLimited(const std::string& file, int64_t limit, std::string& tex
     }
     if (got == 0)
       break;
-    if (static_cast<int64_t>(text.size()) + got > limit) {
-      problem = (file == "-" ? std::string("the standard input") : file) +
-                " holds more than the import limit of " + std::to_string(limit) +
-                " bytes (raise it with --max-size)";
+    total += got;
+    if (total > limit) {
+      problem = TooLarge(file, limit);
       break;
     }
-    text.append(buffer, static_cast<std::size_t>(got));
+    if (std::fwrite(buffer, 1, static_cast<std::size_t>(got), copy) !=
+        static_cast<std::size_t>(got)) {
+      problem = std::string("cannot write a temporary file: ") + std::strerror(errno);
+      break;
+    }
   }
   if (fd != 0)
     ::close(fd);
-  return problem;
+  if (!problem.empty()) {
+    std::fclose(copy);
+    return problem;
+  }
+  std::rewind(copy);
+  out = copy;
+  return "";
 }
 
 /// Makes \p path's directory entry durable.
@@ -163,14 +198,14 @@ template <typename Fill> void CreateHost(const std::string& path, Fill&& fill) {
   SyncDirectory(path);
 }
 
-/// Creates \p path from \p host, or replaces the host it holds.
-void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
+/// Creates \p path by \p import, or replaces the host it holds.
+template <typename Import> void WriteHost(const std::string& path, Import&& import) {
   if (Exists(path)) {
     Model::Store store(path);
-    Model::ImportHost(store, host);
+    import(store);
     return;
   }
-  CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
+  CreateHost(path, import);
 }
 
 /// Reads a non-negative count; false when \p text is not one.
@@ -202,7 +237,8 @@ int RunInit(const Options& options) {
   const std::string& path = options.positional[0];
   if (Exists(path))
     return Fail("the file " + path + " exists already");
-  WriteHost(path, Model::Profile(options.profile));
+  nlohmann::ordered_json host = Model::Profile(options.profile);
+  WriteHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
   return 0;
 }
 
@@ -215,13 +251,16 @@ int RunGenerate(const Options& options) {
 }
 
 int RunImport(const Options& options) {
-  std::string text;
-  if (std::string problem = ReadLimited(options.positional[0], options.maxImport, text);
+  std::FILE* file = nullptr;
+  if (std::string problem = OpenLimited(options.positional[0], options.maxImport, file);
       !problem.empty())
     return Fail(problem);
-  nlohmann::ordered_json doc = Model::ParseDescription(text);
-  text = std::string();
-  WriteHost(HostPath(options.host), doc);
+  std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, std::fclose);
+  // The description is checked whole before the host is touched, then read
+  // again as it is imported: the large arrays are never in memory whole.
+  nlohmann::ordered_json host = Model::ReadDescription(file);
+  WriteHost(HostPath(options.host),
+            [&](Model::Store& store) { Model::ImportHost(store, host, file); });
   return 0;
 }
 

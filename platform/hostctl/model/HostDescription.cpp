@@ -96,8 +96,25 @@ void MergeDescription(ordered_json& into, const ordered_json& fragment) {
   into = fragment;
 }
 
-void ImportHost(Store& store, const ordered_json& host) {
-  CheckKeys(host, "", "", KnownKeys());
+namespace {
+
+/// The part that imports the top-level array \p key element by element.
+const StreamedKey* FindStreamed(const std::string& key) {
+  for (const Part* part : AllParts())
+    for (const StreamedKey& streamed : part->streamed)
+      if (key == streamed.key)
+        return &streamed;
+  return nullptr;
+}
+
+std::string ElementPath(const std::string& key, std::size_t index) {
+  return key + "[" + std::to_string(index) + "]";
+}
+
+/// Empties the store and runs every part's import of \p host; \p streamed
+/// then imports the arrays that parts take element by element.
+template <typename Streamed>
+void ReplaceHost(Store& store, const ordered_json& host, Streamed&& streamed) {
   store.Write([&] {
     store.Exec("PRAGMA defer_foreign_keys=ON");
     std::vector<std::string> tables;
@@ -111,6 +128,44 @@ void ImportHost(Store& store, const ordered_json& host) {
       store.Exec(("DELETE FROM \"" + table + "\"").c_str());
     for (const Part* part : AllParts())
       part->importFn(host, store);
+    streamed();
+  });
+}
+
+} // namespace
+
+void ImportHost(Store& store, const ordered_json& host) {
+  CheckKeys(host, "", "", KnownKeys());
+  ReplaceHost(store, host, [&] {
+    JsonObject root(host, "");
+    for (const Part* part : AllParts())
+      for (const StreamedKey& streamed : part->streamed)
+        for (const JsonObject& element : root.Objects(streamed.key))
+          streamed.importElement(element, store);
+  });
+}
+
+ordered_json ReadDescription(std::FILE* file) {
+  const auto known = KnownKeys();
+  ordered_json host =
+      ParseDescription(file, [&](const std::string& key, std::size_t index, ordered_json& element) {
+        if (!FindStreamed(key))
+          return true;
+        CheckKeys(element, key, ElementPath(key, index), known);
+        return false;
+      });
+  CheckKeys(host, "", "", known);
+  return host;
+}
+
+void ImportHost(Store& store, const ordered_json& host, std::FILE* file) {
+  ReplaceHost(store, host, [&] {
+    std::rewind(file);
+    ParseDescription(file, [&](const std::string& key, std::size_t index, ordered_json& element) {
+      if (const StreamedKey* streamed = FindStreamed(key))
+        streamed->importElement(JsonObject(element, ElementPath(key, index)), store);
+      return false;
+    });
   });
 }
 

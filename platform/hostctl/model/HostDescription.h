@@ -11,6 +11,7 @@
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
+#include <cstdio>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -23,6 +24,18 @@ class Store;
 /// Replaces the host in \p store by \p host. Throws ImportError naming the bad
 /// field (nothing is changed then).
 void ImportHost(Store& store, const nlohmann::ordered_json& host);
+
+/// Reads the host description in \p file and checks it whole (JSON, repeated
+/// and unknown keys), holding in memory all but the elements of the arrays
+/// that parts import one at a time (routes, hosts entries, neighbours): those
+/// are checked and dropped. Throws ImportError naming the bad field.
+nlohmann::ordered_json ReadDescription(std::FILE* file);
+
+/// Replaces the host in \p store by the description that ReadDescription
+/// read from \p file as \p host, reading the dropped arrays again from the
+/// start of \p file as they are imported. Throws ImportError naming the bad
+/// field (nothing is changed then).
+void ImportHost(Store& store, const nlohmann::ordered_json& host, std::FILE* file);
 
 /// The whole host as a description.
 nlohmann::ordered_json ExportHost(Store& store);

@@ -196,32 +196,31 @@ int CodeOf(const JsonObject& object, const char* key, const Table& table, const 
 
 const std::vector<std::string> kProtocols = {"tcp", "udp", "ip"};
 
-void ImportRoutes(const JsonObject& root, Store& store) {
-  for (const JsonObject& route : root.Objects("routes")) {
-    std::string netstack = route.String("netstack", IpSvc::kDefaultNetstack);
-    std::string network = route.String("network");
-    std::string gateway = route.String("gateway");
-    std::string interfaceName = route.String("interface", "");
-    std::string source = route.String("source", RoutingInfoImpl::SOURCE_USER);
-    bool system = route.Bool("system", false);
-    if (!IpSvc::IsStoredRouteSource(source))
-      route.Fail("source", "expected one of user, config, dhcp");
-    bool ipv6 = network == "default" ? gateway.find(':') != std::string::npos
-                                     : network.find(':') != std::string::npos;
-    AsField(route, "network", [&] {
-      if (ipv6) {
-        Ipv6Network net =
-            network == "default" ? RoutingInfoImpl::DEFAULT_IPV6_ROUTE : Ipv6Network(network);
-        IpSvc::InsertRoute(store, netstack, net, Ipv6Address(gateway), interfaceName, source,
-                           system);
-      } else {
-        Ipv4Network net =
-            network == "default" ? RoutingInfoImpl::DEFAULT_IPV4_ROUTE : Ipv4Network(network);
-        IpSvc::InsertRoute(store, netstack, net, Ipv4Address(gateway), interfaceName, source,
-                           system);
-      }
-    });
-  }
+void ImportRoute(const JsonObject& route, Store& store) {
+  std::string netstack = route.String("netstack", IpSvc::kDefaultNetstack);
+  std::string network = route.String("network");
+  std::string gateway = route.String("gateway");
+  std::string interfaceName = route.String("interface", "");
+  std::string source = route.String("source", RoutingInfoImpl::SOURCE_USER);
+  bool system = route.Bool("system", false);
+  if (!IpSvc::IsStoredRouteSource(source))
+    route.Fail("source", "expected one of user, config, dhcp");
+  bool ipv6 = network == "default" ? gateway.find(':') != std::string::npos
+                                   : network.find(':') != std::string::npos;
+  AsField(route, "network", [&] {
+    if (ipv6) {
+      Ipv6Network net =
+          network == "default" ? RoutingInfoImpl::DEFAULT_IPV6_ROUTE : Ipv6Network(network);
+      IpSvc::InsertRoute(store, netstack, net, Ipv6Address(gateway), interfaceName, source, system);
+    } else {
+      Ipv4Network net =
+          network == "default" ? RoutingInfoImpl::DEFAULT_IPV4_ROUTE : Ipv4Network(network);
+      IpSvc::InsertRoute(store, netstack, net, Ipv4Address(gateway), interfaceName, source, system);
+    }
+  });
+}
+
+void ImportGateways(const JsonObject& root, Store& store) {
   for (const JsonObject& gateways : root.Objects("defaultGateways")) {
     std::string netstack = gateways.String("netstack", IpSvc::kDefaultNetstack);
     AsField(gateways, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
@@ -265,59 +264,56 @@ void ImportDns(const JsonObject& root, Store& store) {
   }
 }
 
-void ImportHostsEntries(const JsonObject& root, Store& store) {
-  for (const JsonObject& entry : root.Objects("hostsEntries"))
-    AsField(entry, "address", [&] {
-      IpSvc::InsertHostsEntry(store, entry.String("address"), entry.String("hostname"),
-                              entry.Strings("aliases"), entry.String("comment", ""),
-                              entry.Bool("system", false));
-    });
+void ImportHostsEntry(const JsonObject& entry, Store& store) {
+  AsField(entry, "address", [&] {
+    IpSvc::InsertHostsEntry(store, entry.String("address"), entry.String("hostname"),
+                            entry.Strings("aliases"), entry.String("comment", ""),
+                            entry.Bool("system", false));
+  });
 }
 
-void ImportNeighbors(const JsonObject& root, Store& store) {
+void ImportNeighbor(const JsonObject& neighbor, Store& store) {
   const auto& types = RoutingInfoImpl::NeighborTypeNames();
   const auto& states = RoutingInfoImpl::NeighborStateNames();
-  for (const JsonObject& neighbor : root.Objects("neighbors")) {
-    std::string interfaceName = neighbor.String("interface");
-    Statement nic = store.Prepare("SELECT 1 FROM tvknic WHERE name = ?");
-    nic.Bind(1, interfaceName);
-    if (!nic.Step())
-      neighbor.Fail("interface", "no kernel interface is named " + interfaceName);
-    std::string text = neighbor.String("address");
-    int family = 4;
-    std::string address;
-    if (Ipv4Address::IsValidAddress(text)) {
-      address = Ipv4Address(text).GetStringAddress();
-    } else if (Ipv6Address::IsValidAddress(text)) {
-      address = Ipv6Address(text).GetStringAddress();
-      family = 6;
-    } else {
-      neighbor.Fail("address", "expected an IPv4 or IPv6 address");
-    }
-    std::string mac = neighbor.String("mac");
-    if (!HostCtl::Network::MacAddress::IsValid(mac))
-      neighbor.Fail("mac", "expected a unicast MAC address such as 00:50:56:01:02:03");
-    int type = CodeOf(neighbor, "type", types, neighbor.String("type", types[1]));
-    int state = 0;
-    if (neighbor.Has("state")) {
-      if (family == 4)
-        neighbor.Fail("state", "only IPv6 neighbours have a state");
-      state = CodeOf(neighbor, "state", states, neighbor.String("state"));
-    }
-    Statement insert = store.Prepare(
-        "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
-        "VALUES(?, ?, ?, ?, ?, ?, ?)");
-    insert.BindAll(family, interfaceName, address,
-                   HostCtl::Network::MacAddress(mac).GetStringAddress(),
-                   neighbor.Int("expiry", 0, 86400 * 365, 0), type, state);
-    AsField(neighbor, "address", [&] {
-      try {
-        insert.Run();
-      } catch (const HostCtlException&) {
-        throw HostCtlException(address + " is listed twice on " + interfaceName);
-      }
-    });
+  std::string interfaceName = neighbor.String("interface");
+  Statement nic = store.Prepare("SELECT 1 FROM tvknic WHERE name = ?");
+  nic.Bind(1, interfaceName);
+  if (!nic.Step())
+    neighbor.Fail("interface", "no kernel interface is named " + interfaceName);
+  std::string text = neighbor.String("address");
+  int family = 4;
+  std::string address;
+  if (Ipv4Address::IsValidAddress(text)) {
+    address = Ipv4Address(text).GetStringAddress();
+  } else if (Ipv6Address::IsValidAddress(text)) {
+    address = Ipv6Address(text).GetStringAddress();
+    family = 6;
+  } else {
+    neighbor.Fail("address", "expected an IPv4 or IPv6 address");
   }
+  std::string mac = neighbor.String("mac");
+  if (!HostCtl::Network::MacAddress::IsValid(mac))
+    neighbor.Fail("mac", "expected a unicast MAC address such as 00:50:56:01:02:03");
+  int type = CodeOf(neighbor, "type", types, neighbor.String("type", types[1]));
+  int state = 0;
+  if (neighbor.Has("state")) {
+    if (family == 4)
+      neighbor.Fail("state", "only IPv6 neighbours have a state");
+    state = CodeOf(neighbor, "state", states, neighbor.String("state"));
+  }
+  Statement insert = store.Prepare(
+      "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
+      "VALUES(?, ?, ?, ?, ?, ?, ?)");
+  insert.BindAll(family, interfaceName, address,
+                 HostCtl::Network::MacAddress(mac).GetStringAddress(),
+                 neighbor.Int("expiry", 0, 86400 * 365, 0), type, state);
+  AsField(neighbor, "address", [&] {
+    try {
+      insert.Run();
+    } catch (const HostCtlException&) {
+      throw HostCtlException(address + " is listed twice on " + interfaceName);
+    }
+  });
 }
 
 void ImportConnections(const JsonObject& root, Store& store) {
@@ -415,10 +411,8 @@ void ImportIpsec(const JsonObject& root, Store& store) {
 
 void ImportIpServices(const ordered_json& host, Store& store) {
   JsonObject root(host, "");
-  ImportRoutes(root, store);
+  ImportGateways(root, store);
   ImportDns(root, store);
-  ImportHostsEntries(root, store);
-  ImportNeighbors(root, store);
   ImportConnections(root, store);
   ImportIpsec(root, store);
 }
@@ -625,6 +619,7 @@ const Part kIpServicesPart = {
        "action", "mode", "saName"}}},
     ImportIpServices,
     ExportIpServices,
+    {{"routes", ImportRoute}, {"hostsEntries", ImportHostsEntry}, {"neighbors", ImportNeighbor}},
 };
 
 } // namespace Model

@@ -20,6 +20,8 @@
 
 namespace Model {
 
+class JsonObject;
+
 /// Keys a part accepts in the objects of one collection of the host
 /// description. Collection "" is the top level of the document; any other
 /// name is a top-level array of objects (such as "nics"), or a nested array
@@ -51,6 +53,15 @@ private:
   std::vector<Rows> rows_; ///< Indexed by the placeholder's number.
 };
 
+/// A top-level array of the host description whose elements a part imports
+/// one at a time, so that a description can be read as it streams by.
+struct StreamedKey {
+  const char* key; ///< Top-level key of the array.
+  /// Imports one element (inside the import's write transaction). Streamed
+  /// arrays are imported after every part's importFn, in list order.
+  void (*importElement)(const JsonObject& element, Store& store);
+};
+
 /// One part of the host model.
 struct Part {
   /// Short name, such as "nic".
@@ -67,6 +78,9 @@ struct Part {
   /// export in list order and may add keys to objects made by earlier parts;
   /// large arrays go to \p streams.
   void (*exportFn)(nlohmann::ordered_json& host, Store& store, ExportStreams& streams);
+  /// The part's arrays that are imported element by element (importFn leaves
+  /// them alone).
+  std::vector<StreamedKey> streamed = {};
 };
 
 /// All parts, in import order.
