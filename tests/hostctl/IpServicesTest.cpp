@@ -49,11 +49,11 @@ INSERT INTO tvknic(name, ord, netstack, mac, system, ipv4_mode, ipv4_address, ip
   ('vmk9', 3, 'defaultTcpipStack', '00:50:56:60:00:09', 1, 'static', '169.254.1.1', '255.255.0.0');
 INSERT INTO tvknic_ipv6(nic, address, prefix, ord) VALUES('vmk0', '2001:db8:1::5', 64, 0);
 INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) VALUES
-  (4, 'vmk1', '10.0.9.9', '00:50:56:aa:00:02', 300, 1, 0),
-  (4, 'vmk0', '10.0.0.1', '00:50:56:aa:00:01', 1200, 1, 0),
-  (6, 'vmk0', '2001:db8:1::1', '00:50:56:aa:00:01', 30, 4, 2),
-  (4, 'vmk2', '172.16.0.1', '00:50:56:aa:00:03', 20, 2, 0),
-  (4, 'vmk9', '169.254.1.2', '00:50:56:aa:00:09', 0, 3, 0);
+  (4, 'vmk1', 0x0A000909, '00:50:56:aa:00:02', 300, 1, 0),
+  (4, 'vmk0', 0x0A000001, '00:50:56:aa:00:01', 1200, 1, 0),
+  (6, 'vmk0', X'20010DB8000100000000000000000001', '00:50:56:aa:00:01', 30, 4, 2),
+  (4, 'vmk2', 0xAC100001, '00:50:56:aa:00:03', 20, 2, 0),
+  (4, 'vmk9', 0xA9FE0102, '00:50:56:aa:00:09', 0, 3, 0);
 INSERT INTO ipsvc_world(id, name) VALUES(2101, 'sshd');
 INSERT INTO world(id, name) VALUES(3300, 'vm-web01');
 INSERT INTO ipsvc_connection(netstack, protocol, local_address, local_port, foreign_address,

@@ -268,7 +268,7 @@ void GenerateNeighbours(Store& store, int64_t count) {
       "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
       "VALUES(4, ?, ?, ?, ?, 1, 0)");
   for (int64_t i = 0; i < count; ++i) {
-    insert.BindAll(kRouteInterface, Dotted(0x0A200000 + static_cast<uint32_t>(i) + 1),
+    insert.BindAll(kRouteInterface, int64_t{0x0A200000} + i + 1,
                    Mac(0x001C74, static_cast<uint32_t>(i)), i % 1200);
     insert.Run();
     insert.Reset();

@@ -102,13 +102,14 @@ CREATE TABLE ipsvc_hosts(
 CREATE UNIQUE INDEX ipsvc_hosts_key ON ipsvc_hosts(address, hostname COLLATE NOCASE);
 CREATE INDEX ipsvc_hosts_list ON ipsvc_hosts(system, id);
 
--- Neighbour caches; the netstack is the interface's. `type` and `state` index
+-- Neighbour caches; the netstack is the interface's. The address is a number
+-- as in ipsvc_route. `type` and `state` index
 -- RoutingInfoImpl::NeighborTypeNames() and NeighborStateNames().
 CREATE TABLE ipsvc_neighbor(
   id INTEGER PRIMARY KEY,
   family INTEGER NOT NULL,
   interface TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
-  address TEXT NOT NULL,
+  address NOT NULL,
   mac TEXT NOT NULL,
   expiry INTEGER NOT NULL,
   type INTEGER NOT NULL,
@@ -304,9 +305,15 @@ void ImportNeighbor(const JsonObject& neighbor, Store& store) {
   Statement insert = store.Prepare(
       "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
       "VALUES(?, ?, ?, ?, ?, ?, ?)");
-  insert.BindAll(family, interfaceName, address,
-                 HostCtl::Network::MacAddress(mac).GetStringAddress(),
-                 neighbor.Int("expiry", 0, 86400 * 365, 0), type, state);
+  insert.BindAll(family, interfaceName);
+  if (family == 6)
+    IpSvc::BindAddress(insert, 3, Ipv6Address(address));
+  else
+    IpSvc::BindAddress(insert, 3, Ipv4Address(address));
+  insert.Bind(4, HostCtl::Network::MacAddress(mac).GetStringAddress())
+      .Bind(5, neighbor.Int("expiry", 0, 86400 * 365, 0))
+      .Bind(6, type)
+      .Bind(7, state);
   AsField(neighbor, "address", [&] {
     try {
       insert.Run();
@@ -472,12 +479,15 @@ void EmitNeighbors(Store& store, const ExportStreams::Emit& emit) {
                                      "FROM ipsvc_neighbor ORDER BY id");
   enum { kFamily, kInterface, kAddress, kMac, kExpiry, kType, kState };
   while (neighbor.Step()) {
-    ordered_json object = {{"interface", neighbor.Text(kInterface)},
-                           {"address", neighbor.Text(kAddress)},
-                           {"mac", neighbor.Text(kMac)},
-                           {"expiry", neighbor.Int(kExpiry)},
-                           {"type", RoutingInfoImpl::NeighborTypeNames().at(neighbor.Int(kType))}};
-    if (neighbor.Int(kFamily) == 6)
+    bool ipv6 = neighbor.Int(kFamily) == 6;
+    ordered_json object = {
+        {"interface", neighbor.Text(kInterface)},
+        {"address", ipv6 ? IpSvc::Ipv6Column(neighbor, kAddress).GetStringAddress()
+                         : IpSvc::Ipv4Column(neighbor, kAddress).GetStringAddress()},
+        {"mac", neighbor.Text(kMac)},
+        {"expiry", neighbor.Int(kExpiry)},
+        {"type", RoutingInfoImpl::NeighborTypeNames().at(neighbor.Int(kType))}};
+    if (ipv6)
       object["state"] = RoutingInfoImpl::NeighborStateNames().at(neighbor.Int(kState));
     emit(object);
   }

@@ -70,34 +70,14 @@ void SetOldTablesAside(Store& store) {
 
 /// Copies the rows of every table that kept its name and columns.
 void CopyUnchanged(Store& store) {
-  static const char* const kTables[] = {"setting",
-                                        "portset",
-                                        "uplink",
-                                        "portgroup",
-                                        "world",
-                                        "tvknic_ipv6",
-                                        "sriov_vf",
-                                        "pnic_attachment",
-                                        "pnic_vlan_counter",
-                                        "vswitch",
-                                        "portgroup_policy",
-                                        "dvswitch",
-                                        "tvknic_tag",
-                                        "tvknic_mcast",
-                                        "ipsvc_dns_server",
-                                        "ipsvc_dns_search",
-                                        "ipsvc_hosts",
-                                        "ipsvc_neighbor",
-                                        "ipsvc_connection",
-                                        "ipsvc_world",
-                                        "ipsvc_ipsec_sa",
-                                        "ipsvc_ipsec_sp",
-                                        "vm_port_mac",
-                                        "ens_lcore",
-                                        "kmodule",
-                                        "fw_ruleset",
-                                        "fw_rule",
-                                        "fw_allowed_ip"};
+  static const char* const kTables[] = {
+      "setting",          "portset",     "uplink",          "portgroup",         "world",
+      "tvknic_ipv6",      "sriov_vf",    "pnic_attachment", "pnic_vlan_counter", "vswitch",
+      "portgroup_policy", "dvswitch",    "tvknic_tag",      "tvknic_mcast",      "ipsvc_dns_server",
+      "ipsvc_dns_search", "ipsvc_hosts",
+
+      "ipsvc_connection", "ipsvc_world", "ipsvc_ipsec_sa",  "ipsvc_ipsec_sp",    "vm_port_mac",
+      "ens_lcore",        "kmodule",     "fw_ruleset",      "fw_rule",           "fw_allowed_ip"};
   for (const char* table : kTables) {
     std::string columns;
     for (const std::string& column : Columns(store, table))
@@ -331,6 +311,35 @@ void CopyVmPortAddresses(Store& store) {
   }
 }
 
+/// Neighbour entries keep their ids (their listing order); their addresses
+/// become numbers.
+void CopyNeighbors(Store& store) {
+  Statement row = store.Prepare("SELECT id, family, interface, address, mac, expiry, type, state "
+                                "FROM layout2_ipsvc_neighbor ORDER BY id");
+  enum { kId, kFamily, kInterface, kAddress, kMac, kExpiry, kType, kState };
+  Statement insert = store.Prepare(
+      "INSERT INTO ipsvc_neighbor(id, family, interface, address, mac, expiry, type, state) "
+      "VALUES(?, ?, ?, ?, ?, ?, ?, ?)");
+  while (row.Step()) {
+    insert.BindAll(row.Int(kId), row.Int(kFamily), row.Text(kInterface));
+    try {
+      if (row.Int(kFamily) == 6)
+        IpSvc::BindAddress(insert, 4, HostCtl::Network::Ipv6Address(row.Text(kAddress)));
+      else
+        IpSvc::BindAddress(insert, 4, HostCtl::Network::Ipv4Address(row.Text(kAddress)));
+    } catch (const HostCtlException&) {
+      throw HostCtlException("The host state at " + store.GetPath() + " has a neighbour " +
+                             row.Text(kAddress) + " that cannot be read; it was left as it was");
+    }
+    insert.Bind(5, row.Text(kMac))
+        .Bind(6, row.Int(kExpiry))
+        .Bind(7, row.Int(kType))
+        .Bind(8, row.Int(kState))
+        .Run();
+    insert.Reset();
+  }
+}
+
 /// Routes keep their ids (their listing order); their addresses become
 /// numbers.
 void CopyRoutes(Store& store) {
@@ -378,6 +387,7 @@ void MigrateLayout(Store& store, int64_t from) {
   CopyFilters(store);
   CopyVmPortAddresses(store);
   CopyRoutes(store);
+  CopyNeighbors(store);
   for (const std::string& table :
        Names(store, "SELECT name FROM sqlite_schema WHERE type = 'table' AND name LIKE "
                     "'layout2!_%' ESCAPE '!'"))

@@ -55,12 +55,12 @@ std::string NeighborText(const char* family, const Neighbor& neighbor,
 template <typename Neighbor>
 bool DeleteNeighbors(Store& store, int family, const Neighbor& neighbor,
                      const std::string& netstack) {
-  store
-      .Prepare("DELETE FROM ipsvc_neighbor WHERE family = ?1 AND address = ?2 AND interface IN "
-               "(SELECT name FROM tvknic WHERE netstack = ?3) AND (?4 = '' OR interface = ?4)")
-      .BindAll(family, neighbor.GetAddress().GetStringAddress(), netstack,
-               neighbor.GetInterfaceName())
-      .Run();
+  Statement remove = store.Prepare(
+      "DELETE FROM ipsvc_neighbor WHERE family = ?1 AND address = ?2 AND interface IN "
+      "(SELECT name FROM tvknic WHERE netstack = ?3) AND (?4 = '' OR interface = ?4)");
+  remove.Bind(1, family);
+  IpSvc::BindAddress(remove, 2, neighbor.GetAddress());
+  remove.Bind(3, netstack).Bind(4, neighbor.GetInterfaceName()).Run();
   return store.Changes() > 0;
 }
 
@@ -363,7 +363,7 @@ void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& l
     IpSvc::RequireNetstack(store, netstack_);
     Statement rows = NeighborRows(store, 4, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(Ipv4Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
+      list.emplace_back(IpSvc::Ipv4Column(rows, 0), rows.Text(1), rows.Text(2), rows.Int(3),
                         static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
   });
 }
@@ -379,7 +379,7 @@ void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& l
       return;
     Statement rows = NeighborRows(store, 6, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(Ipv6Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
+      list.emplace_back(IpSvc::Ipv6Column(rows, 0), rows.Text(1), rows.Text(2), rows.Int(3),
                         static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
   });
 }
