@@ -266,7 +266,7 @@ TEST_F(IpServicesTest, DnsChangesOfTwoWritersAreBothKept) {
 }
 
 TEST_F(IpServicesTest, HostsEntriesAreCheckedAndSystemEntriesStayHidden) {
-  Exec("INSERT INTO ipsvc_hosts(address, hostname, system) VALUES('127.0.0.1', 'localhost', 1)");
+  Exec("INSERT INTO ipsvc_hosts(address, hostname, system) VALUES(0x7F000001, 'localhost', 1)");
   HostsFile hosts;
   hosts.AddEntryFromUser("10.0.0.20", "build01.lab.example", {"build01", "ci", "b1"}, "");
   hosts.AddEntryFromUser("2001:DB8::20", "build02", {}, "second builder");

@@ -35,14 +35,6 @@ namespace {
 const char* const kRouteNetstack = "defaultTcpipStack";
 const char* const kRouteInterface = "tvk0";
 
-/// Dotted-decimal text of \p address.
-std::string Dotted(uint32_t address) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%u.%u.%u.%u", address >> 24, (address >> 16) & 255,
-                (address >> 8) & 255, address & 255);
-  return text;
-}
-
 /// A unicast MAC address with prefix \p oui (three bytes) and \p serial.
 std::string Mac(uint32_t oui, uint32_t serial) {
   char text[18];
@@ -282,8 +274,7 @@ void GenerateHostsEntries(Store& store, int64_t count) {
                     "VALUES(?, ?, ?, '', 0)");
   for (int64_t i = 0; i < count; ++i) {
     std::string alias = Numbered("node", i + 1, 6);
-    insert.BindAll(Dotted(0xAC100000 + static_cast<uint32_t>(i) + 1), alias + ".lab.example",
-                   alias);
+    insert.BindAll(int64_t{0xAC100000} + i + 1, alias + ".lab.example", alias);
     insert.Run();
     insert.Reset();
   }

@@ -148,6 +148,22 @@ void BindAddress(Statement& statement, int index, const Ipv6Address& address) {
   statement.BindBlob(index, address.GetBytes().data(), 16);
 }
 
+void BindAddress(Statement& statement, int index, const std::string& text) {
+  if (Ipv4Address::IsValidAddress(text))
+    BindAddress(statement, index, Ipv4Address(text));
+  else if (Ipv6Address::IsValidAddress(text))
+    BindAddress(statement, index, Ipv6Address(text));
+  else
+    throw HostCtlException("Invalid IP address '" + text + "'");
+}
+
+std::string AddressText(const Statement& row, int column) {
+  std::array<uint8_t, 16> bytes{};
+  if (row.Blob(column, bytes.data(), bytes.size()))
+    return Ipv6Address(bytes).GetStringAddress();
+  return Ipv4Column(row, column).GetStringAddress();
+}
+
 Ipv4Address Ipv4Column(const Statement& row, int column) {
   return Ipv4Address(static_cast<uint32_t>(row.Int(column)));
 }
@@ -401,14 +417,14 @@ void InsertHostsEntry(Store& store, const std::string& ip, const std::string& ho
     throw HostCtlException("The comment must be a single line");
   Statement existing = store.Prepare(
       "SELECT system FROM ipsvc_hosts WHERE address = ? AND hostname = ? COLLATE NOCASE");
-  existing.BindAll(address, hostname);
+  BindAddress(existing, 1, address);
+  existing.Bind(2, hostname);
   if (existing.Step())
     throw HostCtlException("An entry for " + address + " " + hostname + " already exists");
-  store
-      .Prepare("INSERT INTO ipsvc_hosts(address, hostname, aliases, comment, system) "
-               "VALUES(?, ?, ?, ?, ?)")
-      .BindAll(address, hostname, joined, comment, system)
-      .Run();
+  Statement insert = store.Prepare("INSERT INTO ipsvc_hosts(address, hostname, aliases, comment, "
+                                   "system) VALUES(?, ?, ?, ?, ?)");
+  BindAddress(insert, 1, address);
+  insert.Bind(2, hostname).Bind(3, joined).Bind(4, comment).Bind(5, system).Run();
 }
 
 void InsertSa(Store& store, const IpSecSadParam& sa) {

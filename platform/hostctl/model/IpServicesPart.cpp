@@ -89,11 +89,12 @@ CREATE TABLE ipsvc_dns_search(
 CREATE UNIQUE INDEX ipsvc_dns_search_by_ord ON ipsvc_dns_search(netstack, ord);
 CREATE INDEX ipsvc_dns_search_by_domain ON ipsvc_dns_search(netstack, domain COLLATE NOCASE);
 
--- The hosts table; `aliases` are separated by blanks. System entries are the
--- host's own and are not shown to or removable by users.
+-- The hosts table; the address is a number as in ipsvc_route (an IPv6
+-- address is the blob), `aliases` are separated by blanks. System entries are
+-- the host's own and are not shown to or removable by users.
 CREATE TABLE ipsvc_hosts(
   id INTEGER PRIMARY KEY,
-  address TEXT NOT NULL,
+  address NOT NULL,
   hostname TEXT NOT NULL,
   aliases TEXT NOT NULL DEFAULT '',
   comment TEXT NOT NULL DEFAULT '',
@@ -461,7 +462,8 @@ void EmitHostsEntries(Store& store, const ExportStreams::Emit& emit) {
       "SELECT address, hostname, aliases, comment, system FROM ipsvc_hosts ORDER BY id");
   enum { kAddress, kHostname, kAliases, kComment, kSystem };
   while (entry.Step()) {
-    ordered_json object = {{"address", entry.Text(kAddress)}, {"hostname", entry.Text(kHostname)}};
+    ordered_json object = {{"address", IpSvc::AddressText(entry, kAddress)},
+                           {"hostname", entry.Text(kHostname)}};
     std::vector<std::string> aliases = HostCtl::Misc::StringTokenize(entry.Text(kAliases), " ");
     if (!aliases.empty())
       object["aliases"] = aliases;

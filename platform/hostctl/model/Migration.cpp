@@ -74,7 +74,7 @@ void CopyUnchanged(Store& store) {
       "setting",          "portset",     "uplink",          "portgroup",         "world",
       "tvknic_ipv6",      "sriov_vf",    "pnic_attachment", "pnic_vlan_counter", "vswitch",
       "portgroup_policy", "dvswitch",    "tvknic_tag",      "tvknic_mcast",      "ipsvc_dns_server",
-      "ipsvc_dns_search", "ipsvc_hosts",
+      "ipsvc_dns_search",
 
       "ipsvc_connection", "ipsvc_world", "ipsvc_ipsec_sa",  "ipsvc_ipsec_sp",    "vm_port_mac",
       "ens_lcore",        "kmodule",     "fw_ruleset",      "fw_rule",           "fw_allowed_ip"};
@@ -340,6 +340,31 @@ void CopyNeighbors(Store& store) {
   }
 }
 
+/// Hosts entries keep their ids (their listing order); their addresses
+/// become numbers.
+void CopyHostsEntries(Store& store) {
+  Statement row = store.Prepare("SELECT id, address, hostname, aliases, comment, system FROM "
+                                "layout2_ipsvc_hosts ORDER BY id");
+  enum { kId, kAddress, kHostname, kAliases, kComment, kSystem };
+  Statement insert = store.Prepare("INSERT INTO ipsvc_hosts(id, address, hostname, aliases, "
+                                   "comment, system) VALUES(?, ?, ?, ?, ?, ?)");
+  while (row.Step()) {
+    insert.Bind(1, row.Int(kId));
+    try {
+      IpSvc::BindAddress(insert, 2, row.Text(kAddress));
+    } catch (const HostCtlException&) {
+      throw HostCtlException("The host state at " + store.GetPath() + " has a hosts entry " +
+                             row.Text(kAddress) + " that cannot be read; it was left as it was");
+    }
+    insert.Bind(3, row.Text(kHostname))
+        .Bind(4, row.Text(kAliases))
+        .Bind(5, row.Text(kComment))
+        .Bind(6, row.Int(kSystem))
+        .Run();
+    insert.Reset();
+  }
+}
+
 /// Routes keep their ids (their listing order); their addresses become
 /// numbers.
 void CopyRoutes(Store& store) {
@@ -388,6 +413,7 @@ void MigrateLayout(Store& store, int64_t from) {
   CopyVmPortAddresses(store);
   CopyRoutes(store);
   CopyNeighbors(store);
+  CopyHostsEntries(store);
   for (const std::string& table :
        Names(store, "SELECT name FROM sqlite_schema WHERE type = 'table' AND name LIKE "
                     "'layout2!_%' ESCAPE '!'"))

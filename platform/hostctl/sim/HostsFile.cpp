@@ -40,7 +40,8 @@ void HostsFile::RemoveEntryFromUser(const std::string& ip, const std::string& ho
   store.Write([&] {
     Statement row = store.Prepare(
         "SELECT id, system FROM ipsvc_hosts WHERE address = ? AND hostname = ? COLLATE NOCASE");
-    row.BindAll(address, hostname);
+    Model::IpSvc::BindAddress(row, 1, address);
+    row.Bind(2, hostname);
     if (!row.Step())
       throw HostCtlException("No entry for " + address + " " + hostname + " exists");
     if (row.Bool(1))
@@ -60,8 +61,8 @@ std::vector<std::shared_ptr<HostsFileEntry>> HostsFile::GetEntriesFromConfig() {
                                    "WHERE system = 0 ORDER BY id");
     while (rows.Step())
       entries.push_back(std::make_shared<HostsFileEntry>(
-          rows.Text(0), rows.Text(1), HostCtl::Misc::StringTokenize(rows.Text(2), " "),
-          rows.Text(3)));
+          Model::IpSvc::AddressText(rows, 0), rows.Text(1),
+          HostCtl::Misc::StringTokenize(rows.Text(2), " "), rows.Text(3)));
   });
   return entries;
 }
