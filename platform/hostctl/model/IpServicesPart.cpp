@@ -425,12 +425,6 @@ void ImportIpServices(const ordered_json& host, Store& store) {
   ImportIpsec(root, store);
 }
 
-/// Adds \p array to \p host under \p key unless it is empty.
-void PutArray(ordered_json& host, const char* key, ordered_json array) {
-  if (!array.empty())
-    host[key] = std::move(array);
-}
-
 /// The routes, in the order they were added.
 void EmitRoutes(Store& store, const ExportStreams::Emit& emit) {
   Statement route = store.Prepare("SELECT netstack, family, network, prefix, gateway, interface, "
@@ -495,114 +489,181 @@ void EmitNeighbors(Store& store, const ExportStreams::Emit& emit) {
   }
 }
 
-/// Puts the array that \p rows emits under \p key when \p table has rows.
-void PutStream(ordered_json& host, Store& store, ExportStreams& streams, const char* key,
-               const char* table, ExportStreams::Rows rows) {
-  Statement any =
-      store.Prepare((std::string("SELECT EXISTS(SELECT 1 FROM ") + table + ")").c_str());
-  if (any.Step() && any.Bool(0))
-    streams.Put(host, key, std::move(rows));
-}
-
-void ExportIpServices(ordered_json& host, Store& store, ExportStreams& streams) {
-  PutStream(host, store, streams, "routes", "ipsvc_route", EmitRoutes);
-
-  ordered_json gateways = ordered_json::array();
+/// The configured default gateways, one object per netstack that has any.
+void EmitGateways(Store& store, const ExportStreams::Emit& emit) {
   Statement gateway = store.Prepare("SELECT key, gateway4, gateway6 FROM netstack WHERE gateway4 "
                                     "IS NOT NULL OR gateway6 IS NOT NULL ORDER BY key");
+  enum { kNetstack, kIpv4, kIpv6 };
   while (gateway.Step()) {
-    ordered_json object = {{"netstack", gateway.Text(0)}};
-    if (!gateway.IsNull(1))
-      object["ipv4"] = gateway.Text(1);
-    if (!gateway.IsNull(2))
-      object["ipv6"] = gateway.Text(2);
-    gateways.push_back(std::move(object));
+    ordered_json object = {{"netstack", gateway.Text(kNetstack)}};
+    if (!gateway.IsNull(kIpv4))
+      object["ipv4"] = gateway.Text(kIpv4);
+    if (!gateway.IsNull(kIpv6))
+      object["ipv6"] = gateway.Text(kIpv6);
+    emit(object);
   }
-  PutArray(host, "defaultGateways", std::move(gateways));
+}
 
-  ordered_json dns = ordered_json::array();
+/// The resolver configuration of each netstack that has one.
+void EmitDns(Store& store, const ExportStreams::Emit& emit) {
   Statement netstacks = store.Prepare(
       "SELECT key FROM netstack WHERE key IN (SELECT netstack FROM ipsvc_dns_server UNION "
       "SELECT netstack FROM ipsvc_dns_search) ORDER BY ord");
   while (netstacks.Step()) {
+    std::string netstack = netstacks.Text(0);
     std::vector<std::string> servers;
     std::vector<std::string> domains;
-    IpSvc::LoadDns(store, netstacks.Text(0), servers, domains);
-    dns.push_back(
-        {{"netstack", netstacks.Text(0)}, {"servers", servers}, {"searchDomains", domains}});
+    IpSvc::LoadDns(store, netstack, servers, domains);
+    emit({{"netstack", netstack}, {"servers", servers}, {"searchDomains", domains}});
   }
-  PutArray(host, "dns", std::move(dns));
+}
 
-  PutStream(host, store, streams, "hostsEntries", "ipsvc_hosts", EmitHostsEntries);
-  PutStream(host, store, streams, "neighbors", "ipsvc_neighbor", EmitNeighbors);
-
-  ordered_json worlds = ordered_json::array();
+/// The worlds of host services.
+void EmitServiceWorlds(Store& store, const ExportStreams::Emit& emit) {
   Statement world = store.Prepare("SELECT id, name FROM ipsvc_world ORDER BY id");
   while (world.Step())
-    worlds.push_back({{"id", world.Int(0)}, {"name", world.Text(1)}});
-  PutArray(host, "serviceWorlds", std::move(worlds));
+    emit({{"id", world.Int(0)}, {"name", world.Text(1)}});
+}
 
-  ordered_json connections = ordered_json::array();
+/// The sockets of every netstack, in the order they were described.
+void EmitConnections(Store& store, const ExportStreams::Emit& emit) {
   Statement connection = store.Prepare(
       "SELECT netstack, protocol, recv_queue, send_queue, local_address, local_port, "
       "foreign_address, foreign_port, world_id, state, ccalgo FROM ipsvc_connection ORDER BY id");
+  enum {
+    kNetstack,
+    kProtocol,
+    kRecvQueue,
+    kSendQueue,
+    kLocalAddress,
+    kLocalPort,
+    kForeignAddress,
+    kForeignPort,
+    kWorldId,
+    kState,
+    kCcAlgorithm
+  };
   while (connection.Step())
-    connections.push_back({{"netstack", connection.Text(0)},
-                           {"protocol", kProtocols.at(connection.Int(1))},
-                           {"recvQueue", connection.Int(2)},
-                           {"sendQueue", connection.Int(3)},
-                           {"localAddress", connection.Text(4)},
-                           {"localPort", connection.Int(5)},
-                           {"foreignAddress", connection.Text(6)},
-                           {"foreignPort", connection.Int(7)},
-                           {"worldId", connection.Int(8)},
-                           {"state", connection.Int(9)},
-                           {"ccAlgorithm", connection.Text(10)}});
-  PutArray(host, "connections", std::move(connections));
+    emit({{"netstack", connection.Text(kNetstack)},
+          {"protocol", kProtocols.at(connection.Int(kProtocol))},
+          {"recvQueue", connection.Int(kRecvQueue)},
+          {"sendQueue", connection.Int(kSendQueue)},
+          {"localAddress", connection.Text(kLocalAddress)},
+          {"localPort", connection.Int(kLocalPort)},
+          {"foreignAddress", connection.Text(kForeignAddress)},
+          {"foreignPort", connection.Int(kForeignPort)},
+          {"worldId", connection.Int(kWorldId)},
+          {"state", connection.Int(kState)},
+          {"ccAlgorithm", connection.Text(kCcAlgorithm)}});
+}
 
-  ordered_json sas = ordered_json::array();
+/// The IPsec security associations.
+void EmitSas(Store& store, const ExportStreams::Emit& emit) {
   Statement sa = store.Prepare(
       "SELECT name, source, destination, spi, mode, encryption, encryption_key, integrity, "
       "integrity_key, state, lifetime FROM ipsvc_ipsec_sa ORDER BY id");
+  enum {
+    kName,
+    kSource,
+    kDestination,
+    kSpi,
+    kMode,
+    kEncryption,
+    kEncryptionKey,
+    kIntegrity,
+    kIntegrityKey,
+    kState,
+    kLifetime
+  };
   while (sa.Step()) {
-    ordered_json object = {{"name", sa.Text(0)},
-                           {"source", sa.Text(1)},
-                           {"destination", sa.Text(2)},
-                           {"spi", sa.Int(3)},
-                           {"mode", IpSecConfigImpl::SA_MODE.at(sa.Int(4))},
-                           {"encryption", IpSecConfigImpl::SA_ENCPT_ALG.at(sa.Int(5))}};
-    if (!sa.Text(6).empty())
-      object["encryptionKey"] = sa.Text(6);
-    object["integrity"] = IpSecConfigImpl::SA_AUTH_ALG.at(sa.Int(7));
-    object["integrityKey"] = sa.Text(8);
-    object["state"] = IpSecConfigImpl::SA_STATE.at(sa.Int(9));
-    object["lifetime"] = sa.Int(10);
-    sas.push_back(std::move(object));
+    ordered_json object = {{"name", sa.Text(kName)},
+                           {"source", sa.Text(kSource)},
+                           {"destination", sa.Text(kDestination)},
+                           {"spi", sa.Int(kSpi)},
+                           {"mode", IpSecConfigImpl::SA_MODE.at(sa.Int(kMode))},
+                           {"encryption", IpSecConfigImpl::SA_ENCPT_ALG.at(sa.Int(kEncryption))}};
+    if (std::string key = sa.Text(kEncryptionKey); !key.empty())
+      object["encryptionKey"] = key;
+    object["integrity"] = IpSecConfigImpl::SA_AUTH_ALG.at(sa.Int(kIntegrity));
+    object["integrityKey"] = sa.Text(kIntegrityKey);
+    object["state"] = IpSecConfigImpl::SA_STATE.at(sa.Int(kState));
+    object["lifetime"] = sa.Int(kLifetime);
+    emit(object);
   }
-  PutArray(host, "ipsecSAs", std::move(sas));
+}
 
-  ordered_json sps = ordered_json::array();
+/// The IPsec security policies.
+void EmitSps(Store& store, const ExportStreams::Emit& emit) {
   Statement sp = store.Prepare(
       "SELECT name, source, source_prefix, source_port, destination, destination_prefix, "
       "destination_port, protocol, direction, action, mode, sa_name, sa_lost FROM ipsvc_ipsec_sp "
       "ORDER BY id");
+  enum {
+    kName,
+    kSource,
+    kSourcePrefix,
+    kSourcePort,
+    kDestination,
+    kDestinationPrefix,
+    kDestinationPort,
+    kProtocol,
+    kDirection,
+    kAction,
+    kMode,
+    kSaName,
+    kSaLost
+  };
   while (sp.Step()) {
-    ordered_json object = {{"name", sp.Text(0)},
-                           {"source", sp.Text(1) + "/" + std::to_string(sp.Int(2))},
-                           {"sourcePort", sp.Int(3)},
-                           {"destination", sp.Text(4) + "/" + std::to_string(sp.Int(5))},
-                           {"destinationPort", sp.Int(6)},
-                           {"protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE.at(sp.Int(7))},
-                           {"direction", IpSecConfigImpl::SP_DIRECTION.at(sp.Int(8))},
-                           {"action", IpSecConfigImpl::SP_ACTION.at(sp.Int(9))},
-                           {"mode", IpSecConfigImpl::SA_MODE.at(sp.Int(10))}};
-    if (sp.Bool(12))
+    ordered_json object = {
+        {"name", sp.Text(kName)},
+        {"source", sp.Text(kSource) + "/" + std::to_string(sp.Int(kSourcePrefix))},
+        {"sourcePort", sp.Int(kSourcePort)},
+        {"destination", sp.Text(kDestination) + "/" + std::to_string(sp.Int(kDestinationPrefix))},
+        {"destinationPort", sp.Int(kDestinationPort)},
+        {"protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE.at(sp.Int(kProtocol))},
+        {"direction", IpSecConfigImpl::SP_DIRECTION.at(sp.Int(kDirection))},
+        {"action", IpSecConfigImpl::SP_ACTION.at(sp.Int(kAction))},
+        {"mode", IpSecConfigImpl::SA_MODE.at(sp.Int(kMode))}};
+    if (sp.Bool(kSaLost))
       object["saName"] = "UNKNOWN";
-    else if (!sp.Text(11).empty())
-      object["saName"] = sp.Text(11);
-    sps.push_back(std::move(object));
+    else if (std::string name = sp.Text(kSaName); !name.empty())
+      object["saName"] = name;
+    emit(object);
   }
-  PutArray(host, "ipsecSPs", std::move(sps));
+}
+
+/// One kind of object of the IP services in the host description: its
+/// top-level key, whether the host has any (an array is left out when
+/// empty), and its writer.
+struct ExportKind {
+  const char* key; ///< Top-level key of the array.
+  const char* any; ///< SQL that tells whether there is an element.
+  void (*emit)(Store& store, const ExportStreams::Emit& emit); ///< Writes the elements.
+};
+
+/// The kinds in the order of the description.
+const ExportKind kExportKinds[] = {
+    {"routes", "SELECT EXISTS(SELECT 1 FROM ipsvc_route)", EmitRoutes},
+    {"defaultGateways",
+     "SELECT EXISTS(SELECT 1 FROM netstack WHERE gateway4 IS NOT NULL OR gateway6 IS NOT NULL)",
+     EmitGateways},
+    {"dns",
+     "SELECT EXISTS(SELECT 1 FROM ipsvc_dns_server) OR EXISTS(SELECT 1 FROM ipsvc_dns_search)",
+     EmitDns},
+    {"hostsEntries", "SELECT EXISTS(SELECT 1 FROM ipsvc_hosts)", EmitHostsEntries},
+    {"neighbors", "SELECT EXISTS(SELECT 1 FROM ipsvc_neighbor)", EmitNeighbors},
+    {"serviceWorlds", "SELECT EXISTS(SELECT 1 FROM ipsvc_world)", EmitServiceWorlds},
+    {"connections", "SELECT EXISTS(SELECT 1 FROM ipsvc_connection)", EmitConnections},
+    {"ipsecSAs", "SELECT EXISTS(SELECT 1 FROM ipsvc_ipsec_sa)", EmitSas},
+    {"ipsecSPs", "SELECT EXISTS(SELECT 1 FROM ipsvc_ipsec_sp)", EmitSps},
+};
+
+void ExportIpServices(ordered_json& host, Store& store, ExportStreams& streams) {
+  for (const ExportKind& kind : kExportKinds) {
+    Statement any = store.Prepare(kind.any);
+    if (any.Step() && any.Bool(0))
+      streams.Put(host, kind.key, kind.emit);
+  }
 }
 
 } // namespace
