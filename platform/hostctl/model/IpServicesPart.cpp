@@ -222,48 +222,44 @@ void ImportRoute(const JsonObject& route, Store& store) {
   });
 }
 
-void ImportGateways(const JsonObject& root, Store& store) {
-  for (const JsonObject& gateways : root.Objects("defaultGateways")) {
-    std::string netstack = gateways.String("netstack", IpSvc::kDefaultNetstack);
-    AsField(gateways, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
-    if (gateways.Has("ipv4"))
-      AsField(gateways, "ipv4", [&] {
-        IpSvc::PutConfiguredGateway(store, netstack, 4,
-                                    Ipv4Address(gateways.String("ipv4")).GetStringAddress());
-      });
-    if (gateways.Has("ipv6"))
-      AsField(gateways, "ipv6", [&] {
-        IpSvc::PutConfiguredGateway(store, netstack, 6,
-                                    Ipv6Address(gateways.String("ipv6")).GetStringAddress());
-      });
-  }
+void ImportGateway(const JsonObject& gateways, Store& store) {
+  std::string netstack = gateways.String("netstack", IpSvc::kDefaultNetstack);
+  AsField(gateways, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+  if (gateways.Has("ipv4"))
+    AsField(gateways, "ipv4", [&] {
+      IpSvc::PutConfiguredGateway(store, netstack, 4,
+                                  Ipv4Address(gateways.String("ipv4")).GetStringAddress());
+    });
+  if (gateways.Has("ipv6"))
+    AsField(gateways, "ipv6", [&] {
+      IpSvc::PutConfiguredGateway(store, netstack, 6,
+                                  Ipv6Address(gateways.String("ipv6")).GetStringAddress());
+    });
 }
 
-void ImportDns(const JsonObject& root, Store& store) {
-  for (const JsonObject& dns : root.Objects("dns")) {
-    std::string netstack = dns.String("netstack", IpSvc::kDefaultNetstack);
-    AsField(dns, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
-    std::vector<std::string> servers;
-    for (const std::string& server : dns.Strings("servers")) {
-      AsField(dns, "servers", [&] {
-        servers.push_back(HostCtl::Network::IpAddress::FromString(server).GetStringAddress());
-      });
-      if (std::count(servers.begin(), servers.end(), servers.back()) > 1)
-        dns.Fail("servers", servers.back() + " is listed twice");
-    }
-    std::vector<std::string> domains = dns.Strings("searchDomains");
-    for (const std::string& domain : domains) {
-      AsField(dns, "searchDomains", [&] { IpSvc::CheckSearchDomain(domain); });
-      if (std::count(domains.begin(), domains.end(), domain) > 1)
-        dns.Fail("searchDomains", domain + " is listed twice");
-    }
-    std::vector<std::string> stored;
-    std::vector<std::string> ignored;
-    IpSvc::LoadDns(store, netstack, stored, ignored);
-    if (!stored.empty() || !ignored.empty())
-      dns.Fail("netstack", "netstack " + netstack + " is described twice");
-    IpSvc::SaveDns(store, netstack, servers, domains);
+void ImportDnsOfNetstack(const JsonObject& dns, Store& store) {
+  std::string netstack = dns.String("netstack", IpSvc::kDefaultNetstack);
+  AsField(dns, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+  std::vector<std::string> servers;
+  for (const std::string& server : dns.Strings("servers")) {
+    AsField(dns, "servers", [&] {
+      servers.push_back(HostCtl::Network::IpAddress::FromString(server).GetStringAddress());
+    });
+    if (std::count(servers.begin(), servers.end(), servers.back()) > 1)
+      dns.Fail("servers", servers.back() + " is listed twice");
   }
+  std::vector<std::string> domains = dns.Strings("searchDomains");
+  for (const std::string& domain : domains) {
+    AsField(dns, "searchDomains", [&] { IpSvc::CheckSearchDomain(domain); });
+    if (std::count(domains.begin(), domains.end(), domain) > 1)
+      dns.Fail("searchDomains", domain + " is listed twice");
+  }
+  std::vector<std::string> stored;
+  std::vector<std::string> ignored;
+  IpSvc::LoadDns(store, netstack, stored, ignored);
+  if (!stored.empty() || !ignored.empty())
+    dns.Fail("netstack", "netstack " + netstack + " is described twice");
+  IpSvc::SaveDns(store, netstack, servers, domains);
 }
 
 void ImportHostsEntry(const JsonObject& entry, Store& store) {
@@ -324,105 +320,120 @@ void ImportNeighbor(const JsonObject& neighbor, Store& store) {
   });
 }
 
-void ImportConnections(const JsonObject& root, Store& store) {
-  for (const JsonObject& world : root.Objects("serviceWorlds")) {
-    int64_t id = world.Int("id", 1, INT32_MAX);
-    Statement insert = store.Prepare("INSERT INTO ipsvc_world(id, name) VALUES(?, ?)");
-    insert.BindAll(id, world.String("name"));
-    AsField(world, "id", [&] {
-      try {
-        insert.Run();
-      } catch (const HostCtlException&) {
-        throw HostCtlException("world " + std::to_string(id) + " is listed twice");
-      }
-    });
-  }
-  for (const JsonObject& connection : root.Objects("connections")) {
-    std::string netstack = connection.String("netstack", IpSvc::kDefaultNetstack);
-    AsField(connection, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
-    int protocol = CodeOf(connection, "protocol", kProtocols, connection.String("protocol"));
-    std::string local;
-    std::string foreign;
-    AsField(connection, "localAddress", [&] {
-      local = HostCtl::Network::IpAddress::FromString(connection.String("localAddress"))
-                  .GetStringAddress();
-    });
-    AsField(connection, "foreignAddress", [&] {
-      foreign = HostCtl::Network::IpAddress::FromString(connection.String("foreignAddress"))
-                    .GetStringAddress();
-    });
-    store
-        .Prepare("INSERT INTO ipsvc_connection(netstack, protocol, recv_queue, send_queue, "
-                 "local_address, local_port, foreign_address, foreign_port, world_id, state, "
-                 "ccalgo) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")
-        .BindAll(netstack, protocol, connection.Int("recvQueue", 0, INT32_MAX, 0),
-                 connection.Int("sendQueue", 0, INT32_MAX, 0), local,
-                 connection.Int("localPort", 0, 65535, 0), foreign,
-                 connection.Int("foreignPort", 0, 65535, 0),
-                 connection.Int("worldId", 0, INT32_MAX, 0),
-                 connection.Int("state", 0, UINT32_MAX, 0), connection.String("ccAlgorithm", ""))
-        .Run();
-  }
+void ImportServiceWorld(const JsonObject& world, Store& store) {
+  int64_t id = world.Int("id", 1, INT32_MAX);
+  Statement insert = store.Prepare("INSERT INTO ipsvc_world(id, name) VALUES(?, ?)");
+  insert.BindAll(id, world.String("name"));
+  AsField(world, "id", [&] {
+    try {
+      insert.Run();
+    } catch (const HostCtlException&) {
+      throw HostCtlException("world " + std::to_string(id) + " is listed twice");
+    }
+  });
 }
 
-void ImportIpsec(const JsonObject& root, Store& store) {
-  for (const JsonObject& object : root.Objects("ipsecSAs")) {
-    HostCtl::Network::IpSecSadParam sa;
-    sa.name = object.String("name");
-    sa.srcAddress = object.String("source");
-    sa.dstAddress = object.String("destination");
-    sa.spi = static_cast<uint32_t>(object.Int("spi", 256, UINT32_MAX));
-    sa.mode = CodeOf(object, "mode",
-                     std::vector<std::string>(IpSecConfigImpl::SA_MODE.begin(),
-                                              IpSecConfigImpl::SA_MODE.begin() + 2),
-                     object.String("mode", IpSecConfigImpl::SA_MODE[0]));
-    sa.encryptionAlgorithm =
-        CodeOf(object, "encryption", IpSecConfigImpl::SA_ENCPT_ALG, object.String("encryption"));
-    sa.encryptionKey = object.String("encryptionKey", "");
-    sa.integrityAlgorithm =
-        CodeOf(object, "integrity", IpSecConfigImpl::SA_AUTH_ALG, object.String("integrity"));
-    sa.integrityKey = object.String("integrityKey");
-    sa.state = CodeOf(object, "state", IpSecConfigImpl::SA_STATE,
-                      object.String("state", IpSecConfigImpl::SA_STATE[1]));
-    sa.lifetime = static_cast<uint64_t>(object.Int("lifetime", 0, INT64_MAX, 0));
-    AsField(object, "name", [&] { IpSvc::InsertSa(store, sa); });
-  }
-  for (const JsonObject& object : root.Objects("ipsecSPs")) {
-    HostCtl::Network::IpSecSpdParam sp;
-    sp.name = object.String("name");
-    auto network = [&](const char* key, std::string& address, int& prefix) {
-      std::string text = object.String(key);
-      if (text == "any")
-        return;
-      AsField(object, key, [&] {
-        Ipv6Network parsed(text);
-        address = parsed.GetAddress().GetStringAddress();
-        prefix = parsed.GetNetmask();
-      });
-    };
-    network("source", sp.srcAddress, sp.srcPrefixLength);
-    network("destination", sp.dstAddress, sp.dstPrefixLength);
-    sp.srcPort = static_cast<uint32_t>(object.Int("sourcePort", 0, 65535, 0));
-    sp.dstPort = static_cast<uint32_t>(object.Int("destinationPort", 0, 65535, 0));
-    sp.ulProto = CodeOf(object, "protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE,
-                        object.String("protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE[0]));
-    sp.direction = CodeOf(object, "direction", IpSecConfigImpl::SP_DIRECTION,
-                          object.String("direction", IpSecConfigImpl::SP_DIRECTION[1]));
-    sp.action = CodeOf(object, "action", IpSecConfigImpl::SP_ACTION,
-                       object.String("action", IpSecConfigImpl::SP_ACTION[0]));
-    sp.mode = CodeOf(object, "mode", IpSecConfigImpl::SA_MODE,
-                     object.String("mode", IpSecConfigImpl::SA_MODE[2]));
-    sp.saName = object.String("saName", "");
-    AsField(object, "name", [&] { IpSvc::InsertSp(store, sp); });
-  }
+void ImportConnection(const JsonObject& connection, Store& store) {
+  std::string netstack = connection.String("netstack", IpSvc::kDefaultNetstack);
+  AsField(connection, "netstack", [&] { IpSvc::RequireNetstack(store, netstack); });
+  int protocol = CodeOf(connection, "protocol", kProtocols, connection.String("protocol"));
+  std::string local;
+  std::string foreign;
+  AsField(connection, "localAddress", [&] {
+    local = HostCtl::Network::IpAddress::FromString(connection.String("localAddress"))
+                .GetStringAddress();
+  });
+  AsField(connection, "foreignAddress", [&] {
+    foreign = HostCtl::Network::IpAddress::FromString(connection.String("foreignAddress"))
+                  .GetStringAddress();
+  });
+  store
+      .Prepare("INSERT INTO ipsvc_connection(netstack, protocol, recv_queue, send_queue, "
+               "local_address, local_port, foreign_address, foreign_port, world_id, state, "
+               "ccalgo) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")
+      .BindAll(netstack, protocol, connection.Int("recvQueue", 0, INT32_MAX, 0),
+               connection.Int("sendQueue", 0, INT32_MAX, 0), local,
+               connection.Int("localPort", 0, 65535, 0), foreign,
+               connection.Int("foreignPort", 0, 65535, 0),
+               connection.Int("worldId", 0, INT32_MAX, 0),
+               connection.Int("state", 0, UINT32_MAX, 0), connection.String("ccAlgorithm", ""))
+      .Run();
 }
+
+void ImportSa(const JsonObject& object, Store& store) {
+  HostCtl::Network::IpSecSadParam sa;
+  sa.name = object.String("name");
+  sa.srcAddress = object.String("source");
+  sa.dstAddress = object.String("destination");
+  sa.spi = static_cast<uint32_t>(object.Int("spi", 256, UINT32_MAX));
+  sa.mode = CodeOf(object, "mode",
+                   std::vector<std::string>(IpSecConfigImpl::SA_MODE.begin(),
+                                            IpSecConfigImpl::SA_MODE.begin() + 2),
+                   object.String("mode", IpSecConfigImpl::SA_MODE[0]));
+  sa.encryptionAlgorithm =
+      CodeOf(object, "encryption", IpSecConfigImpl::SA_ENCPT_ALG, object.String("encryption"));
+  sa.encryptionKey = object.String("encryptionKey", "");
+  sa.integrityAlgorithm =
+      CodeOf(object, "integrity", IpSecConfigImpl::SA_AUTH_ALG, object.String("integrity"));
+  sa.integrityKey = object.String("integrityKey");
+  sa.state = CodeOf(object, "state", IpSecConfigImpl::SA_STATE,
+                    object.String("state", IpSecConfigImpl::SA_STATE[1]));
+  sa.lifetime = static_cast<uint64_t>(object.Int("lifetime", 0, INT64_MAX, 0));
+  AsField(object, "name", [&] { IpSvc::InsertSa(store, sa); });
+}
+
+void ImportSp(const JsonObject& object, Store& store) {
+  HostCtl::Network::IpSecSpdParam sp;
+  sp.name = object.String("name");
+  auto network = [&](const char* key, std::string& address, int& prefix) {
+    std::string text = object.String(key);
+    if (text == "any")
+      return;
+    AsField(object, key, [&] {
+      Ipv6Network parsed(text);
+      address = parsed.GetAddress().GetStringAddress();
+      prefix = parsed.GetNetmask();
+    });
+  };
+  network("source", sp.srcAddress, sp.srcPrefixLength);
+  network("destination", sp.dstAddress, sp.dstPrefixLength);
+  sp.srcPort = static_cast<uint32_t>(object.Int("sourcePort", 0, 65535, 0));
+  sp.dstPort = static_cast<uint32_t>(object.Int("destinationPort", 0, 65535, 0));
+  sp.ulProto = CodeOf(object, "protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE,
+                      object.String("protocol", IpSecConfigImpl::SP_UL_PROTO_TYPE[0]));
+  sp.direction = CodeOf(object, "direction", IpSecConfigImpl::SP_DIRECTION,
+                        object.String("direction", IpSecConfigImpl::SP_DIRECTION[1]));
+  sp.action = CodeOf(object, "action", IpSecConfigImpl::SP_ACTION,
+                     object.String("action", IpSecConfigImpl::SP_ACTION[0]));
+  sp.mode = CodeOf(object, "mode", IpSecConfigImpl::SA_MODE,
+                   object.String("mode", IpSecConfigImpl::SA_MODE[2]));
+  sp.saName = object.String("saName", "");
+  AsField(object, "name", [&] { IpSvc::InsertSp(store, sp); });
+}
+
+/// One kind of object of the IP services that the part imports from the
+/// whole document: its top-level key and the reader of one element.
+struct ImportKind {
+  const char* key;                                                ///< Top-level key of the array.
+  void (*importElement)(const JsonObject& element, Store& store); ///< Reads one element.
+};
+
+/// The kinds in import order (SPs name SAs). Routes, hosts entries and
+/// neighbours are streamed (the part's `streamed` list) and come after.
+const ImportKind kImportKinds[] = {
+    {"defaultGateways", ImportGateway},
+    {"dns", ImportDnsOfNetstack},
+    {"serviceWorlds", ImportServiceWorld},
+    {"connections", ImportConnection},
+    {"ipsecSAs", ImportSa},
+    {"ipsecSPs", ImportSp},
+};
 
 void ImportIpServices(const ordered_json& host, Store& store) {
   JsonObject root(host, "");
-  ImportGateways(root, store);
-  ImportDns(root, store);
-  ImportConnections(root, store);
-  ImportIpsec(root, store);
+  for (const ImportKind& kind : kImportKinds)
+    for (const JsonObject& element : root.Objects(kind.key))
+      kind.importElement(element, store);
 }
 
 /// The routes, in the order they were added.
