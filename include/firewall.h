@@ -7,7 +7,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "common/CommandBase.h"
+#include "CommandBase.h"
 
 #include <memory>
 #include <vector>

@@ -7,7 +7,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
-#include "common/CommandBase.h"
+#include "CommandBase.h"
 
 namespace HostCtl::Network {
 struct PnicInfo;

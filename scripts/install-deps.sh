@@ -9,14 +9,15 @@
 #          (libnl for the Linux host)
 #   test   build, plus what the test suite runs (xmllint, sqlite3, iproute2,
 #          ethtool, groff for the manual page check)
-#   ci     test, plus clang and its libFuzzer runtime for the fuzz stage
+#   ci     test, plus clang and its libFuzzer runtime for the fuzz stage, and
+#          clang-tidy
 set -euo pipefail
 
 build=(build-essential cmake ninja-build ccache pkg-config python3 libsqlite3-dev
        nlohmann-json3-dev libboost-regex-dev libgtest-dev libgmock-dev libbenchmark-dev
        libnl-3-dev libnl-route-3-dev libnl-genl-3-dev libnl-xfrm-3-dev)
 test=("${build[@]}" libxml2-utils sqlite3 iproute2 ethtool groff-base)
-ci=("${test[@]}" clang libclang-rt-14-dev)
+ci=("${test[@]}" clang libclang-rt-14-dev clang-tidy)
 
 case "${1:-}" in
   build) wanted=("${build[@]}") ;;

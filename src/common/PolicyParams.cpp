@@ -13,8 +13,6 @@ namespace CorvexCli::NetworkNamespace {
 
 using Fabrik::CallSpec::InputSpec;
 using Fabrik::CallSpec::OutputSpec;
-using Fabrik::CallSpec::ParameterConstraint;
-using Fabrik::CallSpec::ParameterSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaInt;
 using Fabrik::MetaObj::MetaList;
@@ -56,116 +54,71 @@ const std::string kFieldBurstSize = "Burst Size";
 
 namespace {
 
-/// One value of a string enumeration with its description.
-struct EnumChoice {
-  const char* value;       ///< Accepted value.
-  const char* description; ///< Its description.
+const EnumChoice kLoadBalancingChoices[] = {
+    {"portid", "Route based on the originating virtual port ID."},
+    {"iphash", "Route based on hashing the src and destination IP addresses"},
+    {"mac", "Route based on the MAC address of the packet source."},
+    {"explicit", "Always use the highest order uplink from the list of active adapters which "
+                 "pass failover criteria."},
 };
 
-/// One parameter of a policy family.
-struct PolicyParam {
-  const std::string& name;              ///< Long name.
-  const char* shortName;                ///< Short name.
-  Fabrik::CallSpec::ParameterType type; ///< Value type.
-  const char* description;              ///< Description.
-  std::vector<EnumChoice> choices;      ///< String enumeration, if any.
+const EnumChoice kFailureDetectionChoices[] = {
+    {"link", "Detect failures based on the NIC link state"},
+    {"beacon", "Detect failures based on active beaconing to the vswitch"},
 };
 
-const std::vector<PolicyParam> kFailoverParams = {
-    {kParamLoadBalancing,
-     "l",
-     Fabrik::CallSpec::String,
+const ParameterDef kFailoverParams[] = {
+    {kParamLoadBalancing, "l", Fabrik::CallSpec::String, false,
      "Set the load balancing policy for this policy. This can be one of the following options: "
      "%FULLENUM%",
-     {{"portid", "Route based on the originating virtual port ID."},
-      {"iphash", "Route based on hashing the src and destination IP addresses"},
-      {"mac", "Route based on the MAC address of the packet source."},
-      {"explicit", "Always use the highest order uplink from the list of active adapters which "
-                   "pass failover criteria."}}},
-    {kParamFailureDetection,
-     "f",
-     Fabrik::CallSpec::String,
+     ParameterCheck::OneOf(kLoadBalancingChoices)},
+    {kParamFailureDetection, "f", Fabrik::CallSpec::String, false,
      "Set the method of determining how a network outage is detected. %FULLENUM%",
-     {{"link", "Detect failures based on the NIC link state"},
-      {"beacon", "Detect failures based on active beaconing to the vswitch"}}},
-    {kParamNotifySwitches,
-     "n",
-     Fabrik::CallSpec::Boolean,
-     "Indicate whether to send a notification to physical switches on failover",
-     {}},
-    {kParamFailback,
-     "b",
-     Fabrik::CallSpec::Boolean,
+     ParameterCheck::OneOf(kFailureDetectionChoices)},
+    {kParamNotifySwitches, "n", Fabrik::CallSpec::Boolean, false,
+     "Indicate whether to send a notification to physical switches on failover"},
+    {kParamFailback, "b", Fabrik::CallSpec::Boolean, false,
      "Configure whether a NIC will be used immediately when it comes back in service after a "
-     "failover",
-     {}},
-    {kParamActiveUplinks,
-     "a",
-     Fabrik::CallSpec::String,
+     "failover"},
+    {kParamActiveUplinks, "a", Fabrik::CallSpec::String, false,
      "Configure the list of active adapters and their failover order. This list must be a comma "
      "seperated list of values with the uplink name and no spaces. Example:  "
-     "--active-uplinks=vmnic0,vmnic3,vmnic7,vmnic1",
-     {}},
-    {kParamStandbyUplinks,
-     "s",
-     Fabrik::CallSpec::String,
+     "--active-uplinks=vmnic0,vmnic3,vmnic7,vmnic1"},
+    {kParamStandbyUplinks, "s", Fabrik::CallSpec::String, false,
      "Configure the list of standby adapters and their failover order. This list must be a comma "
      "seperated list of values with the uplink name and no spaces. Example:  "
-     "--standby-uplinks=vmnic2,vmnic4,vmnic8,vmnic6,vmnic11",
-     {}},
+     "--standby-uplinks=vmnic2,vmnic4,vmnic8,vmnic6,vmnic11"},
 };
 
-const std::vector<PolicyParam> kSecurityParams = {
-    {kParamAllowPromiscuous,
-     "o",
-     Fabrik::CallSpec::Boolean,
-     "Allow ports on the virtual switch to enter promiscuous mode.",
-     {}},
-    {kParamAllowMacChange,
-     "m",
-     Fabrik::CallSpec::Boolean,
-     "Allow ports on the virtual switch to change their MAC address.",
-     {}},
-    {kParamAllowForgedTransmits,
-     "f",
-     Fabrik::CallSpec::Boolean,
-     "Allow ports on the virtual switch to send packets with forged source information.",
-     {}},
+const ParameterDef kSecurityParams[] = {
+    {kParamAllowPromiscuous, "o", Fabrik::CallSpec::Boolean, false,
+     "Allow ports on the virtual switch to enter promiscuous mode."},
+    {kParamAllowMacChange, "m", Fabrik::CallSpec::Boolean, false,
+     "Allow ports on the virtual switch to change their MAC address."},
+    {kParamAllowForgedTransmits, "f", Fabrik::CallSpec::Boolean, false,
+     "Allow ports on the virtual switch to send packets with forged source information."},
 };
 
-/// The three shaping rates: parameter, short name, description.
-struct RateParam {
-  const std::string& name; ///< Long name.
-  const char* shortName;   ///< Short name.
-  const char* description; ///< Description.
-};
-const RateParam kRateParams[] = {
-    {kParamAvgBandwidth, "b",
+/// Each rate is at least 1; the upper bound is checked once scaled.
+constexpr ParameterCheck kRateRange = ParameterCheck::Range(1, std::numeric_limits<long>::max());
+
+const ParameterDef kShapingParams[] = {
+    {kParamEnabled, "e", Fabrik::CallSpec::Boolean, false,
+     "Indicate whether to enable traffic shaping on this policy. If this is true then the "
+     "--avg-bandwidth, --peak-bandwidth and --burst-size options are required."},
+    {kParamAvgBandwidth, "b", Fabrik::CallSpec::Integer, false,
      "The averge bandwidth allowed for this shaping policy. This value is in Kbps (1 Kbps = 1000 "
-     "bits/s)"},
-    {kParamPeakBandwidth, "k",
+     "bits/s)",
+     kRateRange},
+    {kParamPeakBandwidth, "k", Fabrik::CallSpec::Integer, false,
      "The peak bandwidth allowed for this shaping policy. This value is in Kbps (1 Kbps = 1000 "
-     "bits/s)"},
-    {kParamBurstSize, "t",
+     "bits/s)",
+     kRateRange},
+    {kParamBurstSize, "t", Fabrik::CallSpec::Integer, false,
      "The largest burst size allowed for this shaping policy. This value is in Kib (1 Kib = 1024 "
-     "bits)"},
+     "bits)",
+     kRateRange},
 };
-
-void AddParams(const std::shared_ptr<InputSpec>& spec, const std::vector<PolicyParam>& params) {
-  for (const PolicyParam& param : params) {
-    auto parameter = ParameterSpec::New(param.name, param.type);
-    parameter->SetShortName(param.shortName);
-    parameter->SetDescription(param.description);
-    parameter->SetRequired(false);
-    if (!param.choices.empty()) {
-      auto constraint = ParameterConstraint::New(Fabrik::CallSpec::StringEnum);
-      for (const EnumChoice& choice : param.choices)
-        constraint->AddStringEnum(choice.value, choice.description);
-      parameter->SetConstraint(constraint);
-    }
-    spec->AddParameter(parameter);
-  }
-}
 
 /// Load-balancing parameter values and the team policy type each selects.
 struct TeamChoice {
@@ -226,43 +179,16 @@ bool ScaledRate(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
 
 } // namespace
 
-void AddParameterTable(const std::shared_ptr<InputSpec>& spec,
-                       const std::vector<ParameterDef>& table) {
-  for (const ParameterDef& def : table) {
-    auto parameter = ParameterSpec::New(def.name, def.type);
-    parameter->SetShortName(def.shortName);
-    parameter->SetDescription(def.description);
-    parameter->SetRequired(def.required);
-    spec->AddParameter(parameter);
-  }
-}
-
 void AddFailoverParameters(const std::shared_ptr<InputSpec>& spec) {
-  AddParams(spec, kFailoverParams);
+  AddParameters(*spec, kFailoverParams);
 }
 
 void AddSecurityParameters(const std::shared_ptr<InputSpec>& spec) {
-  AddParams(spec, kSecurityParams);
+  AddParameters(*spec, kSecurityParams);
 }
 
 void AddShapingParameters(const std::shared_ptr<InputSpec>& spec) {
-  auto enabled = ParameterSpec::New(kParamEnabled, Fabrik::CallSpec::Boolean);
-  enabled->SetShortName("e");
-  enabled->SetDescription("Indicate whether to enable traffic shaping on this policy. If this is "
-                          "true then the --avg-bandwidth, --peak-bandwidth and --burst-size "
-                          "options are required.");
-  enabled->SetRequired(false);
-  spec->AddParameter(enabled);
-  auto range = ParameterConstraint::New(Fabrik::CallSpec::IntRange);
-  range->SetIntRange(1, std::numeric_limits<long>::max());
-  for (const RateParam& rate : kRateParams) {
-    auto parameter = ParameterSpec::New(rate.name, Fabrik::CallSpec::Integer);
-    parameter->SetShortName(rate.shortName);
-    parameter->SetDescription(rate.description);
-    parameter->SetRequired(false);
-    parameter->SetConstraint(range);
-    spec->AddParameter(parameter);
-  }
+  AddParameters(*spec, kShapingParams);
 }
 
 namespace {
@@ -560,11 +486,4 @@ std::string JoinFields(const std::vector<std::string>& fields) {
     joined += (joined.empty() ? "" : ",") + field;
   return joined;
 }
-
-std::shared_ptr<OutputSpec> BoolResult() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 } // namespace CorvexCli::NetworkNamespace

@@ -15,6 +15,7 @@
 #include "Fabrik/Call.h"
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Policy.h"
+#include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 
 #include <cstdint>
@@ -54,10 +55,6 @@ extern const std::string kFieldEnabled;
 extern const std::string kFieldAverageBandwidth;
 extern const std::string kFieldPeakBandwidth;
 extern const std::string kFieldBurstSize;
-
-/// Appends one parameter per entry of \p table, in order.
-void AddParameterTable(const std::shared_ptr<Fabrik::CallSpec::InputSpec>& spec,
-                       const std::vector<ParameterDef>& table);
 
 /// Appends load-balancing, failure-detection, notify-switches, failback,
 /// active-uplinks and standby-uplinks.
@@ -162,8 +159,5 @@ void WithPolicyHolder(const std::shared_ptr<Fabrik::CallSpec::Input>& input,
 
 /// Joins field names with ",".
 std::string JoinFields(const std::vector<std::string>& fields);
-
-/// The output specification of a command whose result is one boolean.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolResult();
 
 } // namespace CorvexCli::NetworkNamespace

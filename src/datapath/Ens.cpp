@@ -10,6 +10,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "common/FieldTable.h"
 #include "common/ParameterTable.h"
 
 namespace CorvexCli::NetworkNamespace {
@@ -64,13 +65,6 @@ const ParameterDef kAffinitySetParameters[] = {
     {kLcoreIdParam, "l", Fabrik::CallSpec::Integer, true, "ENS context id."},
     {kAffinityParam, "a", Fabrik::CallSpec::Integer, true, "Numa node affinity."},
 };
-
-std::shared_ptr<OutputSpec> RootSpec(MetaObjectPtr root) {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(std::move(root));
-  return spec;
-}
-
 /// Runs \p call on the network information object and makes its value the
 /// result; a host failure becomes the error.
 template <typename Call> void RunEnsCall(Output& output, Call call) {
@@ -100,7 +94,7 @@ std::shared_ptr<InputSpec> EnsMaxlcoresGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsMaxlcoresGet::GetOutputSpecInternal() {
-  return RootSpec(MetaInt::New());
+  return ResultSpec(MetaInt::New());
 }
 
 void EnsMaxlcoresGet::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -123,7 +117,7 @@ std::shared_ptr<InputSpec> EnsMaxlcoresSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsMaxlcoresSet::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsMaxlcoresSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -148,7 +142,7 @@ std::shared_ptr<InputSpec> EnsLcoreAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreAdd::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -172,7 +166,7 @@ std::shared_ptr<InputSpec> EnsLcoreRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreRemove::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -208,7 +202,7 @@ std::shared_ptr<MetaStruct> EnsLcoreList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreList::GetOutputSpecInternal() {
-  return RootSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void EnsLcoreList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -244,7 +238,7 @@ std::shared_ptr<InputSpec> EnsLcoreSwitchGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreSwitchGet::GetOutputSpecInternal() {
-  return RootSpec(MetaString::New());
+  return ResultSpec(MetaString::New());
 }
 
 void EnsLcoreSwitchGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -269,7 +263,7 @@ std::shared_ptr<InputSpec> EnsLcoreSwitchAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreSwitchAdd::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreSwitchAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -296,7 +290,7 @@ std::shared_ptr<InputSpec> EnsLcoreSwitchRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreSwitchRemove::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreSwitchRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -323,7 +317,7 @@ std::shared_ptr<InputSpec> EnsLcoreAffinityGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreAffinityGet::GetOutputSpecInternal() {
-  return RootSpec(MetaInt::New());
+  return ResultSpec(MetaInt::New());
 }
 
 void EnsLcoreAffinityGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -349,7 +343,7 @@ std::shared_ptr<InputSpec> EnsLcoreAffinitySet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> EnsLcoreAffinitySet::GetOutputSpecInternal() {
-  return RootSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void EnsLcoreAffinitySet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -4,6 +4,7 @@
 // host's (ordinary) kernel interfaces.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "datapath.h"
 
 #include "Fabrik/Call.h"
@@ -51,9 +52,7 @@ std::shared_ptr<CallSpec::InputSpec> MulticastGroupList::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> MulticastGroupList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void MulticastGroupList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,

@@ -4,6 +4,7 @@
 // byte counters of one virtual port, and the counters of its active filters.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "datapath.h"
 
 #include "HostCtl/Lib.h"
@@ -161,9 +162,7 @@ std::shared_ptr<MetaStruct> PortStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> PortStatsGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void PortStatsGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -234,9 +233,7 @@ std::shared_ptr<MetaStruct> PortFilterStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> PortFilterStatsGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void PortFilterStatsGet::ExecuteInternal(const std::shared_ptr<Input>& input,

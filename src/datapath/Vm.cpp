@@ -4,6 +4,7 @@
 // on the host's switches, and the ports of one VM.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "datapath.h"
 
 #include "HostCtl/Lib.h"
@@ -111,9 +112,7 @@ std::shared_ptr<MetaStruct> VMList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VMList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VMList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -188,9 +187,7 @@ std::shared_ptr<MetaStruct> VMPortList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VMPortList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VMPortList::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -54,13 +54,6 @@ const ParameterDef kChangeParameters[] = {
 const ParameterDef kClientParameters[] = {
     {kRulesetIdParam, "r", Fabrik::CallSpec::String, true, "The label of the ruleset."},
 };
-
-std::shared_ptr<OutputSpec> BoolOutputSpec() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 /// Adds an entry to, or removes one from, the allowed-IP list of the ruleset
 /// named by the command's parameters.
 void ChangeAllowedIp(const Input& input, Output& output,
@@ -131,7 +124,7 @@ std::shared_ptr<MetaStruct> FirewallRulesetAllowedipList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetAllowedipList::GetOutputSpecInternal() {
-  return ListSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void FirewallRulesetAllowedipList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -174,7 +167,7 @@ std::shared_ptr<InputSpec> FirewallRulesetAllowedipAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetAllowedipAdd::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallRulesetAllowedipAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -197,7 +190,7 @@ std::shared_ptr<InputSpec> FirewallRulesetAllowedipRemove::GetInputSpecInternal(
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetAllowedipRemove::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallRulesetAllowedipRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -228,9 +221,7 @@ std::shared_ptr<MetaStruct> FirewallRulesetClientGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetClientGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void FirewallRulesetClientGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -263,7 +254,7 @@ std::shared_ptr<InputSpec> FirewallRulesetClientAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetClientAdd::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallRulesetClientAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -295,7 +286,7 @@ std::shared_ptr<InputSpec> FirewallRulesetClientRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetClientRemove::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallRulesetClientRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -6,6 +6,7 @@
 //
 //===----------------------------------------------------------------------===//
 #include "firewall.h"
+#include "common/FieldTable.h"
 
 #include "HostCtl/Lib.h"
 #include "TvkCtl/System/ModuleImpl.h"
@@ -42,13 +43,6 @@ const ParameterDef kSetParameters[] = {
      "Set to true to set defaultaction PASS, set to false to DROP."},
 };
 
-/// The output specification of the commands whose result is a boolean.
-std::shared_ptr<OutputSpec> BoolOutputSpec() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
-}
-
 } // namespace
 
 // network firewall get
@@ -75,9 +69,7 @@ std::shared_ptr<MetaStruct> FirewallGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void FirewallGet::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -117,7 +109,7 @@ std::shared_ptr<InputSpec> FirewallSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallSet::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -168,7 +160,7 @@ std::shared_ptr<InputSpec> FirewallLoad::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallLoad::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallLoad::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -199,7 +191,7 @@ std::shared_ptr<InputSpec> FirewallRefresh::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRefresh::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallRefresh::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -228,7 +220,7 @@ std::shared_ptr<InputSpec> FirewallUnload::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallUnload::GetOutputSpecInternal() {
-  return BoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void FirewallUnload::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,

@@ -11,6 +11,7 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/System/FirewallRuleset.h"
 #include "TvkCtl/System/SystemInfoImpl.h"
+#include "common/FieldTable.h"
 
 #include <memory>
 #include <vector>
@@ -45,14 +46,6 @@ void ListRulesets(const Fabrik::CallSpec::Input& input, Fabrik::CallSpec::Output
   } catch (const HostCtl::Lib::HostCtlException& e) {
     output.AddErrorMessage(e.what());
   }
-}
-
-/// The output specification of a list of \p rowShape.
-inline std::shared_ptr<Fabrik::CallSpec::OutputSpec>
-ListSpec(const std::shared_ptr<Fabrik::MetaObj::MetaStruct>& rowShape) {
-  auto spec = Fabrik::CallSpec::OutputSpec::New();
-  spec->SetRootObject(Fabrik::MetaObj::MetaList::New(Fabrik::MetaObj::Struct, rowShape));
-  return spec;
 }
 
 } // namespace CorvexCli::NetworkNamespace

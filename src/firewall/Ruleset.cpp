@@ -117,7 +117,7 @@ std::shared_ptr<MetaStruct> FirewallRulesetList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetList::GetOutputSpecInternal() {
-  return ListSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void FirewallRulesetList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -148,9 +148,7 @@ std::shared_ptr<InputSpec> FirewallRulesetSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetSet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
+  return BoolResultSpec();
 }
 
 void FirewallRulesetSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -227,7 +225,7 @@ std::shared_ptr<MetaStruct> FirewallRulesetRuleList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> FirewallRulesetRuleList::GetOutputSpecInternal() {
-  return ListSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void FirewallRulesetRuleList::ExecuteInternal(const std::shared_ptr<Input>& input,

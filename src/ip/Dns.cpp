@@ -9,7 +9,9 @@
 #include "HostCtl/Lib.h"
 #include "HostCtl/Misc.h"
 #include "TvkCtl/Network/DnsConfigImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <optional>
 
@@ -33,8 +35,8 @@ namespace {
 const std::string kDnsServers = "DNS Servers";
 const std::string kDnsSearchDomains = "DNS Search Domains";
 
-const ParamDef kNetstackParam = {"netstack", Fabrik::CallSpec::String, "N", false,
-                                 kNetstackDescription};
+const ParameterDef kNetstackParam = {"netstack", "N", Fabrik::CallSpec::String, false,
+                                     kNetstackDescription};
 
 /// The server address the user typed, IPv4 tried first; nothing (with the
 /// error added) when neither family accepts it.
@@ -80,11 +82,11 @@ std::shared_ptr<InputSpec> IpDNSServerList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<MetaStruct> IpDNSServerList::GetOutputStructure() {
-  return MakeStructure("NameServerList", {{kDnsServers.c_str(), Fabrik::MetaObj::List}});
+  return MakeStructure("NameServerList", {{kDnsServers, FieldKind::StringList}});
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerList::GetOutputSpecInternal() {
-  return MakeOutputSpec(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpDNSServerList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -115,13 +117,13 @@ IpDNSServerAdd::~IpDNSServerAdd() = default;
 
 std::shared_ptr<InputSpec> IpDNSServerAdd::GetInputSpecInternal() {
   return MakeInputSpec(
-      {{"server", Fabrik::CallSpec::String, "s", true,
+      {{"server", "s", Fabrik::CallSpec::String, true,
         "The IP address (v4 or v6) of the DNS server to add to the DNS server list."},
        kNetstackParam});
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSServerAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -146,13 +148,13 @@ IpDNSServerRemove::IpDNSServerRemove() {
 IpDNSServerRemove::~IpDNSServerRemove() = default;
 
 std::shared_ptr<InputSpec> IpDNSServerRemove::GetInputSpecInternal() {
-  return MakeInputSpec({{"all", Fabrik::CallSpec::Flag, "a", false, " "},
-                        {"server", Fabrik::CallSpec::String, "s", false, " "},
+  return MakeInputSpec({{"all", "a", Fabrik::CallSpec::Flag, false, " "},
+                        {"server", "s", Fabrik::CallSpec::String, false, " "},
                         kNetstackParam});
 }
 
 std::shared_ptr<OutputSpec> IpDNSServerRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSServerRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -187,13 +189,13 @@ IpDNSSearchAdd::IpDNSSearchAdd() {
 IpDNSSearchAdd::~IpDNSSearchAdd() = default;
 
 std::shared_ptr<InputSpec> IpDNSSearchAdd::GetInputSpecInternal() {
-  return MakeInputSpec({{"domain", Fabrik::CallSpec::String, "d", true,
+  return MakeInputSpec({{"domain", "d", Fabrik::CallSpec::String, true,
                          "The string name of a domain to add to the list of search domains."},
                         kNetstackParam});
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSSearchAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -216,13 +218,13 @@ IpDNSSearchRemove::IpDNSSearchRemove() {
 IpDNSSearchRemove::~IpDNSSearchRemove() = default;
 
 std::shared_ptr<InputSpec> IpDNSSearchRemove::GetInputSpecInternal() {
-  return MakeInputSpec({{"domain", Fabrik::CallSpec::String, "d", true,
+  return MakeInputSpec({{"domain", "d", Fabrik::CallSpec::String, true,
                          "The string name of a domain to remove from the list of search domains."},
                         kNetstackParam});
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpDNSSearchRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -250,11 +252,11 @@ std::shared_ptr<InputSpec> IpDNSSearchList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<MetaStruct> IpDNSSearchList::GetOutputStructure() {
-  return MakeStructure("DNSSearchList", {{kDnsSearchDomains.c_str(), Fabrik::MetaObj::List}});
+  return MakeStructure("DNSSearchList", {{kDnsSearchDomains, FieldKind::StringList}});
 }
 
 std::shared_ptr<OutputSpec> IpDNSSearchList::GetOutputSpecInternal() {
-  return MakeOutputSpec(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpDNSSearchList::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -8,7 +8,9 @@
 
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/HostsFile.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -29,10 +31,10 @@ const std::string kHostName = "HostName";
 const std::string kAliases = "Aliases";
 const std::string kComment = "Comment";
 
-const ParamDef kIpParam = {"ip", Fabrik::CallSpec::String, "I", true,
-                           "The IP address (v4 or v6) of the host."};
-const ParamDef kHostnameParam = {"hostname", Fabrik::CallSpec::String, "H", true,
-                                 "The name of the host."};
+const ParameterDef kIpParam = {"ip", "I", Fabrik::CallSpec::String, true,
+                               "The IP address (v4 or v6) of the host."};
+const ParameterDef kHostnameParam = {"hostname", "H", Fabrik::CallSpec::String, true,
+                                     "The name of the host."};
 
 } // namespace
 
@@ -54,15 +56,14 @@ std::shared_ptr<InputSpec> IpHostsList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<MetaStruct> IpHostsList::GetOutputStructure() {
-  using namespace Fabrik::MetaObj;
-  return MakeStructure("IpHostList", {{kIpAddress.c_str(), String},
-                                      {kHostName.c_str(), String},
-                                      {kAliases.c_str(), List},
-                                      {kComment.c_str(), String}});
+  return MakeStructure("IpHostList", {{kIpAddress, FieldKind::String},
+                                      {kHostName, FieldKind::String},
+                                      {kAliases, FieldKind::StringList},
+                                      {kComment, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpHostsList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpHostsList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -100,12 +101,12 @@ std::shared_ptr<InputSpec> IpHostsAdd::GetInputSpecInternal() {
   return MakeInputSpec(
       {kIpParam,
        kHostnameParam,
-       {"alias", Fabrik::CallSpec::StringList, "A", false, "The list of aliases of the host."},
-       {"comment", Fabrik::CallSpec::String, "C", false, "Comment line of this item"}});
+       {"alias", "A", Fabrik::CallSpec::StringList, false, "The list of aliases of the host."},
+       {"comment", "C", Fabrik::CallSpec::String, false, "Comment line of this item"}});
 }
 
 std::shared_ptr<OutputSpec> IpHostsAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpHostsAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -139,7 +140,7 @@ std::shared_ptr<InputSpec> IpHostsRemove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpHostsRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpHostsRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

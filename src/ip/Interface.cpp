@@ -225,26 +225,17 @@ void SetConnectionFields(TvkNic& nic, MetaObj::MetaStruct& row, CallSpec::Output
   }
 }
 
-std::shared_ptr<CallSpec::ParameterConstraint> InterfaceNameConstraint() {
-  auto constraint = CallSpec::ParameterConstraint::New(CallSpec::StringRegex);
-  constraint->SetStringRegex(kInterfaceNamePattern);
-  return constraint;
-}
+/// An interface name that ostracli creates or removes: tvk0 to tvk255.
+const ParameterCheck kInterfaceNameCheck = ParameterCheck::Matching(kInterfaceNamePattern);
 
-std::shared_ptr<CallSpec::ParameterConstraint> RangeConstraint(long min, long max) {
-  auto constraint = CallSpec::ParameterConstraint::New(CallSpec::IntRange);
-  constraint->SetIntRange(min, max);
-  return constraint;
-}
-
-const ParamRow kDvsNameParam = {
+const ParameterDef kDvsNameParam = {
     "dvs-name", "s", CallSpec::String, false,
     "DVSwitch name of the connection point. This requires --dvport-id to be given in the same "
     "command"};
-const ParamRow kDvportIdParam = {
+const ParameterDef kDvportIdParam = {
     "dvport-id", "P", CallSpec::String, false,
     "DVPort ID of the connection point. This requires --dvs-name to be given in the same command"};
-const ParamRow kNetstackUseDefaultParam = {
+const ParameterDef kNetstackUseDefaultParam = {
     "netstack", "N", CallSpec::String, false,
     "The network stack instance; if unspecified, use the default netstack instance"};
 
@@ -279,15 +270,15 @@ std::shared_ptr<MetaObj::MetaStruct> IpInterfaceList::GetOutputStructure() {
                                            {kKrxName, FieldKind::String},
                                            {kKrxUuid, FieldKind::String},
                                            {kKrxPort, FieldKind::String},
-                                           {kKrxConnection, FieldKind::Int},
+                                           {kKrxConnection, FieldKind::Integer},
                                            {kOpaqueNetworkId, FieldKind::String},
                                            {kOpaqueNetworkType, FieldKind::String},
                                            {kExternalId, FieldKind::String},
-                                           {kMtu, FieldKind::Int},
-                                           {kTsoMss, FieldKind::Int},
-                                           {kRxDispQueueSize, FieldKind::Int},
-                                           {kEnabled, FieldKind::Bool},
-                                           {kPortId, FieldKind::Int}});
+                                           {kMtu, FieldKind::Integer},
+                                           {kTsoMss, FieldKind::Integer},
+                                           {kRxDispQueueSize, FieldKind::Integer},
+                                           {kEnabled, FieldKind::Boolean},
+                                           {kPortId, FieldKind::Integer}});
 }
 
 std::shared_ptr<CallSpec::InputSpec> IpInterfaceList::GetInputSpecInternal() {
@@ -299,7 +290,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -334,30 +325,29 @@ IpInterfaceAdd::IpInterfaceAdd() {
 IpInterfaceAdd::~IpInterfaceAdd() = default;
 
 std::shared_ptr<CallSpec::InputSpec> IpInterfaceAdd::GetInputSpecInternal() {
-  auto spec = MakeInputSpec(
+  return MakeInputSpec(
       {kNetstackUseDefaultParam,
        {"portgroup-name", "p", CallSpec::String, false,
         "The name of the vswitch port group to add this Tarvik network interface to."},
        kDvsNameParam,
        kDvportIdParam,
        {"mtu", "m", CallSpec::Integer, false,
-        "Set the MTU setting for a given Tarvik network interface on creation"},
+        "Set the MTU setting for a given Tarvik network interface on creation",
+        ParameterCheck::Range(HostCtl::Network::TvkNic::MIN_MTU,
+                              HostCtl::Network::TvkNic::MAX_MTU)},
        {"num-rxqueue", "R", CallSpec::Integer, false,
-        "Set the number of RX dispatch queues for a given Tarvik network interface on creation"},
+        "Set the number of RX dispatch queues for a given Tarvik network interface on creation",
+        ParameterCheck::Range(1, 1000)},
        {"mac-address", "M", CallSpec::String, false,
         "Set the MAC address for the newly created Tarvik network interface."},
        {"interface-name", "i", CallSpec::String, false,
         "The name of the Tarvik network interface to create. This name must be in the form tvkX, "
-        "where X is a number 0-255"}});
-  spec->FindParameter("mtu")->SetConstraint(
-      RangeConstraint(HostCtl::Network::TvkNic::MIN_MTU, HostCtl::Network::TvkNic::MAX_MTU));
-  spec->FindParameter("num-rxqueue")->SetConstraint(RangeConstraint(1, 1000));
-  spec->FindParameter(kInterfaceName)->SetConstraint(InterfaceNameConstraint());
-  return spec;
+        "where X is a number 0-255",
+        kInterfaceNameCheck}});
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -446,7 +436,7 @@ IpInterfaceRemove::IpInterfaceRemove() {
 IpInterfaceRemove::~IpInterfaceRemove() = default;
 
 std::shared_ptr<CallSpec::InputSpec> IpInterfaceRemove::GetInputSpecInternal() {
-  auto spec = MakeInputSpec(
+  return MakeInputSpec(
       {kNetstackUseDefaultParam,
        {"portgroup-name", "p", CallSpec::String, false,
         "The name of the vswitch port group to delete this Tarvik network interface from."},
@@ -454,13 +444,12 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceRemove::GetInputSpecInternal() {
        kDvportIdParam,
        {"interface-name", "i", CallSpec::String, false,
         "The name of the Tarvik network interface to remove. This name must be in the form tvkX, "
-        "where X is a number 0-255"}});
-  spec->FindParameter(kInterfaceName)->SetConstraint(InterfaceNameConstraint());
-  return spec;
+        "where X is a number 0-255",
+        kInterfaceNameCheck}});
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -538,7 +527,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

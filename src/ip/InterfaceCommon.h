@@ -1,94 +1,21 @@
 //===- ip/InterfaceCommon.h - Tables shared by the kernel interface families ===//
 //
-// The kernel interface, IPv4, IPv6, tag, netstack and multicast commands
-// declare their parameters and result fields from tables; these helpers turn
-// a table into an input specification or a result structure.
+// The kernel interface, IPv4 and IPv6 commands share the choice of the
+// interfaces a listing shows and the loop that lists them; their parameter
+// and field tables are those of common/ParameterTable.h and FieldTable.h.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
 
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
+#include "HostCtl/Network/TvkNic.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
 #include "ip/IpCommon.h"
 
-#include <initializer_list>
 #include <memory>
 #include <string>
-
-namespace CorvexCli::NetworkNamespace {
-
-/// One parameter of a command.
-struct ParamRow {
-  const char* name;                     ///< Long name.
-  const char* shortName;                ///< One letter, or "" for none.
-  Fabrik::CallSpec::ParameterType type; ///< Value type.
-  bool required;                        ///< Must be given.
-  const char* description;              ///< Help text.
-};
-
-/// An input specification with \p rows in order.
-inline std::shared_ptr<Fabrik::CallSpec::InputSpec>
-MakeInputSpec(std::initializer_list<ParamRow> rows) {
-  auto spec = Fabrik::CallSpec::InputSpec::New();
-  for (const ParamRow& row : rows) {
-    auto parameter = Fabrik::CallSpec::ParameterSpec::New(row.name, row.type);
-    if (*row.shortName)
-      parameter->SetShortName(row.shortName);
-    parameter->SetDescription(row.description);
-    parameter->SetRequired(row.required);
-    spec->AddParameter(parameter);
-  }
-  return spec;
-}
-
-/// Kind of a result field.
-enum class FieldKind { String, Int, Bool };
-
-/// One field of a result structure.
-struct FieldRow {
-  const std::string& name; ///< Field name.
-  FieldKind kind;          ///< Value type.
-};
-
-/// A result structure \p name with \p rows in order, each field empty.
-inline std::shared_ptr<Fabrik::MetaObj::MetaStruct>
-MakeStructure(const std::string& name, std::initializer_list<FieldRow> rows) {
-  auto structure = Fabrik::MetaObj::MetaStruct::New(name);
-  for (const FieldRow& row : rows) {
-    switch (row.kind) {
-    case FieldKind::String:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaString::New());
-      break;
-    case FieldKind::Int:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaInt::New());
-      break;
-    case FieldKind::Bool:
-      structure->SetField(row.name, Fabrik::MetaObj::MetaBool::New());
-      break;
-    }
-  }
-  return structure;
-}
-
-/// An output specification whose root is a boolean (action commands).
-inline std::shared_ptr<Fabrik::CallSpec::OutputSpec> MakeBoolOutputSpec() {
-  auto spec = Fabrik::CallSpec::OutputSpec::New();
-  spec->SetRootObject(Fabrik::MetaObj::MetaBool::New());
-  return spec;
-}
-
-/// An output specification whose root is a list of \p element structures.
-inline std::shared_ptr<Fabrik::CallSpec::OutputSpec>
-MakeListOutputSpec(std::shared_ptr<Fabrik::MetaObj::MetaStruct> element) {
-  auto spec = Fabrik::CallSpec::OutputSpec::New();
-  spec->SetRootObject(Fabrik::MetaObj::MetaList::New(Fabrik::MetaObj::Struct, std::move(element)));
-  return spec;
-}
-
-} // namespace CorvexCli::NetworkNamespace
-
-#include "HostCtl/Network/TvkNic.h"
-
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace {

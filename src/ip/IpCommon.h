@@ -1,18 +1,23 @@
 //===- IpCommon.h - What every IP service family reads the same way -------===//
 //
 // The netstack a command works on and the "type" selector of the listings,
-// shared by the families that declare their parameters with ParamTable.h and
-// by those that use InterfaceCommon.h.
+// shared by every IP family.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
 
 #include "Fabrik/Call.h"
+#include "HostCtl/Network/NetworkInfo.h"
 #include "HostCtl/Network/PortsetGetType.h"
 
+#include <memory>
 #include <string>
 
 namespace CorvexCli::NetworkNamespace {
+
+/// The description of the "netstack" parameter.
+inline const char* const kNetstackDescription =
+    "The network stack instance; if unspecified, use the default netstack instance";
 
 /// The netstack a command works on: the "netstack" parameter when it is given
 /// and not empty, else the default instance.
@@ -41,6 +46,12 @@ inline bool ReadListType(const Fabrik::CallSpec::Input& input, Fabrik::CallSpec:
   }
   selector = HostCtl::Network::PortsetGetSystem;
   return true;
+}
+
+/// The kernel-interface service of the session's host, made by the factory so
+/// that the command works on whichever host backend the session chose.
+inline std::unique_ptr<HostCtl::Network::TvKernelNicInfo> KernelNicService() {
+  return HostCtl::Network::NetworkFactory::GetNetworkInfo()->GetTvKernelNicInfo();
 }
 
 } // namespace CorvexCli::NetworkNamespace

@@ -10,7 +10,9 @@
 #include "HostCtl/Misc.h"
 #include "HostCtl/Network/Address.h"
 #include "TvkCtl/Network/IpSecConfigImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <sstream>
 
@@ -29,6 +31,13 @@ using HostCtl::Network::IpSecSpdParam;
 using TvkCtl::Network::IpSecConfigImpl;
 
 namespace {
+
+const EnumChoice kModeChoices[] = {{"transport"}, {"tunnel"}};
+const EnumChoice kEncryptionChoices[] = {{"null"}, {"3des-cbc"}, {"aes128-cbc"}};
+const EnumChoice kIntegrityChoices[] = {{"hmac-sha1"}, {"hmac-sha2-256"}};
+const EnumChoice kActionChoices[] = {{"none"}, {"discard"}, {"ipsec"}};
+const EnumChoice kUpperLayerChoices[] = {{"any"}, {"tcp"}, {"udp"}, {"icmp6"}};
+const EnumChoice kFlowChoices[] = {{"in"}, {"out"}};
 
 // Fields of "SecurityAssociation" and "SecurityPolicy".
 const std::string kName = "Name";
@@ -129,41 +138,31 @@ IpIpsecSAAdd::~IpIpsecSAAdd() = default;
 std::shared_ptr<InputSpec> IpIpsecSAAdd::GetInputSpecInternal() {
   using Fabrik::CallSpec::String;
   return MakeInputSpec({
-      {"sa-name", String, "n", true, "Name for the Security Association to be added."},
-      {"sa-source", String, "s", true,
+      {"sa-name", "n", String, true, "Name for the Security Association to be added."},
+      {"sa-source", "s", String, true,
        "Ipv6 address of Security Association source. Can be specified a correct IPv6 address."},
-      {"sa-destination", String, "d", true,
+      {"sa-destination", "d", String, true,
        "Ipv6 address of Security Association destination. Can be specified a correct IPv6 "
        "address."},
-      {"sa-mode",
-       String,
-       "m",
-       false,
-       "Security Association mode. Should be one in set %ENUM%.",
-       {"transport", "tunnel"}},
-      {"sa-spi", String, "p", true, "SPI value for the Security Association(hex)."},
-      {"encryption-algorithm",
-       String,
-       "e",
-       true,
+      {"sa-mode", "m", String, false, "Security Association mode. Should be one in set %ENUM%.",
+       ParameterCheck::OneOf(kModeChoices)},
+      {"sa-spi", "p", String, true, "SPI value for the Security Association(hex)."},
+      {"encryption-algorithm", "e", String, true,
        "Encryption algorithm for the Security Association. Should be one in set %ENUM%.",
-       {"null", "3des-cbc", "aes128-cbc"}},
-      {"encryption-key", String, "k", false,
+       ParameterCheck::OneOf(kEncryptionChoices)},
+      {"encryption-key", "k", String, false,
        "Encryption key(ASCII or hex). Length of hex key is dependent upon algorithm used. "
        "Required when a encryption algorithm has been specified."},
-      {"integrity-algorithm",
-       String,
-       "i",
-       true,
+      {"integrity-algorithm", "i", String, true,
        "Integrity algorithm for the Security Association. Should be one in set %ENUM%.",
-       {"hmac-sha1", "hmac-sha2-256"}},
-      {"integrity-key", String, "K", true,
+       ParameterCheck::OneOf(kIntegrityChoices)},
+      {"integrity-key", "K", String, true,
        "Integrity key(ASCII or hex). Length of hex key is dependent upon algorithm used."},
   });
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSAAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -211,23 +210,23 @@ std::shared_ptr<InputSpec> IpIpsecSARemove::GetInputSpecInternal() {
   using Fabrik::CallSpec::Flag;
   using Fabrik::CallSpec::String;
   return MakeInputSpec({
-      {"sa-name", String, "n", false,
+      {"sa-name", "n", String, false,
        "Name for the Security Association to be removed. Specify 'auto' to remove an auto SA."},
-      {"remove-all", Flag, "a", false, "Set to remove all Security Associations."},
-      {"sa-source", String, "s", false,
+      {"remove-all", "a", Flag, false, "Set to remove all Security Associations."},
+      {"sa-source", "s", String, false,
        "Ipv6 address of Security Association source. This option needs to be specified when "
        "removing an auto SA."},
-      {"sa-destination", String, "d", false,
+      {"sa-destination", "d", String, false,
        "Ipv6 address of Security Association destination. This option needs to be specified "
        "when removing an auto SA."},
-      {"sa-spi", String, "p", false,
+      {"sa-spi", "p", String, false,
        "SPI value for the Security Association (hex). This option needs to be specified when "
        "removing an auto SA"},
   });
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSARemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSARemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -285,19 +284,19 @@ std::shared_ptr<InputSpec> IpIpsecSAList::GetInputSpecInternal() {
 
 std::shared_ptr<MetaStruct> IpIpsecSAList::GetOutputStructure() {
   using Fabrik::MetaObj::String;
-  return MakeStructure("SecurityAssociation", {{kName.c_str(), String},
-                                               {kSourceAddress.c_str(), String},
-                                               {kDestinationAddress.c_str(), String},
-                                               {kState.c_str(), String},
-                                               {kSpi.c_str(), String},
-                                               {kMode.c_str(), String},
-                                               {kEncryptionAlgorithm.c_str(), String},
-                                               {kIntegrityAlgorithm.c_str(), String},
-                                               {kLifetime.c_str(), String}});
+  return MakeStructure("SecurityAssociation", {{kName, FieldKind::String},
+                                               {kSourceAddress, FieldKind::String},
+                                               {kDestinationAddress, FieldKind::String},
+                                               {kState, FieldKind::String},
+                                               {kSpi, FieldKind::String},
+                                               {kMode, FieldKind::String},
+                                               {kEncryptionAlgorithm, FieldKind::String},
+                                               {kIntegrityAlgorithm, FieldKind::String},
+                                               {kLifetime, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSAList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpIpsecSAList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -342,49 +341,35 @@ std::shared_ptr<InputSpec> IpIpsecSPAdd::GetInputSpecInternal() {
   using Fabrik::CallSpec::Integer;
   using Fabrik::CallSpec::String;
   return MakeInputSpec({
-      {"sp-name", String, "n", true, "Name for the Security Policy to be added."},
-      {"sa-name", String, "a", false,
+      {"sp-name", "n", String, true, "Name for the Security Policy to be added."},
+      {"sa-name", "a", String, false,
        "Name for the Security Association. Not being Specified lets tarvik automatically choose "
        "an Security Association. If no applicable Security Association exists, then tarvik may "
        "request one using IKE."},
-      {"sp-source", String, "s", true,
+      {"sp-source", "s", String, true,
        "Ipv6 address and prefix length of Security Policy source. Can be specified as 'any' or a "
        "correct IPv6 network address."},
-      {"sp-destination", String, "d", true,
+      {"sp-destination", "d", String, true,
        "Ipv6 address and prefix length of Security Policy destination. Can be specified as 'any' "
        "or a correct Ipv6 network address."},
-      {"sp-mode",
-       String,
-       "m",
-       false,
-       "Security Policy mode. Should be one in set %ENUM%.",
-       {"transport", "tunnel"}},
-      {"source-port", Integer, "p", true, "Source Port for Security Policy. '0' stands for 'any'"},
-      {"destination-port", Integer, "P", true,
+      {"sp-mode", "m", String, false, "Security Policy mode. Should be one in set %ENUM%.",
+       ParameterCheck::OneOf(kModeChoices)},
+      {"source-port", "p", Integer, true, "Source Port for Security Policy. '0' stands for 'any'"},
+      {"destination-port", "P", Integer, true,
        "Destination Port for Security Policy. '0' stands for 'any'"},
-      {"action",
-       String,
-       "A",
-       false,
-       "Action for Security Policy. Should be one in set %ENUM%.",
-       {"none", "discard", "ipsec"}},
-      {"upper-layer-protocol",
-       String,
-       "u",
-       false,
+      {"action", "A", String, false, "Action for Security Policy. Should be one in set %ENUM%.",
+       ParameterCheck::OneOf(kActionChoices)},
+      {"upper-layer-protocol", "u", String, false,
        "Upper layer protocol for Security Policy, Should be one in set %ENUM%.",
-       {"any", "tcp", "udp", "icmp6"}},
-      {"flow-direction",
-       String,
-       "w",
-       false,
+       ParameterCheck::OneOf(kUpperLayerChoices)},
+      {"flow-direction", "w", String, false,
        "Flow direction for Security Policy. Should be one in set %ENUM%.",
-       {"in", "out"}},
+       ParameterCheck::OneOf(kFlowChoices)},
   });
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPAdd::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSPAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -429,14 +414,14 @@ IpIpsecSPRemove::~IpIpsecSPRemove() = default;
 
 std::shared_ptr<InputSpec> IpIpsecSPRemove::GetInputSpecInternal() {
   return MakeInputSpec({
-      {"sp-name", Fabrik::CallSpec::String, "n", false,
+      {"sp-name", "n", Fabrik::CallSpec::String, false,
        "Name for the Security Policy to be removed."},
-      {"remove-all", Fabrik::CallSpec::Flag, "a", false, "Set to remove all Security Policys"},
+      {"remove-all", "a", Fabrik::CallSpec::Flag, false, "Set to remove all Security Policys"},
   });
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpIpsecSPRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -479,20 +464,20 @@ std::shared_ptr<InputSpec> IpIpsecSPList::GetInputSpecInternal() {
 std::shared_ptr<MetaStruct> IpIpsecSPList::GetOutputStructure() {
   using Fabrik::MetaObj::Integer;
   using Fabrik::MetaObj::String;
-  return MakeStructure("SecurityPolicy", {{kName.c_str(), String},
-                                          {kSourceAddress.c_str(), String},
-                                          {kSourcePort.c_str(), Integer},
-                                          {kDestinationAddress.c_str(), String},
-                                          {kDestinationPort.c_str(), Integer},
-                                          {kProtocol.c_str(), String},
-                                          {kFlow.c_str(), String},
-                                          {kAction.c_str(), String},
-                                          {kMode.c_str(), String},
-                                          {kSaName.c_str(), String}});
+  return MakeStructure("SecurityPolicy", {{kName, FieldKind::String},
+                                          {kSourceAddress, FieldKind::String},
+                                          {kSourcePort, FieldKind::Integer},
+                                          {kDestinationAddress, FieldKind::String},
+                                          {kDestinationPort, FieldKind::Integer},
+                                          {kProtocol, FieldKind::String},
+                                          {kFlow, FieldKind::String},
+                                          {kAction, FieldKind::String},
+                                          {kMode, FieldKind::String},
+                                          {kSaName, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpIpsecSPList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpIpsecSPList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,

@@ -23,6 +23,14 @@ using HostCtl::Network::TvkNic;
 
 namespace {
 
+/// The values of --type of ipv4 set.
+const EnumChoice kAddressTypeChoices[] = {
+    {"static", "Set Static IPv4 information for this interface. Requires --ipv4 and --netmask "
+               "options."},
+    {"dhcp", "Use DHCP to aquire IPv4 setting for this interface."},
+    {"none", "Remove IPv4 settings form this interface."},
+};
+
 const std::string kIpv4Interface = "IPv4Interface";
 const std::string kName = "Name";
 const std::string kIpv4Address = "IPv4 Address";
@@ -60,7 +68,7 @@ std::shared_ptr<MetaObj::MetaStruct> IpInterfaceIpv4Get::GetOutputStructure() {
                                         {kIpv4Broadcast, FieldKind::String},
                                         {kAddressType, FieldKind::String},
                                         {kGateway, FieldKind::String},
-                                        {kDhcpDns, FieldKind::Bool}});
+                                        {kDhcpDns, FieldKind::Boolean}});
 }
 
 std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Get::GetInputSpecInternal() {
@@ -74,7 +82,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Get::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv4Get::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv4Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -123,11 +131,12 @@ IpInterfaceIpv4Set::IpInterfaceIpv4Set() {
 IpInterfaceIpv4Set::~IpInterfaceIpv4Set() = default;
 
 std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Set::GetInputSpecInternal() {
-  auto spec = MakeInputSpec(
+  return MakeInputSpec(
       {{"interface-name", "i", CallSpec::String, true,
         "The name of the Tarvik network interface to set IPv4 settings for. This name must be an "
         "interface listed in the interface list command."},
-       {"type", "t", CallSpec::String, false, "IPv4 Address type: %FULLENUM%"},
+       {"type", "t", CallSpec::String, false, "IPv4 Address type: %FULLENUM%",
+        ParameterCheck::OneOf(kAddressTypeChoices)},
        {"ipv4", "I", CallSpec::String, false, "The static IPv4 address for this interface."},
        {"netmask", "N", CallSpec::String, false, "The static IPv4 netmask for this interface."},
        {"gateway", "g", CallSpec::String, false,
@@ -136,17 +145,10 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv4Set::GetInputSpecInternal() 
        {"peer-dns", "P", CallSpec::Boolean, false,
         "A boolean value to indicate if the system should use the DNS settings published via "
         "DHCPv4 for this interface."}});
-  auto types = CallSpec::ParameterConstraint::New(CallSpec::StringEnum);
-  types->AddStringEnum("static", "Set Static IPv4 information for this interface. Requires "
-                                 "--ipv4 and --netmask options.");
-  types->AddStringEnum("dhcp", "Use DHCP to aquire IPv4 setting for this interface.");
-  types->AddStringEnum("none", "Remove IPv4 settings form this interface.");
-  spec->FindParameter("type")->SetConstraint(types);
-  return spec;
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv4Set::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv4Set::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -11,7 +11,6 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Address.h"
-#include "TvkCtl/Network/TvkNicImpl.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -85,8 +84,7 @@ void ChangeIpv6Address(const CallSpec::Input& input, CallSpec::Output& output, b
       output.AddErrorMessage(kBadIpv6Format);
       return;
     }
-    TvkCtl::Network::TvKernelNicInfoImpl service;
-    auto nic = service.GetTvKernelNicByInterface(name, false, 0);
+    auto nic = KernelNicService()->GetTvKernelNicByInterface(name, false, 0);
     if (!nic) {
       output.AddErrorMessage(kNoTarvikInterface + name);
       return;
@@ -155,10 +153,10 @@ IpInterfaceIpv6Get::~IpInterfaceIpv6Get() = default;
 
 std::shared_ptr<MetaObj::MetaStruct> IpInterfaceIpv6Get::GetOutputStructure() {
   return MakeStructure(kIpv6Interface, {{kName, FieldKind::String},
-                                        {kIpv6Enabled, FieldKind::Bool},
-                                        {kDhcpv6Enabled, FieldKind::Bool},
-                                        {kRouterAdvEnabled, FieldKind::Bool},
-                                        {kDhcpDns, FieldKind::Bool},
+                                        {kIpv6Enabled, FieldKind::Boolean},
+                                        {kDhcpv6Enabled, FieldKind::Boolean},
+                                        {kRouterAdvEnabled, FieldKind::Boolean},
+                                        {kDhcpDns, FieldKind::Boolean},
                                         {kGateway, FieldKind::String}});
 }
 
@@ -173,15 +171,15 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6Get::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6Get::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv6Get::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
                                          const std::shared_ptr<CallSpec::Output>& output) {
   try {
-    TvkCtl::Network::TvKernelNicInfoImpl service;
+    std::unique_ptr<HostCtl::Network::TvKernelNicInfo> service = KernelNicService();
     ListTvkNics(
-        service, *input, *output, [this] { return GetOutputStructure(); },
+        *service, *input, *output, [this] { return GetOutputStructure(); },
         [](MetaObj::MetaStruct& row, TvkNic& nic) {
           IpConfig config = nic.GetIpConfig();
           row.SetField(kIpv6Enabled, config.GetUseIpv6());
@@ -229,15 +227,14 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6Set::GetInputSpecInternal() 
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6Set::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6Set::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
                                          const std::shared_ptr<CallSpec::Output>& output) {
   const std::string& name = input->GetParameter(kInterfaceName);
   try {
-    TvkCtl::Network::TvKernelNicInfoImpl service;
-    auto nic = service.GetTvKernelNicByInterface(name, false, 0);
+    auto nic = KernelNicService()->GetTvKernelNicByInterface(name, false, 0);
     if (!nic) {
       output->AddErrorMessage(kNoTarvikInterface + name);
       return;
@@ -300,7 +297,7 @@ IpInterfaceIpv6AddressList::~IpInterfaceIpv6AddressList() = default;
 std::shared_ptr<MetaObj::MetaStruct> IpInterfaceIpv6AddressList::GetOutputStructure() {
   return MakeStructure(kIpv6Interface, {{kInterface, FieldKind::String},
                                         {kAddress, FieldKind::String},
-                                        {kNetmask, FieldKind::Int},
+                                        {kNetmask, FieldKind::Integer},
                                         {kType, FieldKind::String},
                                         {kStatus, FieldKind::String}});
 }
@@ -314,7 +311,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressList::GetInputSpecInt
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceIpv6AddressList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -324,18 +321,18 @@ void IpInterfaceIpv6AddressList::ExecuteInternal(const std::shared_ptr<CallSpec:
     HostCtl::Network::PortsetGetType selector;
     if (!ReadListType(*input, *output, selector, false))
       return;
-    TvkCtl::Network::TvKernelNicInfoImpl service;
+    std::unique_ptr<HostCtl::Network::TvKernelNicInfo> service = KernelNicService();
     std::vector<std::unique_ptr<TvkNic>> nics;
     if (input->HasParameter(kInterfaceName)) {
       const std::string& name = input->GetParameter(kInterfaceName);
-      auto nic = service.GetTvKernelNicByInterface(name, false, selector);
+      auto nic = service->GetTvKernelNicByInterface(name, false, selector);
       if (!nic) {
         output->AddErrorMessage(kNoTarvikInterface + name);
         return;
       }
       nics.push_back(std::move(nic));
     } else {
-      nics = service.GetTvKernelNics(selector);
+      nics = service->GetTvKernelNics(selector);
     }
     auto list = MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure());
     for (const auto& nic : nics) {
@@ -378,7 +375,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressAdd::GetInputSpecInte
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6AddressAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -405,7 +402,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceIpv6AddressRemove::GetInputSpecI
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceIpv6AddressRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceIpv6AddressRemove::ExecuteInternal(

@@ -10,9 +10,10 @@
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/RoutingInfoImpl.h"
-#include "TvkCtl/Network/TvkNicImpl.h"
 #include "TvkCtl/Resource/ResourceInfoImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 #include <array>
 
@@ -30,6 +31,10 @@ using HostCtl::Network::TcpIpConnection;
 using TvkCtl::Network::RoutingInfoImpl;
 
 namespace {
+
+const EnumChoice kListVersionChoices[] = {{"4"}, {"6"}, {"all"}};
+const EnumChoice kRemoveVersionChoices[] = {{"4"}, {"6"}};
+const EnumChoice kConnectionTypeChoices[] = {{"ip"}, {"tcp"}, {"udp"}, {"all"}};
 
 const std::string kDefaultNetstack = "defaultTcpipStack";
 const std::string kNoInterface = "Unable to find a Tarvik interface with the name ";
@@ -114,28 +119,28 @@ IpNeighborList::~IpNeighborList() = default;
 
 std::shared_ptr<InputSpec> IpNeighborList::GetInputSpecInternal() {
   return MakeInputSpec({
-      {"version", Fabrik::CallSpec::String, "v", false, "IP version: %ENUM%", {"4", "6", "all"}},
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
-      {"interface-name", Fabrik::CallSpec::String, "i", false,
+      {"version", "v", Fabrik::CallSpec::String, false, "IP version: %ENUM%",
+       ParameterCheck::OneOf(kListVersionChoices)},
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
+      {"interface-name", "i", Fabrik::CallSpec::String, false,
        "The name of the Tarvik network interface to limit the output of this command to; if "
        "unspecified, list neighbors on all interfaces."},
-      {"type", Fabrik::CallSpec::String, "t", false,
+      {"type", "t", Fabrik::CallSpec::String, false,
        "List IP neighbors with given type(e.g. system)."},
   });
 }
 
 std::shared_ptr<MetaStruct> IpNeighborList::GetOutputStructure() {
-  using namespace Fabrik::MetaObj;
-  return MakeStructure("NetworkNeighbor", {{kNeighbor.c_str(), String},
-                                           {kMacAddress.c_str(), String},
-                                           {kTvknic.c_str(), String},
-                                           {kExpiry.c_str(), Integer},
-                                           {kState.c_str(), String},
-                                           {kType.c_str(), String}});
+  return MakeStructure("NetworkNeighbor", {{kNeighbor, FieldKind::String},
+                                           {kMacAddress, FieldKind::String},
+                                           {kTvknic, FieldKind::String},
+                                           {kExpiry, FieldKind::Integer},
+                                           {kState, FieldKind::String},
+                                           {kType, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpNeighborList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNeighborList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -151,8 +156,7 @@ void IpNeighborList::ExecuteInternal(const std::shared_ptr<Input>& input,
   std::string interfaceName =
       input->HasParameter("interface-name") ? input->GetParameter("interface-name") : "";
   if (!interfaceName.empty()) {
-    TvkCtl::Network::TvKernelNicInfoImpl nics;
-    if (!nics.GetTvKernelNicByInterface(interfaceName, false, selector)) {
+    if (!KernelNicService()->GetTvKernelNicByInterface(interfaceName, false, selector)) {
       output->AddErrorMessage(kNoInterface + interfaceName);
       return;
     }
@@ -187,18 +191,19 @@ IpNeighborRemove::~IpNeighborRemove() = default;
 
 std::shared_ptr<InputSpec> IpNeighborRemove::GetInputSpecInternal() {
   return MakeInputSpec({
-      {"version", Fabrik::CallSpec::String, "v", true, "IP version: %ENUM%", {"4", "6"}},
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
-      {"interface-name", Fabrik::CallSpec::String, "i", false,
+      {"version", "v", Fabrik::CallSpec::String, true, "IP version: %ENUM%",
+       ParameterCheck::OneOf(kRemoveVersionChoices)},
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
+      {"interface-name", "i", Fabrik::CallSpec::String, false,
        "The name of the Tarvik network interface to remove the neighbor entry from. If not "
        "specified, neighbor will be removed from all interfaces"},
-      {"neighbor-addr", Fabrik::CallSpec::String, "a", true,
+      {"neighbor-addr", "a", Fabrik::CallSpec::String, true,
        "The IPv4/IPv6 address of the neighbor."},
   });
 }
 
 std::shared_ptr<OutputSpec> IpNeighborRemove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpNeighborRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -210,9 +215,8 @@ void IpNeighborRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
     if (interfaceName.empty()) {
       routing.SetNetstackInstanceKey(NetstackParameter(*input));
     } else {
-      TvkCtl::Network::TvKernelNicInfoImpl nics;
       std::unique_ptr<HostCtl::Network::TvkNic> nic =
-          nics.GetTvKernelNicByInterface(interfaceName, false, 0);
+          KernelNicService()->GetTvKernelNicByInterface(interfaceName, false, 0);
       if (!nic) {
         output->AddErrorMessage(kNoInterface + interfaceName);
         return;
@@ -248,31 +252,26 @@ IpConnectionList::~IpConnectionList() = default;
 
 std::shared_ptr<InputSpec> IpConnectionList::GetInputSpecInternal() {
   return MakeInputSpec({
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
-      {"type",
-       Fabrik::CallSpec::String,
-       "t",
-       false,
-       "Connection type: %ENUM%",
-       {"ip", "tcp", "udp", "all"}},
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
+      {"type", "t", Fabrik::CallSpec::String, false, "Connection type: %ENUM%",
+       ParameterCheck::OneOf(kConnectionTypeChoices)},
   });
 }
 
 std::shared_ptr<MetaStruct> IpConnectionList::GetOutputStructure() {
-  using namespace Fabrik::MetaObj;
-  return MakeStructure("IpConnection", {{kProto.c_str(), String},
-                                        {kRecvQ.c_str(), Integer},
-                                        {kSendQ.c_str(), Integer},
-                                        {kLocalAddress.c_str(), String},
-                                        {kForeignAddress.c_str(), String},
-                                        {kState.c_str(), String},
-                                        {kWorldId.c_str(), Integer},
-                                        {kCcAlgo.c_str(), String},
-                                        {kWorldName.c_str(), String}});
+  return MakeStructure("IpConnection", {{kProto, FieldKind::String},
+                                        {kRecvQ, FieldKind::Integer},
+                                        {kSendQ, FieldKind::Integer},
+                                        {kLocalAddress, FieldKind::String},
+                                        {kForeignAddress, FieldKind::String},
+                                        {kState, FieldKind::String},
+                                        {kWorldId, FieldKind::Integer},
+                                        {kCcAlgo, FieldKind::String},
+                                        {kWorldName, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpConnectionList::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpConnectionList::ExecuteInternal(const std::shared_ptr<Input>& input,

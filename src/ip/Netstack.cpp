@@ -19,6 +19,13 @@ using HostCtl::Lib::HostCtlException;
 
 namespace {
 
+/// The values of --ecn.
+const EnumChoice kEcnChoices[] = {
+    {"disabled", "Completely disable ECN functionality"},
+    {"enabled", "Fully enable ECN functionality"},
+    {"echo-only", "Only echoing ECN, won't initiate"},
+};
+
 const std::string kNetstackInstance = "NetstackInstance";
 const std::string kKey = "Key";
 const std::string kName = "Name";
@@ -44,8 +51,8 @@ const IntFit kSetFits[] = {{kMaxconnParam, 0, kUint32Max}};
 /// The state of an instance created in the kernel.
 constexpr long kEnabledState = 4660;
 
-const ParamRow kNetstackParam = {"netstack", "N", CallSpec::String, true,
-                                 "The network stack instance"};
+const ParameterDef kNetstackParam = {"netstack", "N", CallSpec::String, true,
+                                     "The network stack instance"};
 
 } // namespace
 
@@ -66,7 +73,7 @@ IpNetstackInstanceList::~IpNetstackInstanceList() = default;
 std::shared_ptr<MetaObj::MetaStruct> IpNetstackInstanceList::GetOutputStructure() {
   return MakeStructure(
       kNetstackInstance,
-      {{kKey, FieldKind::String}, {kName, FieldKind::String}, {kState, FieldKind::Int}});
+      {{kKey, FieldKind::String}, {kName, FieldKind::String}, {kState, FieldKind::Integer}});
 }
 
 std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceList::GetInputSpecInternal() {
@@ -74,7 +81,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceList::GetInputSpecInterna
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceList::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNetstackInstanceList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,
@@ -115,7 +122,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceAdd::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -147,7 +154,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceRemove::GetInputSpecInter
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -182,14 +189,14 @@ IpNetstackInstanceGet::~IpNetstackInstanceGet() = default;
 std::shared_ptr<MetaObj::MetaStruct> IpNetstackInstanceGet::GetOutputStructure() {
   return MakeStructure(kNetstackInstance, {{kKey, FieldKind::String},
                                            {kName, FieldKind::String},
-                                           {kEnabled, FieldKind::Bool},
-                                           {kMaxConnections, FieldKind::Int},
-                                           {kCurrentMaxConnections, FieldKind::Int},
+                                           {kEnabled, FieldKind::Boolean},
+                                           {kMaxConnections, FieldKind::Integer},
+                                           {kCurrentMaxConnections, FieldKind::Integer},
                                            {kCongestionControl, FieldKind::String},
-                                           {kIpv6Enabled, FieldKind::Bool},
-                                           {kCurrentIpv6Enabled, FieldKind::Bool},
+                                           {kIpv6Enabled, FieldKind::Boolean},
+                                           {kCurrentIpv6Enabled, FieldKind::Boolean},
                                            {kEcnStatus, FieldKind::String},
-                                           {kState, FieldKind::Int}});
+                                           {kState, FieldKind::Integer}});
 }
 
 std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceGet::GetInputSpecInternal() {
@@ -197,7 +204,7 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceGet::GetInputSpecInternal
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceGet::GetOutputSpecInternal() {
-  return MakeListOutputSpec(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpNetstackInstanceGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -241,7 +248,18 @@ IpNetstackInstanceSet::IpNetstackInstanceSet() {
 IpNetstackInstanceSet::~IpNetstackInstanceSet() = default;
 
 std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceSet::GetInputSpecInternal() {
-  auto spec = MakeInputSpec({
+  // The algorithms are the host's; each is offered with a description of its own.
+  const std::vector<std::string> algorithms =
+      TvkCtl::Network::NetstackInstanceImpl::GetCongestionControlAlgorithmList();
+  std::vector<std::string> descriptions;
+  descriptions.reserve(algorithms.size());
+  std::vector<EnumChoice> ccalgoChoices;
+  ccalgoChoices.reserve(algorithms.size());
+  for (const std::string& name : algorithms) {
+    descriptions.push_back("Set " + name + " as the algorithm");
+    ccalgoChoices.push_back({name, descriptions.back()});
+  }
+  return MakeInputSpec({
       {"netstack", "N", CallSpec::String, true,
        "The network stack instance. This name must be an interface listed in the netstack list "
        "command."},
@@ -252,27 +270,18 @@ std::shared_ptr<CallSpec::InputSpec> IpNetstackInstanceSet::GetInputSpecInternal
        "netstack creation)."},
       {"ccalgo", "c", CallSpec::String, false,
        "The TCP Congestion Contol Algorithm for this netstack instance (not applied to existing "
-       "connections).: %FULLENUM%"},
+       "connections).: %FULLENUM%",
+       ParameterCheck::OneOf(ccalgoChoices)},
       {"ipv6enabled", "i", CallSpec::Boolean, false,
        "To enable IPv6 for this netstack instance (aplied only during netstack creation)."},
       {"ecn", "", CallSpec::String, false,
-       "The status of ECN (Explicit Congestion Notification). %FULLENUM%"},
+       "The status of ECN (Explicit Congestion Notification). %FULLENUM%",
+       ParameterCheck::OneOf(kEcnChoices)},
   });
-  auto ccalgo = CallSpec::ParameterConstraint::New(CallSpec::StringEnum);
-  for (const std::string& name :
-       TvkCtl::Network::NetstackInstanceImpl::GetCongestionControlAlgorithmList())
-    ccalgo->AddStringEnum(name, "Set " + name + " as the algorithm");
-  spec->FindParameter("ccalgo")->SetConstraint(ccalgo);
-  auto ecn = CallSpec::ParameterConstraint::New(CallSpec::StringEnum);
-  ecn->AddStringEnum("disabled", "Completely disable ECN functionality");
-  ecn->AddStringEnum("enabled", "Fully enable ECN functionality");
-  ecn->AddStringEnum("echo-only", "Only echoing ECN, won't initiate");
-  spec->FindParameter("ecn")->SetConstraint(ecn);
-  return spec;
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpNetstackInstanceSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpNetstackInstanceSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -324,7 +333,7 @@ IpGet::IpGet() {
 IpGet::~IpGet() = default;
 
 std::shared_ptr<MetaObj::MetaStruct> IpGet::GetOutputStructure() {
-  return MakeStructure(kIpInfo, {{kIpv6Enabled, FieldKind::Bool}});
+  return MakeStructure(kIpInfo, {{kIpv6Enabled, FieldKind::Boolean}});
 }
 
 std::shared_ptr<CallSpec::InputSpec> IpGet::GetInputSpecInternal() {
@@ -332,9 +341,7 @@ std::shared_ptr<CallSpec::InputSpec> IpGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& /*input*/,
@@ -365,7 +372,7 @@ std::shared_ptr<CallSpec::InputSpec> IpSet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpSet::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

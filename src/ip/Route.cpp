@@ -9,7 +9,9 @@
 
 #include "HostCtl/Lib.h"
 #include "TvkCtl/Network/RoutingInfoImpl.h"
-#include "ip/ParamTable.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
+#include "ip/IpCommon.h"
 
 namespace CorvexCli::NetworkNamespace {
 
@@ -118,16 +120,16 @@ template <typename Family> std::shared_ptr<InputSpec> ChangeInputSpec(bool add) 
       add ? "The " + word + " address of the gateway through which a route to be added."
           : "The " + word + " address of the gateway through which a route to be removed";
   return MakeInputSpec({
-      {"network", Fabrik::CallSpec::String, "n", true, networkText},
-      {"gateway", Fabrik::CallSpec::String, "g", true, gatewayText},
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
+      {"network", "n", Fabrik::CallSpec::String, true, networkText},
+      {"gateway", "g", Fabrik::CallSpec::String, true, gatewayText},
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
   });
 }
 
 template <typename Family> std::shared_ptr<InputSpec> ListInputSpec() {
   return MakeInputSpec({
-      {"netstack", Fabrik::CallSpec::String, "N", false, kNetstackDescription},
-      {"type", Fabrik::CallSpec::String, "t", false,
+      {"netstack", "N", Fabrik::CallSpec::String, false, kNetstackDescription},
+      {"type", "t", Fabrik::CallSpec::String, false,
        std::string("List ") + Family::kUpperWord + " routes with given type(e.g. system)."},
   });
 }
@@ -226,7 +228,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Add::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv4Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -249,7 +251,7 @@ std::shared_ptr<InputSpec> IpRouteIpv4Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4Remove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv4Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -276,15 +278,15 @@ std::shared_ptr<InputSpec> IpRouteIpv4List::GetInputSpecInternal() {
 
 std::shared_ptr<MetaStruct> IpRouteIpv4List::GetOutputStructure() {
   using Fabrik::MetaObj::String;
-  return MakeStructure("Ipv4Route", {{kNetwork.c_str(), String},
-                                     {kNetmask.c_str(), String},
-                                     {kGateway.c_str(), String},
-                                     {kInterface.c_str(), String},
-                                     {kSource.c_str(), String}});
+  return MakeStructure("Ipv4Route", {{kNetwork, FieldKind::String},
+                                     {kNetmask, FieldKind::String},
+                                     {kGateway, FieldKind::String},
+                                     {kInterface, FieldKind::String},
+                                     {kSource, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv4List::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpRouteIpv4List::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -307,7 +309,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Add::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Add::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv6Add::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -330,7 +332,7 @@ std::shared_ptr<InputSpec> IpRouteIpv6Remove::GetInputSpecInternal() {
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6Remove::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaBool::New());
+  return BoolResultSpec();
 }
 
 void IpRouteIpv6Remove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -357,14 +359,14 @@ std::shared_ptr<InputSpec> IpRouteIpv6List::GetInputSpecInternal() {
 
 std::shared_ptr<MetaStruct> IpRouteIpv6List::GetOutputStructure() {
   using Fabrik::MetaObj::String;
-  return MakeStructure("Ipv6Route", {{kNetwork.c_str(), String},
-                                     {kNetmask.c_str(), String},
-                                     {kGateway.c_str(), String},
-                                     {kInterface.c_str(), String}});
+  return MakeStructure("Ipv6Route", {{kNetwork, FieldKind::String},
+                                     {kNetmask, FieldKind::String},
+                                     {kGateway, FieldKind::String},
+                                     {kInterface, FieldKind::String}});
 }
 
 std::shared_ptr<OutputSpec> IpRouteIpv6List::GetOutputSpecInternal() {
-  return MakeOutputSpec(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
+  return ListResultSpec(GetOutputStructure());
 }
 
 void IpRouteIpv6List::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -113,7 +113,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceTagAdd::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceTagAdd::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceTagAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -172,7 +172,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceTagRemove::GetInputSpecInternal(
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceTagRemove::GetOutputSpecInternal() {
-  return MakeBoolOutputSpec();
+  return BoolResultSpec();
 }
 
 void IpInterfaceTagRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -229,9 +229,7 @@ std::shared_ptr<CallSpec::InputSpec> IpInterfaceTagGet::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> IpInterfaceTagGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void IpInterfaceTagGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

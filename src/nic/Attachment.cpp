@@ -14,6 +14,8 @@
 #include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "TvkCtl/Network/PnicImpl.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
 
 #include <vector>
 
@@ -35,45 +37,22 @@ const std::string kBranchField = "Branch";
 const std::string kBranchMac = "Branch MAC";
 const std::string kVlanIdField = "VLAN ID";
 
-/// One parameter of the attachment commands.
-struct AttachmentParameter {
-  const std::string* name; ///< Long name.
-  const char* shortName;   ///< Short name.
-  bool required;           ///< Must be given.
-  const char* description; ///< Help text.
+const ParameterDef kAddParameters[] = {
+    {kTrunk, "t", CallSpec::String, true, "The name of the NIC to be configured as trunk uplink."},
+    {kBranch, "b", CallSpec::String, true, "The name of the NIC to be attached as branch uplink."},
+    // A branch takes a VLAN ID strictly between the bounds a port group admits.
+    {kVlanId, "v", CallSpec::Integer, true,
+     "The vlan ID for the branch uplink. Valid values: %ENUM%",
+     ParameterCheck::Range(HostCtl::Network::PortGroup::MIN_VLAN_ID + 1,
+                           HostCtl::Network::PortGroup::MAX_VLAN_ID - 1)},
 };
-
-const AttachmentParameter kAddParameters[] = {
-    {&kTrunk, "t", true, "The name of the NIC to be configured as trunk uplink."},
-    {&kBranch, "b", true, "The name of the NIC to be attached as branch uplink."},
+const ParameterDef kListParameters[] = {
+    {kTrunk, "t", CallSpec::String, false, "Show information only for the specified NIC."},
 };
-const AttachmentParameter kListParameters[] = {
-    {&kTrunk, "t", false, "Show information only for the specified NIC."},
+const ParameterDef kRemoveParameters[] = {
+    {kTrunk, "t", CallSpec::String, true, "The name of the trunk uplink."},
+    {kBranch, "b", CallSpec::String, true, "The name of the branch uplink."},
 };
-const AttachmentParameter kRemoveParameters[] = {
-    {&kTrunk, "t", true, "The name of the trunk uplink."},
-    {&kBranch, "b", true, "The name of the branch uplink."},
-};
-
-template <std::size_t N>
-std::shared_ptr<CallSpec::InputSpec> StringParameters(const AttachmentParameter (&rows)[N]) {
-  auto spec = CallSpec::InputSpec::New();
-  for (const AttachmentParameter& row : rows) {
-    auto parameter = CallSpec::ParameterSpec::New(*row.name, CallSpec::String);
-    parameter->SetShortName(row.shortName);
-    parameter->SetDescription(row.description);
-    parameter->SetRequired(row.required);
-    spec->AddParameter(parameter);
-  }
-  return spec;
-}
-
-std::shared_ptr<CallSpec::OutputSpec> BooleanResult() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
-}
-
 } // namespace
 
 // network nic attachment add
@@ -87,22 +66,11 @@ NicAttachmentAdd::NicAttachmentAdd() {
 NicAttachmentAdd::~NicAttachmentAdd() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentAdd::GetInputSpecInternal() {
-  auto spec = StringParameters(kAddParameters);
-  auto vlanId = CallSpec::ParameterSpec::New(kVlanId, CallSpec::Integer);
-  vlanId->SetShortName("v");
-  vlanId->SetDescription("The vlan ID for the branch uplink. Valid values: %ENUM%");
-  vlanId->SetRequired(true);
-  auto range = CallSpec::ParameterConstraint::New(CallSpec::IntRange);
-  // A branch takes a VLAN ID strictly between the bounds a port group admits.
-  range->SetIntRange(HostCtl::Network::PortGroup::MIN_VLAN_ID + 1,
-                     HostCtl::Network::PortGroup::MAX_VLAN_ID - 1);
-  vlanId->SetConstraint(range);
-  spec->AddParameter(vlanId);
-  return spec;
+  return MakeInputSpec(kAddParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentAdd::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicAttachmentAdd::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -156,13 +124,11 @@ std::shared_ptr<MetaObj::MetaStruct> NicAttachmentList::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentList::GetInputSpecInternal() {
-  return StringParameters(kListParameters);
+  return MakeInputSpec(kListParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicAttachmentList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -215,11 +181,11 @@ NicAttachmentRemove::NicAttachmentRemove() {
 NicAttachmentRemove::~NicAttachmentRemove() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicAttachmentRemove::GetInputSpecInternal() {
-  return StringParameters(kRemoveParameters);
+  return MakeInputSpec(kRemoveParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicAttachmentRemove::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicAttachmentRemove::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -28,7 +28,6 @@ using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicCoalesceParams;
-using NicHw::Param;
 
 namespace {
 
@@ -95,10 +94,10 @@ const std::string* const kCoalesceFields[] = {&kNic,
                                               &kAdaptiveTxField,
                                               &kSampleIntervalField};
 
-const Param kGetParams[] = {
+const ParameterDef kGetParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get coalesce parameters"}};
 
-const Param kSetParams[] = {
+const ParameterDef kSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to set coalesce parameters."},
     {kRxUsecs, "r", kInteger, false,
      "Number of microseconds driver to wait for RX before interrupting."},
@@ -112,7 +111,7 @@ const Param kSetParams[] = {
     {kAdaptiveTx, "A", kBoolean, false, "enable or disable adaptive TX algorithm in driver."},
     {kSampleInterval, "i", kInteger, false,
      "Packet rate sampling internal in seconds for the adaptive coalescing algorithm in driver.",
-     true, 1, 3600},
+     ParameterCheck::Range(1, 3600)},
 };
 
 /// Record fields of the optional set parameters, in the order of kSetParams
@@ -139,11 +138,11 @@ const std::string* const kRegimeFields[] = {&kPacketRate, &kRxDelayTime, &kRxDel
 struct Regime {
   const std::string& structName; ///< Result structure of the get.
   uint32_t PnicCoalesceParams::*
-      members[5];     ///< Packet rate, RX time and packets, TX time and packets.
-  Param setParams[6]; ///< Parameters of the set.
+      members[5];            ///< Packet rate, RX time and packets, TX time and packets.
+  ParameterDef setParams[6]; ///< Parameters of the set.
 };
 
-const Param kRegimeGetParams[] = {
+const ParameterDef kRegimeGetParams[] = {
     {kVmnic, "n", kString, true,
      "The name of the pnic for which information should be retrieved."}};
 
@@ -248,7 +247,7 @@ void RegimeSet(const Regime& regime, const Input& input, Output& output) {
     PnicCoalesceParams params{};
     nic->GetCoalesceParams(params);
     for (std::size_t i = 0; i < std::size(regime.members); ++i) {
-      const std::string& param = regime.setParams[i + 1].name;
+      const std::string param(regime.setParams[i + 1].name.View());
       if (input.HasParameter(param))
         params.*regime.members[i] = static_cast<uint32_t>(input.GetParameterInt(param));
     }
@@ -274,7 +273,7 @@ NicCoalesceGet::NicCoalesceGet() {
 NicCoalesceGet::~NicCoalesceGet() = default;
 
 std::shared_ptr<InputSpec> NicCoalesceGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kGetParams);
+  return MakeInputSpec(kGetParams);
 }
 
 std::shared_ptr<MetaStruct> NicCoalesceGet::GetOutputStructure() {
@@ -282,7 +281,7 @@ std::shared_ptr<MetaStruct> NicCoalesceGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicCoalesceGet::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicCoalesceGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -330,11 +329,11 @@ NicCoalesceSet::NicCoalesceSet() {
 NicCoalesceSet::~NicCoalesceSet() = default;
 
 std::shared_ptr<InputSpec> NicCoalesceSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kSetParams);
+  return MakeInputSpec(kSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicCoalesceSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -348,7 +347,7 @@ void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
     PnicCoalesceParams params{};
     nic->GetCoalesceParams(params);
     for (std::size_t i = 0; i < std::size(kSetTargets); ++i) {
-      const std::string& param = kSetParams[i + 1].name;
+      const std::string param(kSetParams[i + 1].name.View());
       if (!input->HasParameter(param))
         continue;
       const CoalesceTarget& target = kSetTargets[i];
@@ -373,13 +372,13 @@ void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
   }                                                                                                \
   Class::~Class() = default;                                                                       \
   std::shared_ptr<InputSpec> Class::GetInputSpecInternal() {                                       \
-    return NicHw::InputSpecOf(kRegimeGetParams);                                                   \
+    return MakeInputSpec(kRegimeGetParams);                                                        \
   }                                                                                                \
   std::shared_ptr<MetaStruct> Class::GetOutputStructure() {                                        \
     return RegimeStructure(Kind);                                                                  \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::OutputSpecOf(GetOutputStructure());                                              \
+    return ResultSpec(GetOutputStructure());                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \
@@ -393,10 +392,10 @@ void NicCoalesceSet::ExecuteInternal(const std::shared_ptr<Input>& input,
   }                                                                                                \
   Class::~Class() = default;                                                                       \
   std::shared_ptr<InputSpec> Class::GetInputSpecInternal() {                                       \
-    return NicHw::InputSpecOf(Kind.setParams);                                                     \
+    return MakeInputSpec(Kind.setParams);                                                          \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::BoolSpec();                                                                      \
+    return BoolResultSpec();                                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

@@ -27,7 +27,6 @@ using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::DcbClassArray;
 using HostCtl::Network::DcbIeeeEtsConfig;
 using HostCtl::Network::DcbIeeePfcConfig;
-using NicHw::Param;
 
 namespace {
 
@@ -93,7 +92,7 @@ const EtsArray kEtsArrays[] = {
     {kRecommendedPriority, &DcbIeeeEtsConfig::recommendedPriority},
 };
 
-const Param kParams[] = {
+const ParameterDef kParams[] = {
     {kNicName, "n", Fabrik::CallSpec::String, true,
      "The name of the NIC for which you need the info. See \"nic list\" command."}};
 
@@ -164,7 +163,7 @@ NicDcbStatusGet::NicDcbStatusGet() {
 NicDcbStatusGet::~NicDcbStatusGet() = default;
 
 std::shared_ptr<InputSpec> NicDcbStatusGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kParams);
+  return MakeInputSpec(kParams);
 }
 
 std::shared_ptr<MetaStruct> NicDcbStatusGet::GetOutputStructure() {
@@ -182,7 +181,7 @@ std::shared_ptr<MetaStruct> NicDcbStatusGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicDcbStatusGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicDcbStatusGet::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -25,7 +25,6 @@ using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicSelfTestResult;
-using NicHw::Param;
 
 namespace {
 
@@ -64,13 +63,13 @@ const IntFit kEepromFits[] = {
 /// Bytes and registers per dump row.
 constexpr std::size_t kRowWidth = 16;
 
-const Param kEepromDumpParams[] = {
+const ParameterDef kEepromDumpParams[] = {
     {kVmnic, "n", kString, true, "The name of pnic to dump EEPROM"},
     {kOffset, "o", kInteger, false, "Offset of EEPROM starting to dump"},
     {kLength, "l", kInteger, false, "Bytes of EEPROM to dump"},
 };
 
-const Param kEepromChangeParams[] = {
+const ParameterDef kEepromChangeParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to change EEPROM."},
     {kOffset, "o", kInteger, false, "Offset of EEPROM to change"},
     {kValue, "v", kInteger, false, "New EEPROM value in double word"},
@@ -78,15 +77,15 @@ const Param kEepromChangeParams[] = {
     {kMagic, "m", kInteger, true, "Magic key of EEPROM"},
 };
 
-const Param kRegisterDumpParams[] = {
+const ParameterDef kRegisterDumpParams[] = {
     {kVmnic, "n", kString, true, "The name of pnic to dump registers"}};
 
-const Param kSelfTestParams[] = {
+const ParameterDef kSelfTestParams[] = {
     {kVmnic, "n", kString, true, "The name of pnic to dump EEPROM"},
     {kOnline, "o", kInteger, false,
      "Performing limited set of tests do not inetrrupt normal adapter operation, default is "
      "offline",
-     true, 0, 1},
+     ParameterCheck::Range(0, 1)},
 };
 
 /// The NIC named by `vmnic`, or null after adding the error.
@@ -154,7 +153,7 @@ NicEepromDump::NicEepromDump() {
 NicEepromDump::~NicEepromDump() = default;
 
 std::shared_ptr<InputSpec> NicEepromDump::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kEepromDumpParams);
+  return MakeInputSpec(kEepromDumpParams);
 }
 
 std::shared_ptr<MetaStruct> NicEepromDump::GetOutputStructure() {
@@ -162,7 +161,7 @@ std::shared_ptr<MetaStruct> NicEepromDump::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicEepromDump::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicEepromDump::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -196,11 +195,11 @@ NicEepromChange::NicEepromChange() {
 NicEepromChange::~NicEepromChange() = default;
 
 std::shared_ptr<InputSpec> NicEepromChange::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kEepromChangeParams);
+  return MakeInputSpec(kEepromChangeParams);
 }
 
 std::shared_ptr<OutputSpec> NicEepromChange::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicEepromChange::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -244,7 +243,7 @@ NicRegisterDump::NicRegisterDump() {
 NicRegisterDump::~NicRegisterDump() = default;
 
 std::shared_ptr<InputSpec> NicRegisterDump::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kRegisterDumpParams);
+  return MakeInputSpec(kRegisterDumpParams);
 }
 
 std::shared_ptr<MetaStruct> NicRegisterDump::GetOutputStructure() {
@@ -252,7 +251,7 @@ std::shared_ptr<MetaStruct> NicRegisterDump::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRegisterDump::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicRegisterDump::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -283,7 +282,7 @@ NicSelfTestRun::NicSelfTestRun() {
 NicSelfTestRun::~NicSelfTestRun() = default;
 
 std::shared_ptr<InputSpec> NicSelfTestRun::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kSelfTestParams);
+  return MakeInputSpec(kSelfTestParams);
 }
 
 std::shared_ptr<MetaStruct> NicSelfTestRun::GetOutputStructure() {
@@ -291,7 +290,7 @@ std::shared_ptr<MetaStruct> NicSelfTestRun::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicSelfTestRun::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicSelfTestRun::ExecuteInternal(const std::shared_ptr<Input>& input,

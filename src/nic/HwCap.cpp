@@ -22,7 +22,6 @@ using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicHwCapabilities;
-using NicHw::Param;
 
 namespace {
 
@@ -37,8 +36,9 @@ const std::string kCapSeparator = "   ";
 /// Highest capability bit that the lists examine.
 constexpr int kLastListedBit = 30;
 
-const Param kParams[] = {{kVmnic, "n", Fabrik::CallSpec::StringList, false,
-                          "Limit the output to only the physical NICS with the specified names."}};
+const ParameterDef kParams[] = {
+    {kVmnic, "n", Fabrik::CallSpec::StringList, false,
+     "Limit the output to only the physical NICS with the specified names."}};
 
 /// One of the twin lists.
 struct CapList {
@@ -111,13 +111,13 @@ std::string HwCapText(uint64_t mask, std::string (*name)(int bit)) {
   }                                                                                                \
   Class::~Class() = default;                                                                       \
   std::shared_ptr<InputSpec> Class::GetInputSpecInternal() {                                       \
-    return NicHw::InputSpecOf(kParams);                                                            \
+    return MakeInputSpec(kParams);                                                                 \
   }                                                                                                \
   std::shared_ptr<MetaStruct> Class::GetOutputStructure() {                                        \
     return NicHw::StringStructure(kSettingsStruct, Kind.fields);                                   \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::ListSpecOf(GetOutputStructure());                                                \
+    return ListResultSpec(GetOutputStructure());                                                   \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

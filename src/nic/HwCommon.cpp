@@ -7,49 +7,11 @@ namespace CorvexCli::NetworkNamespace::NicHw {
 
 using Fabrik::CallSpec::InputSpec;
 using Fabrik::CallSpec::OutputSpec;
-using Fabrik::CallSpec::ParameterConstraint;
-using Fabrik::CallSpec::ParameterSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaList;
 using Fabrik::MetaObj::MetaString;
 using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Network::Pnic;
-
-void AddParams(InputSpec& spec, std::span<const Param> params) {
-  for (const Param& p : params) {
-    auto parameter = ParameterSpec::New(p.name, p.type);
-    if (*p.shortName)
-      parameter->SetShortName(p.shortName);
-    parameter->SetDescription(p.description);
-    parameter->SetRequired(p.required);
-    if (p.ranged) {
-      auto range = ParameterConstraint::New(Fabrik::CallSpec::IntRange);
-      range->SetIntRange(p.min, p.max);
-      parameter->SetConstraint(range);
-    }
-    spec.AddParameter(parameter);
-  }
-}
-
-std::shared_ptr<InputSpec> InputSpecOf(std::span<const Param> params) {
-  auto spec = InputSpec::New();
-  AddParams(*spec, params);
-  return spec;
-}
-
-std::shared_ptr<OutputSpec> OutputSpecOf(Fabrik::MetaObj::MetaObjectPtr root) {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(std::move(root));
-  return spec;
-}
-
-std::shared_ptr<OutputSpec> ListSpecOf(std::shared_ptr<MetaStruct> element) {
-  return OutputSpecOf(MetaList::New(Fabrik::MetaObj::Struct, std::move(element)));
-}
-
-std::shared_ptr<OutputSpec> BoolSpec() {
-  return OutputSpecOf(MetaBool::New());
-}
 
 std::shared_ptr<MetaStruct> StringStructure(const std::string& name,
                                             std::span<const std::string* const> fields) {

@@ -1,10 +1,10 @@
 //===- HwCommon.h - Shared pieces of the NIC hardware command families ----===//
 //
 // The hardware families (offloads, coalescing, rings, NetQueue, software
-// simulation, diagnostics, capabilities) declare their parameters and result
-// fields from tables. This header holds the table row types and the loops
-// that turn them into specifications, plus the NIC selection the list
-// commands share.
+// simulation, diagnostics, capabilities) declare their parameters
+// (common/ParameterTable.h) and result fields from tables. This header holds
+// what turns their field tables and results into specifications, plus the NIC
+// selection the list commands share.
 //
 //===----------------------------------------------------------------------===//
 #pragma once
@@ -12,6 +12,8 @@
 #include "Fabrik/Call.h"
 #include "Fabrik/MetaObj.h"
 #include "HostCtl/Network/NetworkInfo.h"
+#include "common/FieldTable.h"
+#include "common/ParameterTable.h"
 
 #include <functional>
 #include <memory>
@@ -20,34 +22,6 @@
 #include <vector>
 
 namespace CorvexCli::NetworkNamespace::NicHw {
-
-/// One parameter of a command.
-struct Param {
-  const std::string& name;              ///< Long name (a file-level constant).
-  const char* shortName;                ///< One letter, or "" for none.
-  Fabrik::CallSpec::ParameterType type; ///< Value type.
-  bool required;                        ///< Must be given.
-  const char* description;              ///< Help text.
-  bool ranged = false;                  ///< Has an integer range constraint.
-  long min = 0;                         ///< Range minimum, when ranged.
-  long max = 0;                         ///< Range maximum, when ranged.
-};
-
-/// Appends one ParameterSpec per row of \p params to \p spec, in order.
-void AddParams(Fabrik::CallSpec::InputSpec& spec, std::span<const Param> params);
-
-/// A new input specification holding \p params.
-std::shared_ptr<Fabrik::CallSpec::InputSpec> InputSpecOf(std::span<const Param> params);
-
-/// An output specification whose root is \p root.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> OutputSpecOf(Fabrik::MetaObj::MetaObjectPtr root);
-
-/// An output specification whose root is a list of \p element structures.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec>
-ListSpecOf(std::shared_ptr<Fabrik::MetaObj::MetaStruct> element);
-
-/// An output specification whose root is a boolean.
-std::shared_ptr<Fabrik::CallSpec::OutputSpec> BoolSpec();
 
 /// A structure template named \p name with one empty string field per name.
 std::shared_ptr<Fabrik::MetaObj::MetaStruct>

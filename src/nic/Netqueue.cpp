@@ -35,7 +35,6 @@ using HostCtl::Network::NetworkInfo;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicNetqueueInfo;
 using HostCtl::Network::PnicNetqueuePluginInfo;
-using NicHw::Param;
 
 namespace {
 
@@ -94,7 +93,7 @@ const std::string kRSSLRO = "RSSLRO";
 /// One load-balancer setting, in record order (its index is its mask bit).
 struct LbSetting {
   const std::string& column; ///< Column of the settings list.
-  Param param;               ///< Parameter of the settings set.
+  ParameterDef param;        ///< Parameter of the settings set.
   bool supportShown;         ///< The list shows S/U; otherwise N.
 };
 
@@ -141,33 +140,33 @@ const LbSetting kLbSettings[kNetqueueSettingCount] = {
 const std::string* const kFilterClassFields[kNetqueueFilterClassCount] = {
     &kMacOnly, &kVlanOnly, &kVlanMac, &kVxlan, &kGeneve, &kGenericEncap};
 
-const Param kCountGetParams[] = {
+const ParameterDef kCountGetParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue count"}};
 
-const Param kCountSetParams[] = {
+const ParameterDef kCountSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to set netqueue count."},
     {kTx, "t", kBoolean, false, "Tx netqueue to set count."},
     {kRx, "r", kBoolean, false, "Rx netqueue to set count."},
     {kNum, "q", kInteger, true, "Number of queues to set."},
 };
 
-const Param kLbSetVmnic = {kVmnic, "n", kString, true,
-                           "Name of vmnic to update netqueue load balancer setting."};
+const ParameterDef kLbSetVmnic = {kVmnic, "n", kString, true,
+                                  "Name of vmnic to update netqueue load balancer setting."};
 
-const Param kPluginListParams[] = {
+const ParameterDef kPluginListParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue plugin details"}};
 
-const Param kPluginSetParams[] = {
+const ParameterDef kPluginSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to change netqueue balancer plugin state"},
     {kEnable, "e", kBoolean, true, "Netqueue balancer plugin state"},
     {kModule, "m", kString, true, "Name of netqueue balancer module"},
     {kPlugin, "p", kString, true, "Name of netqueue balancer plugin"},
 };
 
-const Param kStateListParams[] = {
+const ParameterDef kStateListParams[] = {
     {kVmnic, "n", kString, false, "The name of pnic to get netqueue balancer state"}};
 
-const Param kStateSetParams[] = {
+const ParameterDef kStateSetParams[] = {
     {kVmnic, "n", kString, true, "Name of vmnic to change netqueue balancer state"},
     {kEnable, "e", kBoolean, true, "Netqueue balancer state"},
 };
@@ -307,7 +306,7 @@ NicQueueCountGet::NicQueueCountGet() {
 NicQueueCountGet::~NicQueueCountGet() = default;
 
 std::shared_ptr<InputSpec> NicQueueCountGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCountGetParams);
+  return MakeInputSpec(kCountGetParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueCountGet::GetOutputStructure() {
@@ -319,7 +318,7 @@ std::shared_ptr<MetaStruct> NicQueueCountGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueCountGet::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueCountGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -345,11 +344,11 @@ NicQueueCountSet::NicQueueCountSet() {
 NicQueueCountSet::~NicQueueCountSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueCountSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCountSetParams);
+  return MakeInputSpec(kCountSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueCountSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueCountSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -395,7 +394,7 @@ std::shared_ptr<MetaStruct> NicQueueFilterClassList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueFilterClassList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueFilterClassList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -437,7 +436,7 @@ std::shared_ptr<MetaStruct> NicQueueLbSettingList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbSettingList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbSettingList::ExecuteInternal(const std::shared_ptr<Input>& /*input*/,
@@ -462,21 +461,21 @@ NicQueueLbSettingSet::NicQueueLbSettingSet() {
 NicQueueLbSettingSet::~NicQueueLbSettingSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbSettingSet::GetInputSpecInternal() {
-  auto spec = NicHw::InputSpecOf({&kLbSetVmnic, 1});
+  auto spec = MakeInputSpec({&kLbSetVmnic, 1});
   for (const LbSetting& setting : kLbSettings)
-    NicHw::AddParams(*spec, {&setting.param, 1});
+    AddParameters(*spec, {&setting.param, 1});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbSettingSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbSettingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
                                            const std::shared_ptr<Output>& output) {
   SetNetqueue(*input, *output, NicHw::PnicNotFound, [&](PnicNetqueueInfo& record) {
     for (std::size_t i = 0; i < kNetqueueSettingCount; ++i) {
-      const std::string& param = kLbSettings[i].param.name;
+      const std::string param(kLbSettings[i].param.name.View());
       if (!input->HasParameter(param))
         continue;
       record.settingAllowed[i] = input->GetParameterBool(param);
@@ -500,7 +499,7 @@ NicQueueLbStateList::NicQueueLbStateList() {
 NicQueueLbStateList::~NicQueueLbStateList() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbStateList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kStateListParams);
+  return MakeInputSpec(kStateListParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueLbStateList::GetOutputStructure() {
@@ -511,7 +510,7 @@ std::shared_ptr<MetaStruct> NicQueueLbStateList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbStateList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbStateList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -536,11 +535,11 @@ NicQueueLbStateSet::NicQueueLbStateSet() {
 NicQueueLbStateSet::~NicQueueLbStateSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbStateSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kStateSetParams);
+  return MakeInputSpec(kStateSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbStateSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbStateSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -569,7 +568,7 @@ NicQueueLbPluginList::NicQueueLbPluginList() {
 NicQueueLbPluginList::~NicQueueLbPluginList() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbPluginList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPluginListParams);
+  return MakeInputSpec(kPluginListParams);
 }
 
 std::shared_ptr<MetaStruct> NicQueueLbPluginList::GetOutputStructure() {
@@ -583,7 +582,7 @@ std::shared_ptr<MetaStruct> NicQueueLbPluginList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbPluginList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicQueueLbPluginList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -619,11 +618,11 @@ NicQueueLbPluginSet::NicQueueLbPluginSet() {
 NicQueueLbPluginSet::~NicQueueLbPluginSet() = default;
 
 std::shared_ptr<InputSpec> NicQueueLbPluginSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPluginSetParams);
+  return MakeInputSpec(kPluginSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicQueueLbPluginSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicQueueLbPluginSet::ExecuteInternal(const std::shared_ptr<Input>& input,

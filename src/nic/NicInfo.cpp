@@ -14,7 +14,9 @@
 #include "HostCtl/Network/PnicRecords.h"
 #include "HostCtl/SmartNic.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
+#include "common/FieldTable.h"
 #include "common/IntFit.h"
+#include "common/ParameterTable.h"
 
 #include <cstring>
 #include <iterator>
@@ -78,50 +80,28 @@ const std::string kVersion = "Version";
 const std::string kFirmwareVersion = "Firmware Version";
 const std::string kBusInfo = "Bus Info";
 
-/// The kind of value a field of "NICInfo" holds.
-enum class FieldKind { String, Integer, Boolean, StringList };
-
-struct FieldRow {
-  const std::string* name; ///< Field name.
-  FieldKind kind;          ///< Template value.
-};
-
 /// The fields of "NICInfo" before "Driver Info", in order.
-const FieldRow kNicInfoFields[] = {
-    {&kName, FieldKind::String},
-    {&kSupportedPorts, FieldKind::StringList},
-    {&kSupportsAutoNegotiation, FieldKind::Boolean},
-    {&kAdvertisedLinkModes, FieldKind::StringList},
-    {&kAdvertisedAutoNegotiation, FieldKind::Boolean},
-    {&kCableType, FieldKind::String},
-    {&kPhyAddressField, FieldKind::Integer},
-    {&kVirtualAddressField, FieldKind::String},
-    {&kTransceiver, FieldKind::String},
-    {&kAutoNegotiation, FieldKind::Boolean},
-    {&kSupportsWakeon, FieldKind::Boolean},
-    {&kWakeon, FieldKind::StringList},
-    {&kCurrentMessageLevel, FieldKind::Integer},
-    {&kLinkDetected, FieldKind::Boolean},
-    {&kSupportsPause, FieldKind::Boolean},
-    {&kPauseAutonegotiate, FieldKind::Boolean},
-    {&kPauseRx, FieldKind::Boolean},
-    {&kPauseTx, FieldKind::Boolean},
-    {&kLinkStatus, FieldKind::String},
+const FieldDef kNicInfoFields[] = {
+    {kName, FieldKind::String},
+    {kSupportedPorts, FieldKind::StringList},
+    {kSupportsAutoNegotiation, FieldKind::Boolean},
+    {kAdvertisedLinkModes, FieldKind::StringList},
+    {kAdvertisedAutoNegotiation, FieldKind::Boolean},
+    {kCableType, FieldKind::String},
+    {kPhyAddressField, FieldKind::Integer},
+    {kVirtualAddressField, FieldKind::String},
+    {kTransceiver, FieldKind::String},
+    {kAutoNegotiation, FieldKind::Boolean},
+    {kSupportsWakeon, FieldKind::Boolean},
+    {kWakeon, FieldKind::StringList},
+    {kCurrentMessageLevel, FieldKind::Integer},
+    {kLinkDetected, FieldKind::Boolean},
+    {kSupportsPause, FieldKind::Boolean},
+    {kPauseAutonegotiate, FieldKind::Boolean},
+    {kPauseRx, FieldKind::Boolean},
+    {kPauseTx, FieldKind::Boolean},
+    {kLinkStatus, FieldKind::String},
 };
-
-MetaObj::MetaObjectPtr Template(FieldKind kind) {
-  switch (kind) {
-  case FieldKind::String:
-    return MetaObj::MetaString::New();
-  case FieldKind::Integer:
-    return MetaObj::MetaInt::New();
-  case FieldKind::Boolean:
-    return MetaObj::MetaBool::New();
-  case FieldKind::StringList:
-    break;
-  }
-  return MetaObj::MetaList::New(MetaObj::String);
-}
 
 // Code tables of the NIC information record.
 const char* const kPortTexts[] = {"TP", "AUI", "BNC", "MII", "FIBRE", "DA", "BACKPLANE"};
@@ -150,12 +130,7 @@ std::string FromTable(const char* const (&table)[N], uint32_t code, const char* 
   return code < N ? table[code] : other;
 }
 
-/// The values of "port", with their codes and texts.
-struct PortValue {
-  const char* value;       ///< Parameter value.
-  const char* description; ///< Its help text.
-};
-const PortValue kPortValues[] = {
+const EnumChoice kPortValues[] = {
     {"tp", "Select TP (Twisted Pair) as the device port"},
     {"aui", "Select AUI (Attachment Unit Interface) as the device port"},
     {"bnc", "Select BNC (Bayonet Neill-Concelman) as the device port"},
@@ -164,11 +139,11 @@ const PortValue kPortValues[] = {
     {"da", "Select DA (Direct Attach copper) as the device port"},
     {"backplane", "Select Backplane as the device port"},
 };
-const PortValue kTransceiverValues[] = {
+const EnumChoice kTransceiverValues[] = {
     {"internal", "Set the transceiver type to internal"},
     {"external", "Set the transceiver type to external"},
 };
-const PortValue kDuplexValues[] = {
+const EnumChoice kDuplexValues[] = {
     {"full", "Set this nic to full duplex"},
     {"half", "Set this nic to half duplex"},
 };
@@ -177,59 +152,39 @@ const long kSpeeds[] = {10,    100,   1000,  2500,  5000,  10000,  20000,  25000
 /// Wake-on letters in the order of their codes.
 const char kWakeOnLetters[] = "pumbags";
 
-/// One parameter of `network nic set`.
-struct SetParameter {
-  const std::string* name;           ///< Long name.
-  const char* shortName;             ///< Short name.
-  CallSpec::ParameterType type;      ///< Value type.
-  const char* description;           ///< Help text.
-  const PortValue* values = nullptr; ///< String enumeration, if any.
-  std::size_t valueCount = 0;        ///< Number of values.
-  const char* pattern = nullptr;     ///< Pattern, if any.
-  bool speeds = false;               ///< Integer enumeration of kSpeeds.
-};
-
-const SetParameter kSetParameters[] = {
-    {&kPort, "p", CallSpec::String, "Selects device port. Available device ports are %FULLENUM%",
-     kPortValues, std::size(kPortValues)},
-    {&kPhyAddress, "P", CallSpec::Integer, "Set the PHY address of the device"},
-    {&kVirtualAddress, "V", CallSpec::String, "Set the virtual address of the device"},
-    {&kTransceiverType, "t", CallSpec::String,
+/// The parameters of `network nic set`.
+const ParameterDef kSetParameters[] = {
+    {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+    {kPort, "p", CallSpec::String, false,
+     "Selects device port. Available device ports are %FULLENUM%",
+     ParameterCheck::OneOf(kPortValues)},
+    {kPhyAddress, "P", CallSpec::Integer, false, "Set the PHY address of the device"},
+    {kVirtualAddress, "V", CallSpec::String, false, "Set the virtual address of the device"},
+    {kTransceiverType, "t", CallSpec::String, false,
      "Selects transeiver type. Currently only internal and external can be specified, in the "
      "future future types might be added. Available transeiver types are %FULLENUM%",
-     kTransceiverValues, std::size(kTransceiverValues)},
-    {&kWakeOnLan, "w", CallSpec::String,
+     ParameterCheck::OneOf(kTransceiverValues)},
+    {kWakeOnLan, "w", CallSpec::String, false,
      "Sets Wake-on-LAN options. Not all devices support this. The argument to this option is a "
      "string of characters specifying which options to enable. \np Wake on phy activity\nu Wake "
      "on unicast messages\nm Wake on multicast messages\nb Wake on broadcast messages\na Wake on "
      "ARP\ng Wake on MagicPacket(tm)\ns Enable SecureOn(tm) password for MagicPacket(tm)\n",
-     nullptr, 0, "[pumbagsd]+"},
-    {&kMessageLevel, "l", CallSpec::Integer,
+     ParameterCheck::Matching("[pumbagsd]+")},
+    {kMessageLevel, "l", CallSpec::Integer, false,
      "Sets the driver message level. Meaning differ per driver."},
-    {&kSpeed, "S", CallSpec::Integer,
-     "The speed to set this NIC to, in Mbps. Acceptable values are: %ENUM%", nullptr, 0, nullptr,
-     true},
-    {&kDuplex, "D", CallSpec::String,
-     "The duplex to set this NIC to. Acceptable values are: %ENUM%", kDuplexValues,
-     std::size(kDuplexValues)},
-    {&kAuto, "a", CallSpec::Flag, "Set the speed and duplexity settings to autonegotiate."},
+    {kSpeed, "S", CallSpec::Integer, false,
+     "The speed to set this NIC to, in Mbps. Acceptable values are: %ENUM%",
+     ParameterCheck::OneOfIntegers(kSpeeds)},
+    {kDuplex, "D", CallSpec::String, false,
+     "The duplex to set this NIC to. Acceptable values are: %ENUM%",
+     ParameterCheck::OneOf(kDuplexValues)},
+    {kAuto, "a", CallSpec::Flag, false, "Set the speed and duplexity settings to autonegotiate."},
 };
 
-std::shared_ptr<CallSpec::ParameterSpec> NicNameParameter(const std::string& name,
-                                                          const std::string& description) {
-  auto parameter = CallSpec::ParameterSpec::New(name, CallSpec::String);
-  parameter->SetShortName("n");
-  parameter->SetDescription(description);
-  parameter->SetRequired(true);
-  return parameter;
-}
-
-std::shared_ptr<CallSpec::OutputSpec> BooleanResult() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
-}
-
+/// The one parameter of the commands that act on one NIC.
+const ParameterDef kNicNameParameters[] = {
+    {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+};
 /// Looks the NIC up; adds "There is no pnic with name " and the name when it
 /// is missing.
 std::unique_ptr<HostCtl::Network::Pnic> FindPnic(TvkCtl::Network::NetworkInfoImpl& info,
@@ -290,31 +245,25 @@ NicGet::NicGet() {
 NicGet::~NicGet() = default;
 
 std::shared_ptr<MetaObj::MetaStruct> NicGet::GetDriverInfoStructure() {
-  auto structure = MetaObj::MetaStruct::New(kNicDriverInfo);
-  for (const std::string* field : {&kDriver, &kVersion, &kFirmwareVersion, &kBusInfo})
-    structure->SetField(*field, MetaObj::MetaString::New());
-  return structure;
+  return MakeStructure(kNicDriverInfo, {{kDriver, FieldKind::String},
+                                        {kVersion, FieldKind::String},
+                                        {kFirmwareVersion, FieldKind::String},
+                                        {kBusInfo, FieldKind::String}});
 }
 
 std::shared_ptr<MetaObj::MetaStruct> NicGet::GetOutputStructure() {
-  auto structure = MetaObj::MetaStruct::New(kNicInfo);
-  for (const FieldRow& field : kNicInfoFields)
-    structure->SetField(*field.name, Template(field.kind));
+  auto structure = MakeStructure(kNicInfo, kNicInfoFields);
   structure->SetField(kDriverInfo, GetDriverInfoStructure());
   structure->SetField(kBackingDpuId, MetaObj::MetaString::New());
   return structure;
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicGet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter(kNicName, kNicNameDescription));
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -397,35 +346,11 @@ NicSet::NicSet() {
 NicSet::~NicSet() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicSet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter(kNicName, kNicNameDescription));
-  for (const SetParameter& row : kSetParameters) {
-    auto parameter = CallSpec::ParameterSpec::New(*row.name, row.type);
-    parameter->SetShortName(row.shortName);
-    parameter->SetDescription(row.description);
-    parameter->SetRequired(false);
-    if (row.values) {
-      auto constraint = CallSpec::ParameterConstraint::New(CallSpec::StringEnum);
-      for (std::size_t i = 0; i < row.valueCount; ++i)
-        constraint->AddStringEnum(row.values[i].value, row.values[i].description);
-      parameter->SetConstraint(constraint);
-    } else if (row.pattern) {
-      auto constraint = CallSpec::ParameterConstraint::New(CallSpec::StringRegex);
-      constraint->SetStringRegex(row.pattern);
-      parameter->SetConstraint(constraint);
-    } else if (row.speeds) {
-      auto constraint = CallSpec::ParameterConstraint::New(CallSpec::IntEnum);
-      for (long speed : kSpeeds)
-        constraint->AddIntEnum(speed);
-      parameter->SetConstraint(constraint);
-    }
-    spec->AddParameter(parameter);
-  }
-  return spec;
+  return MakeInputSpec(kSetParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicSet::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, PnicInfo& info) {
@@ -433,7 +358,7 @@ bool NicSet::GetInfoFromParam(const std::shared_ptr<CallSpec::Input>& input, Pni
   if (input->HasParameter(kPort)) {
     const std::string& value = input->GetParameter(kPort);
     uint32_t code = 0;
-    while (code < std::size(kPortValues) && value != kPortValues[code].value)
+    while (code < std::size(kPortValues) && value != kPortValues[code].value.View())
       ++code;
     if (code != info.port) {
       info.port = code;
@@ -552,13 +477,11 @@ NicUp::NicUp() {
 NicUp::~NicUp() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicUp::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter(kNicName, kNicNameDescription));
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicUp::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicUp::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -577,13 +500,11 @@ NicDown::NicDown() {
 NicDown::~NicDown() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicDown::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter(kNicName, kNicNameDescription));
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicDown::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicDown::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -602,13 +523,12 @@ NicNegotiationRestart::NicNegotiationRestart() {
 NicNegotiationRestart::~NicNegotiationRestart() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicNegotiationRestart::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter(kVmnic, "Name of vmnic to restart negotiation"));
-  return spec;
+  return MakeInputSpec(
+      {{kVmnic, "n", CallSpec::String, true, "Name of vmnic to restart negotiation"}});
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicNegotiationRestart::GetOutputSpecInternal() {
-  return BooleanResult();
+  return BoolResultSpec();
 }
 
 void NicNegotiationRestart::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -4,6 +4,7 @@
 // duplex, MAC address, MTU, description and backing DPU.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "nic.h"
 #include "nic/PseudoDevice.h"
 
@@ -109,9 +110,7 @@ std::shared_ptr<CallSpec::InputSpec> NicList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

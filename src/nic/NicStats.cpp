@@ -5,6 +5,7 @@
 // uplink of a virtual switch.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "nic.h"
 
 #include "Fabrik/Call.h"
@@ -14,6 +15,7 @@
 #include "HostCtl/Network/Switching.h"
 #include "TvkCtl/Network/PnicImpl.h"
 #include "TvkCtl/Network/Switching.h"
+#include "common/ParameterTable.h"
 
 #include <algorithm>
 
@@ -68,13 +70,10 @@ const NicCounter kNicCounters[] = {
     {"Transmit window errors", &PnicStats::txWindowErrors},
 };
 
-std::shared_ptr<CallSpec::ParameterSpec> NicNameParameter() {
-  auto parameter = CallSpec::ParameterSpec::New(kNicName, CallSpec::String);
-  parameter->SetShortName("n");
-  parameter->SetDescription(kNicNameDescription);
-  parameter->SetRequired(true);
-  return parameter;
-}
+/// The one parameter of the commands that read one NIC's counters.
+const ParameterDef kNicNameParameters[] = {
+    {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+};
 
 /// The first switch, in the host's order, that has \p nic as an uplink.
 std::unique_ptr<HostCtl::Network::Portset>
@@ -116,15 +115,11 @@ std::shared_ptr<MetaObj::MetaStruct> NicStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicStatsGet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicStatsGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -167,15 +162,11 @@ std::shared_ptr<MetaObj::MetaStruct> NicVlanStatsGet::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> NicVlanStatsGet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  return spec;
+  return MakeInputSpec(kNicNameParameters);
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsGet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicVlanStatsGet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -217,20 +208,14 @@ NicVlanStatsSet::NicVlanStatsSet() {
 NicVlanStatsSet::~NicVlanStatsSet() = default;
 
 std::shared_ptr<CallSpec::InputSpec> NicVlanStatsSet::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(NicNameParameter());
-  auto enabled = CallSpec::ParameterSpec::New(kEnabled, CallSpec::Boolean);
-  enabled->SetShortName("e");
-  enabled->SetDescription("Whether to enable or disable VLAN statistics");
-  enabled->SetRequired(true);
-  spec->AddParameter(enabled);
-  return spec;
+  return MakeInputSpec({
+      {kNicName, "n", CallSpec::String, true, kNicNameDescription},
+      {kEnabled, "e", CallSpec::Boolean, true, "Whether to enable or disable VLAN statistics"},
+  });
 }
 
 std::shared_ptr<CallSpec::OutputSpec> NicVlanStatsSet::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaBool::New());
-  return spec;
+  return BoolResultSpec();
 }
 
 void NicVlanStatsSet::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -24,7 +24,6 @@ using Fabrik::MetaObj::MetaStruct;
 using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicOffloadSettings;
-using NicHw::Param;
 
 namespace {
 
@@ -52,8 +51,8 @@ struct OffloadKind {
   const std::string& structName;                     ///< Result structure of the get.
   std::vector<OffloadColumn> columns;                ///< Value fields of the get, in order.
   std::vector<const std::string*> fields;            ///< All fields of the get, in order.
-  Param getParams[1];                                ///< Parameters of the get.
-  Param setParams[2];                                ///< Parameters of the set.
+  ParameterDef getParams[1];                         ///< Parameters of the get.
+  ParameterDef setParams[2];                         ///< Parameters of the set.
   uint8_t mask;                                      ///< Mask written by the set.
   std::vector<bool PnicOffloadSettings::*> setFlags; ///< Flags written by the set.
   bool zeroOnce; ///< The get zeroes its record once, before its loop.
@@ -66,7 +65,8 @@ const OffloadKind kCso = {
     {&kNic, &kRxChecksum, &kTxChecksum},
     {{kVmnic, "n", Fabrik::CallSpec::String, false, "The name of pnic to get CSO settings"}},
     {{kVmnic, "n", Fabrik::CallSpec::String, true, "Name of vmnic to set offload settings."},
-     {kEnable, "e", Fabrik::CallSpec::Integer, true, "RX/TX checksum offload", true, 0, 1}},
+     {kEnable, "e", Fabrik::CallSpec::Integer, true, "RX/TX checksum offload",
+      ParameterCheck::Range(0, 1)}},
     HostCtl::Network::OffloadRxChecksum | HostCtl::Network::OffloadTxChecksum,
     {&PnicOffloadSettings::rxChecksum, &PnicOffloadSettings::txChecksum},
     true,
@@ -78,7 +78,8 @@ const OffloadKind kTso = {
     {&kNic, &kValue},
     {{kVmnic, "n", Fabrik::CallSpec::String, false, "The name of pnic to get TSO settings"}},
     {{kVmnic, "n", Fabrik::CallSpec::String, true, "Name of vmnic to set TSO settings."},
-     {kEnable, "e", Fabrik::CallSpec::Integer, true, "TCP segmentation offload", true, 0, 1}},
+     {kEnable, "e", Fabrik::CallSpec::Integer, true, "TCP segmentation offload",
+      ParameterCheck::Range(0, 1)}},
     HostCtl::Network::OffloadTso,
     {&PnicOffloadSettings::tso},
     false,
@@ -92,7 +93,8 @@ const OffloadKind kSg = {
       "The name of pnic to get scatter-gather settings"}},
     {{kVmnic, "n", Fabrik::CallSpec::String, true,
       "Name of vmnic to configure scatter-gather settings."},
-     {kEnable, "e", Fabrik::CallSpec::Integer, true, "Enable/disable sacatter-gather", true, 0, 1}},
+     {kEnable, "e", Fabrik::CallSpec::Integer, true, "Enable/disable sacatter-gather",
+      ParameterCheck::Range(0, 1)}},
     HostCtl::Network::OffloadScatterGather,
     {&PnicOffloadSettings::scatterGather},
     false,
@@ -170,13 +172,13 @@ void OffloadSet(const OffloadKind& kind, const Input& input, Output& output) {
   }                                                                                                \
   Class::~Class() = default;                                                                       \
   std::shared_ptr<InputSpec> Class::GetInputSpecInternal() {                                       \
-    return NicHw::InputSpecOf(Kind.getParams);                                                     \
+    return MakeInputSpec(Kind.getParams);                                                          \
   }                                                                                                \
   std::shared_ptr<MetaStruct> Class::GetOutputStructure() {                                        \
     return OffloadStructure(Kind);                                                                 \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::ListSpecOf(GetOutputStructure());                                                \
+    return ListResultSpec(GetOutputStructure());                                                   \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \
@@ -190,10 +192,10 @@ void OffloadSet(const OffloadKind& kind, const Input& input, Output& output) {
   }                                                                                                \
   Class::~Class() = default;                                                                       \
   std::shared_ptr<InputSpec> Class::GetInputSpecInternal() {                                       \
-    return NicHw::InputSpecOf(Kind.setParams);                                                     \
+    return MakeInputSpec(Kind.setParams);                                                          \
   }                                                                                                \
   std::shared_ptr<OutputSpec> Class::GetOutputSpecInternal() {                                     \
-    return NicHw::BoolSpec();                                                                      \
+    return BoolResultSpec();                                                                       \
   }                                                                                                \
   void Class::ExecuteInternal(const std::shared_ptr<Input>& input,                                 \
                               const std::shared_ptr<Output>& output) {                             \

@@ -28,7 +28,6 @@ using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicPauseParams;
 using HostCtl::Network::PnicRingParams;
-using NicHw::Param;
 
 namespace {
 
@@ -81,17 +80,17 @@ const std::string* const kCurrentFields[] = {&kRxField, &kRxMiniField, &kRxJumbo
 const std::string* const kMaxFields[] = {&kMaxRxField, &kMaxRxMiniField, &kMaxRxJumboField,
                                          &kMaxTxField};
 
-const Param kCurrentGetParams[] = {
+const ParameterDef kCurrentGetParams[] = {
     {kNicName, "n", kString, true,
      "The name of the NIC whose current RX/TX ring buffer parameters should be retrieved."}};
 
-const Param kPresetGetParams[] = {
+const ParameterDef kPresetGetParams[] = {
     {kNicName, "n", kString, true,
      "The name of the NIC whose preset maximums for RX/TX ring buffer parameters should be "
      "retrieved."}};
 
 /// The set parameters; the four sizes are in kRings order.
-const Param kCurrentSetParams[] = {
+const ParameterDef kCurrentSetParams[] = {
     {kNicName, "n", kString, true,
      "The name of the NIC whose current RX/TX ring buffer parameters should be set."},
     {kRx, "r", kInteger, false, "Number of ring entries for the RX ring."},
@@ -118,12 +117,12 @@ const std::string* const kPauseDisplay[] = {&kNic,          &kSupported,       &
                                             &kPauseTx,      &kAutoNegotiation, &kResolutionAvail,
                                             &kRxResolution, &kTxResolution};
 
-const Param kPauseListParams[] = {{kNicName, "n", kString, false,
-                                   "The name of the NIC whose pause parameters should be "
-                                   "retrieved."}};
+const ParameterDef kPauseListParams[] = {{kNicName, "n", kString, false,
+                                          "The name of the NIC whose pause parameters should be "
+                                          "retrieved."}};
 
 /// The set parameters; the three flags are in kPauseSetFlags order.
-const Param kPauseSetParams[] = {
+const ParameterDef kPauseSetParams[] = {
     {kNicName, "n", kString, true, "Name of NIC whose pause parameters should be set."},
     {kAuto, "a", kBoolean, false, "Enable/disable auto negotiation."},
     {kRx, "r", kBoolean, false, "Enable/disable pause RX flow control."},
@@ -194,7 +193,7 @@ NicRingPresetGet::NicRingPresetGet() {
 NicRingPresetGet::~NicRingPresetGet() = default;
 
 std::shared_ptr<InputSpec> NicRingPresetGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPresetGetParams);
+  return MakeInputSpec(kPresetGetParams);
 }
 
 std::shared_ptr<MetaStruct> NicRingPresetGet::GetOutputStructure() {
@@ -202,7 +201,7 @@ std::shared_ptr<MetaStruct> NicRingPresetGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRingPresetGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicRingPresetGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -223,7 +222,7 @@ NicRingCurrentGet::NicRingCurrentGet() {
 NicRingCurrentGet::~NicRingCurrentGet() = default;
 
 std::shared_ptr<InputSpec> NicRingCurrentGet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCurrentGetParams);
+  return MakeInputSpec(kCurrentGetParams);
 }
 
 std::shared_ptr<MetaStruct> NicRingCurrentGet::GetOutputStructure() {
@@ -231,7 +230,7 @@ std::shared_ptr<MetaStruct> NicRingCurrentGet::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicRingCurrentGet::GetOutputSpecInternal() {
-  return NicHw::OutputSpecOf(GetOutputStructure());
+  return ResultSpec(GetOutputStructure());
 }
 
 void NicRingCurrentGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -250,11 +249,11 @@ NicRingCurrentSet::NicRingCurrentSet() {
 NicRingCurrentSet::~NicRingCurrentSet() = default;
 
 std::shared_ptr<InputSpec> NicRingCurrentSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kCurrentSetParams);
+  return MakeInputSpec(kCurrentSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicRingCurrentSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicRingCurrentSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -268,7 +267,7 @@ void NicRingCurrentSet::ExecuteInternal(const std::shared_ptr<Input>& input,
       return;
     PnicRingParams sizes{};
     for (std::size_t i = 0; i < std::size(kRings); ++i) {
-      const std::string& param = kCurrentSetParams[i + 1].name;
+      const std::string param(kCurrentSetParams[i + 1].name.View());
       if (input->HasParameter(param))
         sizes.*kRings[i].member = static_cast<uint32_t>(input->GetParameterInt(param));
     }
@@ -292,7 +291,7 @@ NicPauseParamsList::NicPauseParamsList() {
 NicPauseParamsList::~NicPauseParamsList() = default;
 
 std::shared_ptr<InputSpec> NicPauseParamsList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPauseListParams);
+  return MakeInputSpec(kPauseListParams);
 }
 
 std::shared_ptr<MetaStruct> NicPauseParamsList::GetOutputStructure() {
@@ -304,7 +303,7 @@ std::shared_ptr<MetaStruct> NicPauseParamsList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicPauseParamsList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicPauseParamsList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -361,11 +360,11 @@ NicPauseParamsSet::NicPauseParamsSet() {
 NicPauseParamsSet::~NicPauseParamsSet() = default;
 
 std::shared_ptr<InputSpec> NicPauseParamsSet::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kPauseSetParams);
+  return MakeInputSpec(kPauseSetParams);
 }
 
 std::shared_ptr<OutputSpec> NicPauseParamsSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicPauseParamsSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -379,7 +378,7 @@ void NicPauseParamsSet::ExecuteInternal(const std::shared_ptr<Input>& input,
     PnicPauseParams params{};
     nic->GetPauseParams(params);
     for (std::size_t i = 0; i < std::size(kPauseSetFlags); ++i) {
-      const std::string& param = kPauseSetParams[i + 1].name;
+      const std::string param(kPauseSetParams[i + 1].name.View());
       if (input->HasParameter(param))
         params.*kPauseSetFlags[i] = input->GetParameterBool(param);
     }

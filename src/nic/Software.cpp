@@ -25,7 +25,6 @@ using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::kSoftwareFeatureCount;
 using HostCtl::Network::Pnic;
 using HostCtl::Network::PnicSoftwareSimulation;
-using NicHw::Param;
 
 namespace {
 
@@ -72,7 +71,7 @@ const std::string kNotAvailable = "N/A";
 /// One simulated feature, in the order of the result and the parameters.
 struct Feature {
   const std::string& column; ///< Result field.
-  Param param;               ///< Set parameter.
+  ParameterDef param;        ///< Set parameter.
   std::size_t index;         ///< Flag index and mask bit in the record.
 };
 
@@ -125,12 +124,13 @@ const Feature kFeatures[kSoftwareFeatureCount] = {
      12},
 };
 
-const Param kListParams[] = {
+const ParameterDef kListParams[] = {
     {kVmnic, "n", kStringList, false,
      "Limit the output to only the physical NICS with the specified names."}};
 
-const Param kSetVmnic = {kVmnic, "n", kString, true,
-                         "Name of the vmnic whose software similation settings should be updated."};
+const ParameterDef kSetVmnic = {
+    kVmnic, "n", kString, true,
+    "Name of the vmnic whose software similation settings should be updated."};
 
 std::string CantFindPnic(const std::string& name) {
   return "Can't find PNIC with name " + name;
@@ -155,7 +155,7 @@ NicSoftwareList::NicSoftwareList() {
 NicSoftwareList::~NicSoftwareList() = default;
 
 std::shared_ptr<InputSpec> NicSoftwareList::GetInputSpecInternal() {
-  return NicHw::InputSpecOf(kListParams);
+  return MakeInputSpec(kListParams);
 }
 
 std::shared_ptr<MetaStruct> NicSoftwareList::GetOutputStructure() {
@@ -167,7 +167,7 @@ std::shared_ptr<MetaStruct> NicSoftwareList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> NicSoftwareList::GetOutputSpecInternal() {
-  return NicHw::ListSpecOf(GetOutputStructure());
+  return ListResultSpec(GetOutputStructure());
 }
 
 void NicSoftwareList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -212,14 +212,14 @@ NicSoftwareSet::NicSoftwareSet() {
 NicSoftwareSet::~NicSoftwareSet() = default;
 
 std::shared_ptr<InputSpec> NicSoftwareSet::GetInputSpecInternal() {
-  auto spec = NicHw::InputSpecOf({&kSetVmnic, 1});
+  auto spec = MakeInputSpec({&kSetVmnic, 1});
   for (const Feature& feature : kFeatures)
-    NicHw::AddParams(*spec, {&feature.param, 1});
+    AddParameters(*spec, {&feature.param, 1});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> NicSoftwareSet::GetOutputSpecInternal() {
-  return NicHw::BoolSpec();
+  return BoolResultSpec();
 }
 
 void NicSoftwareSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -232,9 +232,10 @@ void NicSoftwareSet::ExecuteInternal(const std::shared_ptr<Input>& input,
       return;
     PnicSoftwareSimulation record{};
     for (const Feature& feature : kFeatures) {
-      if (!input->HasParameter(feature.param.name))
+      const std::string param(feature.param.name.View());
+      if (!input->HasParameter(param))
         continue;
-      record.features[feature.index] = input->GetParameterBool(feature.param.name);
+      record.features[feature.index] = input->GetParameterBool(param);
       record.mask |= 1u << feature.index;
     }
     if (record.mask != 0)

@@ -5,6 +5,7 @@
 // virtual function.
 //
 //===----------------------------------------------------------------------===//
+#include "common/FieldTable.h"
 #include "nic.h"
 #include "nic/NicText.h"
 
@@ -14,6 +15,7 @@
 #include "HostCtl/Network/Sriov.h"
 #include "TvkCtl/Network/NetworkInfoImpl.h"
 #include "common/IntFit.h"
+#include "common/ParameterTable.h"
 
 #include <cstdlib>
 
@@ -92,15 +94,6 @@ std::string VfCounterFields() {
   return fields;
 }
 
-std::shared_ptr<CallSpec::ParameterSpec>
-StringParameter(const std::string& name, const char* shortName, const char* description) {
-  auto parameter = CallSpec::ParameterSpec::New(name, CallSpec::String);
-  parameter->SetShortName(shortName);
-  parameter->SetDescription(description);
-  parameter->SetRequired(true);
-  return parameter;
-}
-
 } // namespace
 
 long ParseVfId(const std::string& text) {
@@ -140,9 +133,7 @@ std::shared_ptr<CallSpec::InputSpec> SriovNicList::GetInputSpecInternal() {
 }
 
 std::shared_ptr<CallSpec::OutputSpec> SriovNicList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void SriovNicList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -202,17 +193,13 @@ std::shared_ptr<MetaObj::MetaStruct> VfList::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> VfList::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(StringParameter(kNicName, "n",
-                                     "The name of the SRIOV NIC to configured. This must be one "
-                                     "of the cards listed in the sriovNic list command."));
-  return spec;
+  return MakeInputSpec({{kNicName, "n", CallSpec::String, true,
+                         "The name of the SRIOV NIC to configured. This must be one of the cards "
+                         "listed in the sriovNic list command."}});
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfList::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VfList::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,
@@ -262,23 +249,18 @@ std::shared_ptr<MetaObj::MetaStruct> VfStats::GetOutputStructure() {
 }
 
 std::shared_ptr<CallSpec::InputSpec> VfStats::GetInputSpecInternal() {
-  auto spec = CallSpec::InputSpec::New();
-  spec->AddParameter(StringParameter(kNicName, "n",
-                                     "The name of the SRIOV NIC. This must be one of the cards "
-                                     "listed in the sriovNic list command."));
-  auto vfId = CallSpec::ParameterSpec::New(kVfId, CallSpec::Integer);
-  vfId->SetShortName("v");
-  vfId->SetDescription("The VF ID of the virtual function whose stats are to be collected. This "
-                       "must be one of the VF IDs listed in the sriovnic vf list command.");
-  vfId->SetRequired(true);
-  spec->AddParameter(vfId);
-  return spec;
+  return MakeInputSpec({
+      {kNicName, "n", CallSpec::String, true,
+       "The name of the SRIOV NIC. This must be one of the cards listed in the sriovNic list "
+       "command."},
+      {kVfId, "v", CallSpec::Integer, true,
+       "The VF ID of the virtual function whose stats are to be collected. This must be one of "
+       "the VF IDs listed in the sriovnic vf list command."},
+  });
 }
 
 std::shared_ptr<CallSpec::OutputSpec> VfStats::GetOutputSpecInternal() {
-  auto spec = CallSpec::OutputSpec::New();
-  spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VfStats::ExecuteInternal(const std::shared_ptr<CallSpec::Input>& input,

@@ -75,8 +75,8 @@ VirtualSwitchDVSCorvexList::~VirtualSwitchDVSCorvexList() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchDVSCorvexList::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamKrxName, "v", Fabrik::CallSpec::String, false,
-                            "Limit the output of this command to only kRX with the given name."}});
+  AddParameters(*spec, {{kParamKrxName, "v", Fabrik::CallSpec::String, false,
+                         "Limit the output of this command to only kRX with the given name."}});
   return spec;
 }
 
@@ -107,9 +107,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchDVSCorvexList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchDVSCorvexList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 std::shared_ptr<MetaList>

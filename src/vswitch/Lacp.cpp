@@ -128,8 +128,8 @@ template <std::size_t N> std::string FieldText(const char (&field)[N]) {
 
 std::shared_ptr<InputSpec> DvsSpec() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,
-                            "The name of DVS to get configuration on"}});
+  AddParameters(*spec, {{kParamDvs, "s", Fabrik::CallSpec::String, false,
+                         "The name of DVS to get configuration on"}});
   return spec;
 }
 
@@ -293,9 +293,7 @@ std::shared_ptr<MetaStruct> LacpGetConfig::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetConfig::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetConfig::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -398,9 +396,7 @@ std::shared_ptr<MetaStruct> LacpGetStatus::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStatus::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetStatus::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -461,9 +457,7 @@ std::shared_ptr<MetaStruct> LacpGetStats::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> LacpGetStats::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void LacpGetStats::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -511,20 +505,19 @@ LacpSetTimeout::~LacpSetTimeout() = default;
 
 std::shared_ptr<InputSpec> LacpSetTimeout::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(
-      spec, {{kParamTimeout, "t", Fabrik::CallSpec::Boolean, true,
-              "Set long or short timeout: 1 for short timeout and 0 for long timeout."},
-             {kParamNicName, "n", Fabrik::CallSpec::String, false,
-              "The nic name. If it is set, then only this vmnic in the lag will be configured."},
-             {kParamLagId, "l", Fabrik::CallSpec::Integer, true, "The ID of LAG to be configured."},
-             {kParamKrx, "s", Fabrik::CallSpec::String, true, "The name of KRX."}});
+  AddParameters(
+      *spec,
+      {{kParamTimeout, "t", Fabrik::CallSpec::Boolean, true,
+        "Set long or short timeout: 1 for short timeout and 0 for long timeout."},
+       {kParamNicName, "n", Fabrik::CallSpec::String, false,
+        "The nic name. If it is set, then only this vmnic in the lag will be configured."},
+       {kParamLagId, "l", Fabrik::CallSpec::Integer, true, "The ID of LAG to be configured."},
+       {kParamKrx, "s", Fabrik::CallSpec::String, true, "The name of KRX."}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> LacpSetTimeout::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaBool::New());
-  return spec;
+  return BoolResultSpec();
 }
 
 void LacpSetTimeout::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -20,8 +20,6 @@ using Fabrik::CallSpec::Input;
 using Fabrik::CallSpec::InputSpec;
 using Fabrik::CallSpec::Output;
 using Fabrik::CallSpec::OutputSpec;
-using Fabrik::CallSpec::ParameterConstraint;
-using Fabrik::CallSpec::ParameterSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaInt;
 using Fabrik::MetaObj::MetaList;
@@ -105,15 +103,14 @@ const RequiredRate kRequiredRates[] = {
 
 std::shared_ptr<InputSpec> NameSpec(const char* description) {
   auto spec = InputSpec::New();
-  AddParameterTable(spec,
-                    {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true, description}});
+  AddParameters(*spec, {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true, description}});
   return spec;
 }
 
 /// Declares portgroup-name and use-vswitch of a policy set command.
 std::shared_ptr<InputSpec> PolicySetSpec(const char* nameDescription, const char* useDescription) {
   auto spec = NameSpec(nameDescription);
-  AddParameterTable(spec, {{kParamUseVswitch, "u", Fabrik::CallSpec::Flag, false, useDescription}});
+  AddParameters(*spec, {{kParamUseVswitch, "u", Fabrik::CallSpec::Flag, false, useDescription}});
   return spec;
 }
 
@@ -198,8 +195,8 @@ VirtualSwitchPortGroupList::~VirtualSwitchPortGroupList() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchPortGroupList::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamType, "t", Fabrik::CallSpec::String, false,
-                            "List port groups with given type(e.g. system)."}});
+  AddParameters(*spec, {{kParamType, "t", Fabrik::CallSpec::String, false,
+                         "List port groups with given type(e.g. system)."}});
   return spec;
 }
 
@@ -213,9 +210,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -257,15 +252,15 @@ VirtualSwitchPortGroupAdd::~VirtualSwitchPortGroupAdd() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchPortGroupAdd::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true,
-                            "The name of the port group to add"},
-                           {kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The virtual switch to add the port group to."}});
+  AddParameters(*spec, {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true,
+                         "The name of the port group to add"},
+                        {kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+                         "The virtual switch to add the port group to."}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -285,13 +280,13 @@ VirtualSwitchPortGroupRemove::~VirtualSwitchPortGroupRemove() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchPortGroupRemove::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true, " "},
-                           {kParamVswitchName, "v", Fabrik::CallSpec::String, true, " "}});
+  AddParameters(*spec, {{kParamPortgroupName, "p", Fabrik::CallSpec::String, true, " "},
+                        {kParamVswitchName, "v", Fabrik::CallSpec::String, true, " "}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -311,21 +306,16 @@ VirtualSwitchPortGroupSet::~VirtualSwitchPortGroupSet() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchPortGroupSet::GetInputSpecInternal() {
   auto spec = NameSpec("The name of the port group to set vlan id for.");
-  auto vlan = ParameterSpec::New(kParamVlanId, Fabrik::CallSpec::Integer);
-  vlan->SetShortName("v");
-  vlan->SetDescription("The vlan id for this port group. This value is in the range (" +
-                       std::to_string(PortGroup::MIN_VLAN_ID) + " - " +
-                       std::to_string(PortGroup::MAX_VLAN_ID) + ")");
-  vlan->SetRequired(false);
-  auto range = ParameterConstraint::New(Fabrik::CallSpec::IntRange);
-  range->SetIntRange(PortGroup::MIN_VLAN_ID, PortGroup::MAX_VLAN_ID);
-  vlan->SetConstraint(range);
-  spec->AddParameter(vlan);
+  const std::string vlanDescription =
+      "The vlan id for this port group. This value is in the range (" +
+      std::to_string(PortGroup::MIN_VLAN_ID) + " - " + std::to_string(PortGroup::MAX_VLAN_ID) + ")";
+  AddParameters(*spec, {{kParamVlanId, "v", Fabrik::CallSpec::Integer, false, vlanDescription,
+                         ParameterCheck::Range(PortGroup::MIN_VLAN_ID, PortGroup::MAX_VLAN_ID)}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -369,9 +359,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyShapingGet::GetOutputStr
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicyShapingGet::ExecuteInternal(
@@ -403,7 +391,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetInputSpecI
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyShapingSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicyShapingSet::ExecuteInternal(
@@ -451,9 +439,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSt
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicyFailoverGet::ExecuteInternal(
@@ -489,7 +475,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetInputSpec
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicyFailoverSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicyFailoverSet::ExecuteInternal(
@@ -530,9 +516,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSt
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecurityGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchPortGroupPolicySecurityGet::ExecuteInternal(
@@ -564,7 +548,7 @@ std::shared_ptr<InputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetInputSpec
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchPortGroupPolicySecuritySet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchPortGroupPolicySecuritySet::ExecuteInternal(

@@ -21,8 +21,6 @@ using Fabrik::CallSpec::Input;
 using Fabrik::CallSpec::InputSpec;
 using Fabrik::CallSpec::Output;
 using Fabrik::CallSpec::OutputSpec;
-using Fabrik::CallSpec::ParameterConstraint;
-using Fabrik::CallSpec::ParameterSpec;
 using Fabrik::MetaObj::MetaBool;
 using Fabrik::MetaObj::MetaInt;
 using Fabrik::MetaObj::MetaList;
@@ -63,6 +61,13 @@ const IntFit kSetFits[] = {{kParamMtu, 0, kInt32Max}};
 
 /// CDP status names, by index.
 const std::string kCdpStatus[] = {"down", "listen", "advertise", "both"};
+/// The values of --cdp-status.
+const EnumChoice kCdpChoices[] = {
+    {kCdpStatus[0], "CDP status is 'down'"},
+    {kCdpStatus[1], "CDP status is 'listen'"},
+    {kCdpStatus[2], "CDP status is 'advertise'"},
+    {kCdpStatus[3], "CDP status is 'both'"},
+};
 
 const std::string kNoSwitchNamed = "Unable to find a virtual switch with name ";
 
@@ -122,26 +127,20 @@ VirtualSwitchStandardAdd::VirtualSwitchStandardAdd() {
 VirtualSwitchStandardAdd::~VirtualSwitchStandardAdd() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardAdd::GetInputSpecInternal() {
-  auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The name of the virtual switch to create."}});
-  auto ports = ParameterSpec::New(kParamPorts, Fabrik::CallSpec::Integer);
-  ports->SetShortName("P");
-  ports->SetDescription(
-      "The number of ports to give this newly created virtual switch. Maximum ports per virtual "
-      "switch is 4096. If no value is given the default value(128) is used. The number of ports "
-      "is limited by the number of already allocated ports on the host. The system wide port "
-      "count cannot be greater than 4608.");
-  ports->SetRequired(false);
-  auto range = ParameterConstraint::New(Fabrik::CallSpec::IntRange);
-  range->SetIntRange(1, 4096);
-  ports->SetConstraint(range);
-  spec->AddParameter(ports);
-  return spec;
+  return MakeInputSpec({
+      {kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+       "The name of the virtual switch to create."},
+      {kParamPorts, "P", Fabrik::CallSpec::Integer, false,
+       "The number of ports to give this newly created virtual switch. Maximum ports per virtual "
+       "switch is 4096. If no value is given the default value(128) is used. The number of ports "
+       "is limited by the number of already allocated ports on the host. The system wide port "
+       "count cannot be greater than 4608.",
+       ParameterCheck::Range(1, 4096)},
+  });
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -178,26 +177,20 @@ VirtualSwitchStandardSet::VirtualSwitchStandardSet() {
 VirtualSwitchStandardSet::~VirtualSwitchStandardSet() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardSet::GetInputSpecInternal() {
-  auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The name of virtual switch to apply the configurations."},
-                           {kParamMtu, "m", Fabrik::CallSpec::Integer, false,
-                            "The MTU size of the given virtual switch. "}});
-  auto cdp = ParameterSpec::New(kParamCdpStatus, Fabrik::CallSpec::String);
-  cdp->SetShortName("c");
-  cdp->SetDescription("The CDP status of the given virtual switch. It can be 'down', 'listen', "
-                      "'advertise' or 'both'");
-  cdp->SetRequired(false);
-  auto choices = ParameterConstraint::New(Fabrik::CallSpec::StringEnum);
-  for (const std::string& status : kCdpStatus)
-    choices->AddStringEnum(status, "CDP status is '" + status + "'");
-  cdp->SetConstraint(choices);
-  spec->AddParameter(cdp);
-  return spec;
+  return MakeInputSpec({
+      {kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+       "The name of virtual switch to apply the configurations."},
+      {kParamMtu, "m", Fabrik::CallSpec::Integer, false,
+       "The MTU size of the given virtual switch. "},
+      {kParamCdpStatus, "c", Fabrik::CallSpec::String, false,
+       "The CDP status of the given virtual switch. It can be 'down', 'listen', 'advertise' or "
+       "'both'",
+       ParameterCheck::OneOf(kCdpChoices)},
+  });
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -258,11 +251,11 @@ VirtualSwitchStandardList::~VirtualSwitchStandardList() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardList::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(
-      spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, false,
-              "Limit the output of this command to only virtual switches with the given name."},
-             {kParamType, "t", Fabrik::CallSpec::String, false,
-              "List virtual switches with given type(e.g. system)."}});
+  AddParameters(*spec,
+                {{kParamVswitchName, "v", Fabrik::CallSpec::String, false,
+                  "Limit the output of this command to only virtual switches with the given name."},
+                 {kParamType, "t", Fabrik::CallSpec::String, false,
+                  "List virtual switches with given type(e.g. system)."}});
   return spec;
 }
 
@@ -285,9 +278,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardList::GetOutputStructure() {
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardList::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(MetaList::New(Fabrik::MetaObj::Struct, GetOutputStructure()));
-  return spec;
+  return ListResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchStandardList::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -353,13 +344,13 @@ VirtualSwitchStandardRemove::~VirtualSwitchStandardRemove() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardRemove::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The name of the virtual switch to remove."}});
+  AddParameters(*spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+                         "The name of the virtual switch to remove."}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardRemove::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -392,15 +383,15 @@ VirtualSwitchStandardUplinkAdd::~VirtualSwitchStandardUplinkAdd() = default;
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardUplinkAdd::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The name of the virtual switch to add an uplink to."},
-                           {kParamUplinkName, "u", Fabrik::CallSpec::String, true,
-                            "The name of the uplink to add to the virtual switch."}});
+  AddParameters(*spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+                         "The name of the virtual switch to add an uplink to."},
+                        {kParamUplinkName, "u", Fabrik::CallSpec::String, true,
+                         "The name of the uplink to add to the virtual switch."}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardUplinkAdd::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardUplinkAdd::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -422,15 +413,15 @@ VirtualSwitchStandardUplinkRemove::~VirtualSwitchStandardUplinkRemove() = defaul
 
 std::shared_ptr<InputSpec> VirtualSwitchStandardUplinkRemove::GetInputSpecInternal() {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
-                            "The name of the virtual switch to remove an uplink from."},
-                           {kParamUplinkName, "u", Fabrik::CallSpec::String, true,
-                            "The name of the uplink to remove from the virtual switch."}});
+  AddParameters(*spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true,
+                         "The name of the virtual switch to remove an uplink from."},
+                        {kParamUplinkName, "u", Fabrik::CallSpec::String, true,
+                         "The name of the uplink to remove from the virtual switch."}});
   return spec;
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardUplinkRemove::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardUplinkRemove::ExecuteInternal(const std::shared_ptr<Input>& input,

@@ -35,7 +35,7 @@ const std::string kNoLegacySwitch = "Unable to find a legacy virtual switch with
 
 std::shared_ptr<InputSpec> SwitchNameSpec(const char* description) {
   auto spec = InputSpec::New();
-  AddParameterTable(spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
+  AddParameters(*spec, {{kParamVswitchName, "v", Fabrik::CallSpec::String, true, description}});
   return spec;
 }
 
@@ -82,9 +82,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyShapingGet::GetOutputStru
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchStandardPolicyShapingGet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -114,7 +112,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyShapingSet::GetInputSpecIn
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyShapingSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardPolicyShapingSet::ExecuteInternal(const std::shared_ptr<Input>& input,
@@ -149,9 +147,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicySecurityGet::GetOutputStr
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecurityGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchStandardPolicySecurityGet::ExecuteInternal(
@@ -176,8 +172,8 @@ VirtualSwitchStandardPolicySecuritySet::~VirtualSwitchStandardPolicySecuritySet(
 std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecuritySet::GetInputSpecInternal() {
   auto spec = SwitchNameSpec(
       "The name of the virtual switch to use when setting the switch security policy.");
-  AddParameterTable(
-      spec,
+  AddParameters(
+      *spec,
       {{kParamAllowPromiscuous, "p", Fabrik::CallSpec::Boolean, false,
         "Allow ports on the virtual switch to enter promiscuous mode."},
        {kParamAllowMacChange, "m", Fabrik::CallSpec::Boolean, false,
@@ -188,7 +184,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicySecuritySet::GetInputSpecI
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicySecuritySet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardPolicySecuritySet::ExecuteInternal(
@@ -222,9 +218,7 @@ std::shared_ptr<MetaStruct> VirtualSwitchStandardPolicyFailoverGet::GetOutputStr
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverGet::GetOutputSpecInternal() {
-  auto spec = OutputSpec::New();
-  spec->SetRootObject(GetOutputStructure());
-  return spec;
+  return ResultSpec(GetOutputStructure());
 }
 
 void VirtualSwitchStandardPolicyFailoverGet::ExecuteInternal(
@@ -255,7 +249,7 @@ std::shared_ptr<InputSpec> VirtualSwitchStandardPolicyFailoverSet::GetInputSpecI
 }
 
 std::shared_ptr<OutputSpec> VirtualSwitchStandardPolicyFailoverSet::GetOutputSpecInternal() {
-  return BoolResult();
+  return BoolResultSpec();
 }
 
 void VirtualSwitchStandardPolicyFailoverSet::ExecuteInternal(

@@ -81,6 +81,19 @@ TEST(JsonFormatTest, EscapesAndRepairsStrings) {
   EXPECT_EQ(parsed["Valid"], "\xC3\xA9\xE2\x82\xAC\xF0\x9F\x98\x80");
 }
 
+// Every control character, the edges 0x01 and 0x1f included, is escaped:
+// JSON forbids them raw inside a string.
+TEST(JsonFormatTest, EscapesEveryControlCharacter) {
+  std::string controls;
+  for (char c = 1; c < 0x20; ++c)
+    controls += c;
+  const std::string text = Render("json", MetaString::New(controls));
+  ASSERT_FALSE(text.empty());
+  for (char c : text.substr(0, text.size() - 1))
+    EXPECT_GE(static_cast<unsigned char>(c), 0x20) << "raw control character " << int(c);
+  EXPECT_EQ(nlohmann::json::parse(text), controls);
+}
+
 TEST(JsonFormatTest, ReadsBackAsTheResult) {
   for (const auto& [name, root] : Samples())
     EXPECT_EQ(nlohmann::ordered_json::parse(Render("json", root)), Expected(root)) << name;

@@ -71,8 +71,9 @@ TEST(AddressTest, Ipv4Corpus) {
   };
   for (const Case& c : cases) {
     EXPECT_EQ(c.valid, Ipv4Address::IsValidAddress(c.text)) << c.text;
-    if (c.valid)
+    if (c.valid) {
       EXPECT_EQ(c.text, Ipv4Address(c.text).GetStringAddress());
+    }
   }
 }
 

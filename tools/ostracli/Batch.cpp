@@ -143,6 +143,10 @@ int RunBatch(const CommandTree& tree, const std::string& file,
   // nothing of it is kept.
   std::signal(SIGPIPE, SIG_IGN);
   const std::string name = file == "-" ? "-" : file;
+  if (std::string problem = HostProblem(); !problem.empty()) {
+    std::fputs(problem.c_str(), stderr);
+    return ExitCommandError;
+  }
   try {
     HostCtl::Session::BeginBatch();
   } catch (const HostCtl::Lib::HostCtlException& e) {

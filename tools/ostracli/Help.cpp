@@ -4,7 +4,6 @@
 #include "Globals.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <vector>
 
 namespace Ostra {
@@ -55,36 +54,6 @@ const char* TypeName(CallSpec::ParameterType type) {
     return "string list";
   }
   return "value";
-}
-
-/// Appends \p text as a JSON string.
-void JsonString(std::string& out, const std::string& text) {
-  out += '"';
-  for (unsigned char c : text) {
-    switch (c) {
-    case '"':
-      out += "\\\"";
-      break;
-    case '\\':
-      out += "\\\\";
-      break;
-    case '\n':
-      out += "\\n";
-      break;
-    case '\t':
-      out += "\\t";
-      break;
-    default:
-      if (c < 0x20) {
-        char buffer[8];
-        std::snprintf(buffer, sizeof buffer, "\\u%04x", c);
-        out += buffer;
-      } else {
-        out += static_cast<char>(c);
-      }
-    }
-  }
-  out += '"';
 }
 
 /// Two columns: a name padded to \p width, then the text with its line breaks
@@ -207,92 +176,89 @@ std::string CommandHelpText(const AutoCli::CommandSpec& command, const CallSpec:
   return out;
 }
 
-std::string NamespaceHelpJson(const AutoCli::NamespaceNode& node) {
-  std::string out = "{\n  \"path\": ";
-  JsonString(out, node.GetPathString(' '));
-  out += ",\n  \"kind\": \"namespace\",\n  \"description\": ";
-  JsonString(out, node.GetDescription());
-  out += ",\n  \"children\": [";
-  bool first = true;
+MetaObj::MetaObjectPtr NamespaceHelpValue(const AutoCli::NamespaceNode& node) {
+  auto help = MetaObj::MetaStruct::New("NamespaceHelp");
+  help->SetField("path", node.GetPathString(' '));
+  help->SetField("kind", "namespace");
+  help->SetField("description", node.GetDescription());
+  auto children = MetaObj::MetaList::New(MetaObj::Struct, MetaObj::MetaStruct::New("Child"));
   for (const AutoCli::NamespaceNodePtr& child : node.GetNamespaceNodes()) {
-    out += first ? "\n    {\"name\": " : ",\n    {\"name\": ";
-    first = false;
-    JsonString(out, child->GetName());
-    out += child->GetType() == AutoCli::NamespaceKind ? ", \"kind\": \"namespace\""
-                                                      : ", \"kind\": \"command\"";
-    out += ", \"description\": ";
-    JsonString(out, child->GetDescription());
-    out += "}";
+    auto entry = MetaObj::MetaStruct::New("Child");
+    entry->SetField("name", child->GetName());
+    entry->SetField("kind", child->GetType() == AutoCli::NamespaceKind ? "namespace" : "command");
+    entry->SetField("description", child->GetDescription());
+    children->Add(std::move(entry));
   }
-  out += first ? "]\n}\n" : "\n  ]\n}\n";
-  return out;
+  help->SetField("children", std::move(children));
+  return help;
 }
 
-std::string CommandHelpJson(const AutoCli::CommandSpec& command, const CallSpec::InputSpec& spec) {
-  std::string out = "{\n  \"path\": ";
-  JsonString(out, command.GetPathString(' '));
-  out += ",\n  \"kind\": \"command\",\n  \"description\": ";
-  JsonString(out, command.GetDescription());
-  out += ",\n  \"parameters\": [";
-  bool first = true;
-  for (const auto& parameter : spec.GetParameters()) {
-    out += first ? "\n    {" : ",\n    {";
-    first = false;
-    out += "\"name\": ";
-    JsonString(out, parameter->GetName());
-    out += ", \"shortName\": ";
-    JsonString(out, parameter->GetShortName());
-    out += ", \"type\": ";
-    JsonString(out, TypeName(parameter->GetType()));
-    out += ", \"typeCode\": " + std::to_string(static_cast<int>(parameter->GetType()));
-    out += std::string(", \"required\": ") + (parameter->IsRequired() ? "true" : "false");
-    out += ", \"description\": ";
-    JsonString(out, parameter->GetExpandedDescription());
-    if (const auto& constraint = parameter->GetConstraint()) {
-      out +=
-          ", \"constraint\": {\"type\": " + std::to_string(static_cast<int>(constraint->GetType()));
-      switch (constraint->GetType()) {
-      case CallSpec::IntRange:
-        out += ", \"min\": " + std::to_string(constraint->GetMin()) +
-               ", \"max\": " + std::to_string(constraint->GetMax());
-        break;
-      case CallSpec::StringRegex:
-        out += ", \"pattern\": ";
-        JsonString(out, constraint->GetPattern());
-        break;
-      default: {
-        out += ", \"values\": [";
-        bool firstValue = true;
-        for (const auto& value : constraint->GetEnumValues()) {
-          out += firstValue ? "{\"value\": " : ", {\"value\": ";
-          firstValue = false;
-          JsonString(out, value.value);
-          out += ", \"description\": ";
-          JsonString(out, value.description);
-          out += "}";
-        }
-        out += "]";
-      }
-      }
-      out += "}";
+namespace {
+
+/// The constraint of a parameter as help shows it: its type code, then the
+/// range, the pattern or the accepted values.
+std::shared_ptr<MetaObj::MetaStruct> ConstraintValue(const CallSpec::ParameterConstraint& check) {
+  auto constraint = MetaObj::MetaStruct::New("Constraint");
+  constraint->SetField("type", static_cast<long>(check.GetType()));
+  switch (check.GetType()) {
+  case CallSpec::IntRange:
+    constraint->SetField("min", check.GetMin());
+    constraint->SetField("max", check.GetMax());
+    break;
+  case CallSpec::StringRegex:
+    constraint->SetField("pattern", check.GetPattern());
+    break;
+  case CallSpec::IntEnum:
+  case CallSpec::StringEnum: {
+    auto values = MetaObj::MetaList::New(MetaObj::Struct, MetaObj::MetaStruct::New("EnumValue"));
+    for (const auto& value : check.GetEnumValues()) {
+      auto entry = MetaObj::MetaStruct::New("EnumValue");
+      entry->SetField("value", value.value);
+      entry->SetField("description", value.description);
+      values->Add(std::move(entry));
     }
-    out += "}";
+    constraint->SetField("values", std::move(values));
+    break;
   }
-  out += first ? "],\n" : "\n  ],\n";
-  out += "  \"output\": {\"formatter\": ";
-  JsonString(out, command.GetDefaultOutputFormatter());
-  out += ", \"parameters\": [";
-  first = true;
+  }
+  return constraint;
+}
+
+} // namespace
+
+MetaObj::MetaObjectPtr CommandHelpValue(const AutoCli::CommandSpec& command,
+                                        const CallSpec::InputSpec& spec) {
+  auto help = MetaObj::MetaStruct::New("CommandHelp");
+  help->SetField("path", command.GetPathString(' '));
+  help->SetField("kind", "command");
+  help->SetField("description", command.GetDescription());
+  auto parameters = MetaObj::MetaList::New(MetaObj::Struct, MetaObj::MetaStruct::New("Parameter"));
+  for (const auto& parameter : spec.GetParameters()) {
+    auto entry = MetaObj::MetaStruct::New("Parameter");
+    entry->SetField("name", parameter->GetName());
+    entry->SetField("shortName", parameter->GetShortName());
+    entry->SetField("type", TypeName(parameter->GetType()));
+    entry->SetField("typeCode", static_cast<long>(parameter->GetType()));
+    entry->SetField("required", parameter->IsRequired());
+    entry->SetField("description", parameter->GetExpandedDescription());
+    if (const auto& constraint = parameter->GetConstraint())
+      entry->SetField("constraint", ConstraintValue(*constraint));
+    parameters->Add(std::move(entry));
+  }
+  help->SetField("parameters", std::move(parameters));
+  // The default output parameters are pairs of key and value, in order.
+  auto output = MetaObj::MetaStruct::New("Output");
+  output->SetField("formatter", command.GetDefaultOutputFormatter());
+  auto pairs = MetaObj::MetaList::New(MetaObj::List);
   for (const auto& [key, value] : command.GetDefaultOutputParameters()) {
-    out += first ? "[" : ", [";
-    first = false;
-    JsonString(out, key);
-    out += ", ";
-    JsonString(out, value);
-    out += "]";
+    auto pair = MetaObj::MetaList::New(MetaObj::String);
+    pair->Add(key);
+    pair->Add(value);
+    pairs->Add(std::move(pair));
   }
-  out += "]}\n}\n";
-  return out;
+  output->SetField("parameters", std::move(pairs));
+  help->SetField("output", std::move(output));
+  return help;
 }
 
 } // namespace Ostra

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "Fabrik/AutoCli.h"
+#include "Fabrik/MetaObj.h"
 
 #include <string>
 #include <vector>
@@ -31,9 +32,14 @@ std::string NamespaceHelpText(const Fabrik::AutoCli::NamespaceNode& node,
 std::string CommandHelpText(const Fabrik::AutoCli::CommandSpec& command,
                             const Fabrik::CallSpec::InputSpec& spec);
 
-/// Machine-readable help (--formatter json --help).
-std::string NamespaceHelpJson(const Fabrik::AutoCli::NamespaceNode& node);
-std::string CommandHelpJson(const Fabrik::AutoCli::CommandSpec& command,
-                            const Fabrik::CallSpec::InputSpec& spec);
+/// Help as a typed value, for --help with an explicit --formatter: a
+/// namespace's path, kind, description and children (each with name, kind and
+/// description).
+Fabrik::MetaObj::MetaObjectPtr NamespaceHelpValue(const Fabrik::AutoCli::NamespaceNode& node);
+/// A command's path, kind and description, its parameters (name, short name,
+/// type and type code, required, expanded description, constraint) and its
+/// default output formatter with its parameters as pairs of key and value.
+Fabrik::MetaObj::MetaObjectPtr CommandHelpValue(const Fabrik::AutoCli::CommandSpec& command,
+                                                const Fabrik::CallSpec::InputSpec& spec);
 
 } // namespace Ostra

@@ -101,7 +101,18 @@ std::string HostStateText() {
   return host.path + (host.isDefault ? " (created from the demo profile on first use)" : "");
 }
 
-/// The refusal of a host state that is missing or unreadable, or "".
+/// Reads a lock timeout in milliseconds; -1 when \p text is not one.
+int ParseTimeout(const std::string& text) {
+  if (text.empty() || text.size() > 7 || text.find_first_not_of("0123456789") != std::string::npos)
+    return -1;
+  return std::stoi(text);
+}
+
+/// Values echoed in messages are cut to this many characters.
+constexpr std::size_t kEchoLimit = 64;
+
+} // namespace
+
 std::string HostProblem() {
   const HostChoice& host = Chosen();
   if (!host.problem.empty())
@@ -119,18 +130,6 @@ std::string HostProblem() {
            "\n";
   return "";
 }
-
-/// Reads a lock timeout in milliseconds; -1 when \p text is not one.
-int ParseTimeout(const std::string& text) {
-  if (text.empty() || text.size() > 7 || text.find_first_not_of("0123456789") != std::string::npos)
-    return -1;
-  return std::stoi(text);
-}
-
-/// Values echoed in messages are cut to this many characters.
-constexpr std::size_t kEchoLimit = 64;
-
-} // namespace
 
 void SelectHost(const std::string& path, bool isDefault) {
   Chosen() = {path, isDefault, ""};
@@ -228,7 +227,7 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
                        std::string& err) {
   std::size_t i = 0;
   auto value = [&](const std::string& name, std::string& into) -> bool {
-    std::string arg = args[i];
+    const std::string& arg = args[i];
     std::size_t eq = arg.find('=');
     if (eq != std::string::npos) {
       into = arg.substr(eq + 1);
@@ -361,14 +360,24 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     node = next;
   }
 
-  const bool machine = global.formatter == "json";
+  // Help is text unless a formatter is asked for; then it is a typed value
+  // that formatter prints.
+  auto printHelp = [&](const MetaObj::MetaObjectPtr& help) {
+    AppendBuffer buffer(out);
+    std::ostream text(&buffer);
+    Format::MakeFormatter(global.formatter)->Write(text, help, Format::Parameters());
+  };
+  const bool typedHelp = !global.formatter.empty();
   if (node->GetType() == AutoCli::NamespaceKind) {
     if (!rest.empty() && !global.help && !AsksForHelp(rest, nullptr)) {
       err += "Error: " + rest[0] + " is not a command; \"ostracli " + node->GetPathString(' ') +
              " --help\" lists the commands\n";
       return ExitUsage;
     }
-    out += machine ? NamespaceHelpJson(*node) : NamespaceHelpText(*node, HostStateText());
+    if (typedHelp)
+      printHelp(NamespaceHelpValue(*node));
+    else
+      out += NamespaceHelpText(*node, HostStateText());
     return ExitOk;
   }
 
@@ -388,7 +397,10 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     return ExitCommandError;
   }
   if (global.help || AsksForHelp(rest, inputSpec.get())) {
-    out += machine ? CommandHelpJson(*command, *inputSpec) : CommandHelpText(*command, *inputSpec);
+    if (typedHelp)
+      printHelp(CommandHelpValue(*command, *inputSpec));
+    else
+      out += CommandHelpText(*command, *inputSpec);
     return ExitOk;
   }
 
@@ -404,8 +416,8 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
   // write one for a command that changes the host, so that it either waits
   // for the lock or changes nothing at all.
   if (!mode.inBatch) {
-    if (std::string problem = HostProblem(); !problem.empty()) {
-      err += problem;
+    if (std::string hostProblem = HostProblem(); !hostProblem.empty()) {
+      err += hostProblem;
       return ExitCommandError;
     }
   }

@@ -86,6 +86,10 @@ int RunBatch(const CommandTree& tree, const std::string& file,
 /// run.
 void SelectHost(const std::string& path, bool isDefault);
 
+/// The one-line refusal ("ostracli: ...\n") of the selected host when it is
+/// missing, unreadable or served by no backend; "" when commands may run.
+std::string HostProblem();
+
 /// Whether \p command changes the host, and so runs in a write transaction
 /// (every other command runs in one read transaction).
 bool ChangesHost(Fabrik::AutoCli::CommandSpec& command);

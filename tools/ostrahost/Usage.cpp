@@ -60,7 +60,7 @@ std::string Indented(const char* text, std::size_t indent) {
 
 /// \p text padded with blanks to \p width; a longer one is followed by a line
 /// break and \p width blanks.
-std::string Padded(std::string text, std::size_t width) {
+std::string Padded(const std::string& text, std::size_t width) {
   return text.size() < width ? text + std::string(width - text.size(), ' ')
                              : text + "\n" + std::string(width, ' ');
 }

@@ -237,8 +237,10 @@ int RunInit(const Options& options) {
   const std::string& path = options.positional[0];
   if (Exists(path))
     return Fail("the file " + path + " exists already");
-  nlohmann::ordered_json host = Model::Profile(options.profile);
-  WriteHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
+  // Always a new file: another init may make the same path meanwhile,
+  // and its host must not be replaced (WriteHost would import into it).
+  nlohmann::ordered_json description = Model::Profile(options.profile);
+  CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, description); });
   return 0;
 }
 
@@ -258,9 +260,9 @@ int RunImport(const Options& options) {
   std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, std::fclose);
   // The description is checked whole before the host is touched, then read
   // again as it is imported: the large arrays are never in memory whole.
-  nlohmann::ordered_json host = Model::ReadDescription(file);
+  nlohmann::ordered_json description = Model::ReadDescription(file);
   WriteHost(HostPath(options.host),
-            [&](Model::Store& store) { Model::ImportHost(store, host, file); });
+            [&](Model::Store& store) { Model::ImportHost(store, description, file); });
   return 0;
 }
 

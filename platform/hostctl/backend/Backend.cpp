@@ -1,13 +1,16 @@
 //===- Backend.cpp - Operations a backend has not overridden ---------------===//
 //
 // Every default throws NotAvailableException naming the operation, except the
-// Make functions, which hand out these defaults, and the few operations whose
-// doing nothing is the honest answer (documented in Backend.h).
+// Make functions, which hand out these defaults, the few operations whose
+// doing nothing is the honest answer (documented in Backend.h), and the
+// network root's kernel-interface service, which is the handle over the
+// backend's own kernel interfaces.
 //
 //===----------------------------------------------------------------------===//
 #include "backend/Backend.h"
 
 #include "HostCtl/Lib.h"
+#include "TvkCtl/Network/TvkNicImpl.h"
 
 namespace HostCtl::Backend {
 
@@ -61,7 +64,9 @@ void Network::SetTvkIpv6Enabled(bool) {
   NOT_AVAILABLE(SetTvkIpv6Enabled);
 }
 std::unique_ptr<TvKernelNicInfo> Network::GetTvKernelNicInfo() {
-  NOT_AVAILABLE(GetTvKernelNicInfo);
+  // The kernel-interface service of the same host: the handle over this
+  // backend's kernel interfaces, which are not available where it has none.
+  return std::make_unique<TvkCtl::Network::TvKernelNicInfoImpl>();
 }
 std::vector<std::unique_ptr<HostCtl::Network::PortGroup>>
 Network::GetAllPortGroups(PortsetGetType) {

@@ -61,6 +61,8 @@ public:
   std::vector<std::string> GetPredefinedNetstackInstances() override;
   bool IsTvkIpv6Enabled() override;
   void SetTvkIpv6Enabled(bool enabled) override;
+  /// By default the handle over this backend's kernel interfaces
+  /// (MakeKernelNics), so that the factory's road and the direct one meet.
   std::unique_ptr<HostCtl::Network::TvKernelNicInfo> GetTvKernelNicInfo() override;
   std::vector<std::unique_ptr<HostCtl::Network::PortGroup>>
   GetAllPortGroups(HostCtl::Network::PortsetGetType type) override;

@@ -499,8 +499,8 @@ void ImportInterface(const JsonObject& nic, int ord, Store& store) {
   }
   index = 0;
   for (const JsonObject& group : nic.Objects("multicast")) {
-    std::string address = group.String("group");
-    if (!Ipv4Address::IsValidAddress(address) && !Ipv6Address::IsValidAddress(address))
+    std::string groupAddress = group.String("group");
+    if (!Ipv4Address::IsValidAddress(groupAddress) && !Ipv6Address::IsValidAddress(groupAddress))
       group.Fail("group", "expected an IPv4 or IPv6 group address");
     std::string link = group.String("linkLayer");
     std::array<uint8_t, 6> bytes{};
@@ -508,7 +508,7 @@ void ImportInterface(const JsonObject& nic, int ord, Store& store) {
       group.Fail("linkLayer", "expected a MAC address");
     Statement add = store.Prepare(
         "INSERT INTO tvknic_mcast(nic, grp, link_layer, refcount, ord) VALUES(?,?,?,?,?)");
-    add.BindAll(name, address, MacAddress(bytes).GetStringAddress(),
+    add.BindAll(name, groupAddress, MacAddress(bytes).GetStringAddress(),
                 group.Int("refcount", 1, UINT32_MAX, 1), index++);
     try {
       add.Run();

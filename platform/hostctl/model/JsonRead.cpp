@@ -21,14 +21,14 @@ template <typename Input> ordered_json Parse(Input&& input, const ElementHook* h
   };
   std::vector<Frame> frames;
   auto path = [&frames] {
-    std::string text;
+    std::string where;
     for (const Frame& frame : frames) {
       if (frame.object && !frame.key.empty())
-        text += (text.empty() ? "" : ".") + frame.key;
+        where += (where.empty() ? "" : ".") + frame.key;
       else if (!frame.object && frame.count > 0)
-        text += "[" + std::to_string(frame.count - 1) + "]";
+        where += "[" + std::to_string(frame.count - 1) + "]";
     }
-    return text;
+    return where;
   };
   // An element of a top-level array is complete: the hook decides whether it
   // stays. \p depth is the number of frames open around the element.

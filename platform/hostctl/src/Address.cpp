@@ -96,7 +96,7 @@ bool MacAddress::Parse(const std::string& text, std::array<uint8_t, 6>& bytes) {
   char separator = text[2];
   if (separator != ':' && separator != '-')
     return false;
-  for (int i = 0; i < 6; ++i) {
+  for (std::size_t i = 0; i < 6; ++i) {
     int high = HexValue(text[i * 3]);
     int low = HexValue(text[i * 3 + 1]);
     if (high < 0 || low < 0)
@@ -271,7 +271,7 @@ bool Ipv6Address::Parse(const std::string& text, std::array<uint8_t, 16>& bytes)
     for (int i = 0; i < tail; ++i)
       full[8 - tail + i] = groups[gap + i];
   }
-  for (int i = 0; i < 8; ++i) {
+  for (std::size_t i = 0; i < 8; ++i) {
     bytes[i * 2] = static_cast<uint8_t>(full[i] >> 8);
     bytes[i * 2 + 1] = static_cast<uint8_t>(full[i] & 0xff);
   }
@@ -297,7 +297,7 @@ bool Ipv6Address::IsUnspecified() const {
 
 std::string Ipv6Address::GetStringAddress() const {
   uint16_t groups[8];
-  for (int i = 0; i < 8; ++i)
+  for (std::size_t i = 0; i < 8; ++i)
     groups[i] = static_cast<uint16_t>((bytes_[i * 2] << 8) | bytes_[i * 2 + 1]);
   // The longest run of two or more zero groups is written as "::" (the first
   // one when runs tie).

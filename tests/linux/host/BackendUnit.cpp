@@ -69,8 +69,8 @@ TEST_F(StateFile, RecordsSurviveARewriteAndARefusedEditChangesNothing) {
   EXPECT_EQ(records[1].kind, "sa");
   std::string before = LinuxNet::ReadTextFile(path_);
   EXPECT_THROW(LinuxHost::UpdateState(path_,
-                                      [](auto& records) {
-                                        records.clear();
+                                      [](auto& kept) {
+                                        kept.clear();
                                         LinuxHost::Refuse("no");
                                       }),
                HostCtl::Lib::HostCtlException);

@@ -357,9 +357,11 @@ public:
         {OffloadTxChecksum, {OffloadGroup::TxChecksum, settings.txChecksum}},
         {OffloadScatterGather, {OffloadGroup::ScatterGather, settings.scatterGather}},
         {OffloadTso, {OffloadGroup::Tso, settings.tso}}};
-    for (const auto& [bit, change] : groups)
-      if (settings.mask & bit)
+    for (const auto& group : groups) {
+      const std::pair<OffloadGroup, bool>& change = group.second;
+      if (settings.mask & group.first)
         Kernel([&] { LinuxNet::SetOffload(ctx_.ns, Name(), change.first, change.second); });
+    }
   }
   void GetCoalesceParams(PnicCoalesceParams& p) const override {
     LinuxNet::Coalesce c = Kernel([&] { return LinuxNet::GetCoalesce(ctx_.ns, Name()); });

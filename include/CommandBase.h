@@ -41,8 +41,12 @@ public:                                                                         
 
 /// New() of the classes that derive virtually from Command: allocated with new.
 #define CORVEX_DEFINE_NEW(Class)                                                                   \
-  std::shared_ptr<Class> Class::New() { return std::shared_ptr<Class>(new Class()); }
+  std::shared_ptr<Class> Class::New() {                                                            \
+    return std::shared_ptr<Class>(new Class());                                                    \
+  }
 
 /// New() of the classes that derive directly from Command: std::make_shared.
 #define CORVEX_DEFINE_MAKE_SHARED(Class)                                                           \
-  std::shared_ptr<Class> Class::New() { return std::make_shared<Class>(); }
+  std::shared_ptr<Class> Class::New() {                                                            \
+    return std::make_shared<Class>();                                                              \
+  }
