@@ -151,16 +151,15 @@ TEST(MetaObjTest, SetFieldReplacesInPlaceAndCloneIsDeep) {
   nic->SetField("MTU", MetaObj::MetaInt::New());
   nic->SetField("Name", "vmnic0");
   nic->SetField("Uplinks", std::vector<std::string>{"a"});
-  ASSERT_EQ(nic->GetFields().size(), 3u);
-  EXPECT_EQ(nic->GetFields()[0].name, "Name");
-  EXPECT_TRUE(nic->GetFields()[0].value->IsSet());
-  EXPECT_FALSE((*nic->GetField("MTU"))->IsSet());
+  ASSERT_EQ(nic->GetFieldCount(), 3u);
+  EXPECT_EQ(nic->GetFieldName(0), "Name");
+  EXPECT_TRUE(nic->GetFieldValue(0).IsShown());
+  EXPECT_FALSE(nic->GetField("MTU")->IsShown());
   EXPECT_EQ(nic->GetField("Missing"), nullptr);
 
   auto copy = std::static_pointer_cast<MetaObj::MetaStruct>(nic->Clone());
   copy->SetField("Name", "vmnic1");
-  std::static_pointer_cast<MetaObj::MetaList>(*copy->GetField("Uplinks"))->Add("b");
-  EXPECT_EQ(std::static_pointer_cast<MetaObj::MetaString>(*nic->GetField("Name"))->GetValue(),
-            "vmnic0");
-  EXPECT_EQ(std::static_pointer_cast<MetaObj::MetaList>(*nic->GetField("Uplinks"))->GetCount(), 1u);
+  std::static_pointer_cast<MetaObj::MetaList>(copy->GetField("Uplinks")->GetObject())->Add("b");
+  EXPECT_EQ(nic->GetField("Name")->GetString(), "vmnic0");
+  EXPECT_EQ(nic->GetField("Uplinks")->AsList().GetCount(), 1u);
 }

@@ -44,8 +44,8 @@ void ExpectRecords(const ordered_json& records, const MetaObjectPtr& root,
   const auto& shape = static_cast<const MetaStruct&>(
       root->GetType() == Struct ? *root : *list.GetElementTemplate());
   auto header = ordered_json::array();
-  for (const MetaStruct::Field& field : shape.GetFields())
-    header.push_back(field.name);
+  for (const std::string& field : shape.GetLayout().GetFieldNames())
+    header.push_back(field);
   ASSERT_EQ(records.size(), rows.size() + 1) << name;
   EXPECT_EQ(records[0], header) << name;
   for (std::size_t r = 0; r < rows.size(); ++r) {

@@ -63,10 +63,10 @@ inline std::shared_ptr<MetaStruct> Switch(const std::string& name, long mtu,
   value->SetField("Name", name);
   value->SetField("MTU", mtu);
   value->SetField("Uplinks", uplinks);
-  auto policy = std::static_pointer_cast<MetaStruct>(*value->GetField("Policy"));
+  auto policy = std::static_pointer_cast<MetaStruct>(value->GetField("Policy")->GetObject());
   policy->SetField("Enabled", true);
   policy->SetField("Peak", 100L);
-  auto ports = std::static_pointer_cast<MetaList>(*value->GetField("Ports"));
+  auto ports = std::static_pointer_cast<MetaList>(value->GetField("Ports")->GetObject());
   for (long id : portIds) {
     auto port = MetaStruct::New("Port");
     port->SetField("Port ID", id);
@@ -115,9 +115,10 @@ inline std::shared_ptr<MetaList> Nics() {
   first->SetField("Speed", 25000L);
   first->SetField("Link Up", true);
   first->SetField("Uplinks", std::vector<std::string>{"vmnic0", "vmnic1"});
-  auto firstDriver = std::static_pointer_cast<MetaStruct>(*first->GetField("Driver"));
+  auto firstDriver = std::static_pointer_cast<MetaStruct>(first->GetField("Driver")->GetObject());
   firstDriver->SetField("Name", "nfx");
-  auto firstFirmware = std::static_pointer_cast<MetaStruct>(*firstDriver->GetField("Firmware"));
+  auto firstFirmware =
+      std::static_pointer_cast<MetaStruct>(firstDriver->GetField("Firmware")->GetObject());
   firstFirmware->SetField("Version", "2.1");
   firstFirmware->SetField("Features", std::vector<std::string>{"tso", "rss"});
   auto firstQueue = std::static_pointer_cast<MetaStruct>(queue->Clone());
@@ -125,8 +126,9 @@ inline std::shared_ptr<MetaList> Nics() {
   auto firstFilter = std::static_pointer_cast<MetaStruct>(filter->Clone());
   firstFilter->SetField("Class", "mac");
   firstFilter->SetField("MACs", std::vector<std::string>{"00:50:56:00:00:01"});
-  std::static_pointer_cast<MetaList>(*firstQueue->GetField("Filters"))->Add(firstFilter);
-  std::static_pointer_cast<MetaList>(*first->GetField("Queues"))->Add(firstQueue);
+  std::static_pointer_cast<MetaList>(firstQueue->GetField("Filters")->GetObject())
+      ->Add(firstFilter);
+  std::static_pointer_cast<MetaList>(first->GetField("Queues")->GetObject())->Add(firstQueue);
   first->SetField("Description", "Dual port, \"25G\"");
   list->Add(first);
 
@@ -176,32 +178,37 @@ inline std::vector<std::pair<std::string, MetaObjectPtr>> Samples() {
 
 /// The values \p value holds as JSON, in field order: unset fields are left
 /// out, an unset item of a list is null. Independent of the formatters.
-inline nlohmann::ordered_json Expected(const MetaObjectPtr& value) {
-  if (!value || !value->IsSet())
+inline nlohmann::ordered_json Expected(const Fabrik::MetaObj::MetaValue& value) {
+  if (!value.IsShown())
     return nullptr;
-  switch (value->GetType()) {
+  switch (value.GetType()) {
   case Boolean:
-    return static_cast<const MetaBool&>(*value).GetValue();
+    return value.GetBool();
   case Integer:
-    return static_cast<const MetaInt&>(*value).GetValue();
+    return value.GetInt();
   case String:
-    return static_cast<const MetaString&>(*value).GetValue();
+    return value.GetString();
   case List: {
     auto array = nlohmann::ordered_json::array();
-    for (const MetaObjectPtr& item : static_cast<const MetaList&>(*value).GetItems())
+    for (const Fabrik::MetaObj::MetaValue& item : value.AsList().GetItems())
       array.push_back(Expected(item));
     return array;
   }
   case Struct: {
     auto object = nlohmann::ordered_json::object();
-    for (const MetaStruct::Field& field : static_cast<const MetaStruct&>(*value).GetFields()) {
-      if (field.value && field.value->IsSet())
-        object[field.name] = Expected(field.value);
+    const MetaStruct& structure = value.AsStruct();
+    for (std::size_t i = 0; i < structure.GetFieldCount(); ++i) {
+      if (structure.GetFieldValue(i).IsShown())
+        object[structure.GetFieldName(i)] = Expected(structure.GetFieldValue(i));
     }
     return object;
   }
   }
   return nullptr;
+}
+
+inline nlohmann::ordered_json Expected(const MetaObjectPtr& value) {
+  return Expected(Fabrik::MetaObj::MetaValue(value));
 }
 
 /// What a helper program printed and how it ended.

@@ -315,6 +315,118 @@ TEST(HostTest, ACommandIsOneTransaction) {
   EXPECT_FALSE(HasSetting("sneaky"));
 }
 
+/// A listing: rows of one kind, then an ending chosen by the mode.
+class Lister : public Fabrik::AutoCli::Command {
+public:
+  explicit Lister(int mode) : mode_(mode) { SetDefaultOutputFormatter("table"); }
+
+protected:
+  std::shared_ptr<CallSpec::InputSpec> GetInputSpecInternal() override {
+    return CallSpec::InputSpec::New();
+  }
+  static std::shared_ptr<MetaObj::MetaStruct> Row() {
+    auto row = MetaObj::MetaStruct::New("Item");
+    row->SetField("Name", MetaObj::MetaString::New());
+    row->SetField("Size", MetaObj::MetaInt::New());
+    return row;
+  }
+  std::shared_ptr<CallSpec::OutputSpec> GetOutputSpecInternal() override {
+    auto spec = CallSpec::OutputSpec::New();
+    spec->SetRootObject(MetaObj::MetaList::New(MetaObj::Struct, Row()));
+    return spec;
+  }
+  void ExecuteInternal(const std::shared_ptr<CallSpec::Input>&,
+                       const std::shared_ptr<CallSpec::Output>& output) override {
+    auto list = MetaObj::MetaList::New(MetaObj::Struct, Row());
+    for (long i = 0; i < 3; ++i) {
+      auto row = Row();
+      row->SetField("Name", "item" + std::to_string(i));
+      list->Add(row);
+      row->SetField("Size", i * 10);
+    }
+    switch (mode_) {
+    case 0: // Every row listed.
+      output->SetRootObject(list);
+      return;
+    case 1: // A failure after some rows: the error alone.
+      output->AddErrorMessage("cannot read item3");
+      return;
+    case 2: // A failure reported with the rows so far.
+      output->AddErrorMessage("cannot read item3");
+      output->SetRootObject(list);
+      return;
+    case 3: { // The result is another list of the same kind.
+      auto other = MetaObj::MetaList::New(MetaObj::Struct, Row());
+      auto row = Row();
+      row->SetField("Name", "other");
+      other->Add(row);
+      output->SetRootObject(other);
+      return;
+    }
+    default:
+      throw std::runtime_error("lost the host");
+    }
+  }
+
+private:
+  int mode_; ///< Which ending.
+};
+
+TEST(HostTest, ListingsStreamAndPrintNothingWhenTheyFail) {
+  TestSupport::ScratchHost host("host-listing", "{}");
+  auto root = AutoCli::Namespace::New();
+  auto lists = AutoCli::Namespace::New();
+  for (int mode = 0; mode < 5; ++mode)
+    lists->RegisterNamespaceNode(std::make_shared<Lister>(mode), "l" + std::to_string(mode));
+  root->RegisterNamespaceNode(lists, "list");
+  Ostra::CommandTree tree(root);
+  auto run = [&](const std::string& name, std::string& out, std::string& err,
+                 const std::vector<std::string>& global = {}) {
+    out.clear();
+    err.clear();
+    std::vector<std::string> args = global;
+    args.insert(args.end(), {"list", name});
+    return Ostra::RunCommandLine(tree, args, out, err);
+  };
+  const std::string table = "Name   Size\n"
+                            "-----  ----\n"
+                            "item0  0\n"
+                            "item1  10\n"
+                            "item2  20\n";
+  std::string out, err;
+  EXPECT_EQ(run("l0", out, err), 0);
+  EXPECT_EQ(out, table);
+  EXPECT_EQ(run("l0", out, err, {"--formatter", "csv"}), 0);
+  EXPECT_EQ(out, "Name,Size\nitem0,0\nitem1,10\nitem2,20\n");
+  EXPECT_EQ(run("l1", out, err), 1);
+  EXPECT_EQ(out, "");
+  EXPECT_EQ(err, "cannot read item3\n");
+  EXPECT_EQ(run("l2", out, err), 1);
+  EXPECT_EQ(out, table);
+  EXPECT_EQ(err, "cannot read item3\n");
+  EXPECT_EQ(run("l3", out, err, {"--formatter", "json"}), 0);
+  EXPECT_EQ(out, "[\n  {\n    \"Name\": \"other\"\n  }\n]\n");
+  EXPECT_EQ(run("l4", out, err), 1);
+  EXPECT_EQ(out, "");
+  EXPECT_EQ(err, "Internal error: lost the host\n");
+
+  // The whole run writes a streamed result straight to its output file,
+  // after anything already in the output text.
+  std::FILE* file = std::tmpfile();
+  ASSERT_NE(file, nullptr);
+  Ostra::RunMode direct;
+  direct.direct = file;
+  out = "before\n";
+  err.clear();
+  EXPECT_EQ(Ostra::RunCommandLine(tree, {"list", "l0"}, out, err, direct), 0);
+  EXPECT_EQ(out, "");
+  std::rewind(file);
+  std::string written(4096, '\0');
+  written.resize(std::fread(written.data(), 1, written.size(), file));
+  std::fclose(file);
+  EXPECT_EQ(written, "before\n" + table);
+}
+
 TEST(HostTest, LongEchoedValuesAreShortened) {
   const std::string word(200, 'x');
   const std::string accented = std::string(70, 'a') + "\xc3\xa9";

@@ -98,9 +98,9 @@ using StructureFields = std::map<std::string, std::set<std::string>>;
 void CollectStructures(const MetaObjectPtr& value, StructureFields& out) {
   if (auto structure = std::dynamic_pointer_cast<MetaStruct>(value)) {
     auto& fields = out[structure->GetName()];
-    for (const auto& field : structure->GetFields()) {
-      fields.insert(field.name);
-      CollectStructures(field.value, out);
+    for (std::size_t i = 0; i < structure->GetFieldCount(); ++i) {
+      fields.insert(structure->GetFieldName(i));
+      CollectStructures(structure->GetFieldValue(i).GetObject(), out);
     }
   } else if (auto list = std::dynamic_pointer_cast<MetaList>(value)) {
     if (list->GetElementTemplate())

@@ -86,17 +86,16 @@ TEST(FieldTableTest, FieldsAreUnsetValuesOfTheirKindInOrder) {
                                            {"Up", FieldKind::Boolean},
                                            {"Tags", FieldKind::StringList}});
   EXPECT_EQ(structure->GetName(), "Thing");
-  const auto& fields = structure->GetFields();
-  ASSERT_EQ(fields.size(), 4u);
+  ASSERT_EQ(structure->GetFieldCount(), 4u);
   const Fabrik::MetaObj::MetaType kinds[] = {Fabrik::MetaObj::String, Fabrik::MetaObj::Integer,
                                              Fabrik::MetaObj::Boolean, Fabrik::MetaObj::List};
   const char* names[] = {"Name", "Count", "Up", "Tags"};
-  for (std::size_t i = 0; i < fields.size(); ++i) {
-    EXPECT_EQ(fields[i].name, names[i]);
-    EXPECT_EQ(fields[i].value->GetType(), kinds[i]) << names[i];
+  for (std::size_t i = 0; i < structure->GetFieldCount(); ++i) {
+    EXPECT_EQ(structure->GetFieldName(i), names[i]);
+    EXPECT_EQ(structure->GetFieldValue(i).GetType(), kinds[i]) << names[i];
   }
-  EXPECT_FALSE(fields[0].value->IsSet());
-  EXPECT_FALSE(fields[2].value->IsSet());
+  EXPECT_FALSE(structure->GetFieldValue(0).IsShown());
+  EXPECT_FALSE(structure->GetFieldValue(2).IsShown());
 }
 
 } // namespace

@@ -30,46 +30,58 @@
 namespace Ostra {
 
 bool SplitWords(const std::string& line, std::vector<std::string>& words) {
-  words.clear();
-  std::string word;
-  bool inWord = false;
-  for (std::size_t i = 0; i < line.size(); ++i) {
-    char c = line[i];
+  // The strings of \p words are reused from line to line: a batch of
+  // thousands of lines allocates for its words once.
+  std::size_t count = 0;
+  std::string* word = nullptr;
+  auto startWord = [&]() {
+    if (word)
+      return;
+    if (count == words.size())
+      words.emplace_back();
+    word = &words[count++];
+    word->clear();
+  };
+  const std::size_t size = line.size();
+  for (std::size_t i = 0; i < size; ++i) {
+    const char c = line[i];
     if (c == ' ' || c == '\t' || c == '\r') {
-      if (inWord)
-        words.push_back(word);
-      word.clear();
-      inWord = false;
+      word = nullptr;
     } else if (c == '\'') {
       std::size_t end = line.find('\'', i + 1);
       if (end == std::string::npos)
         return false;
-      word += line.substr(i + 1, end - i - 1);
-      inWord = true;
+      startWord();
+      word->append(line, i + 1, end - i - 1);
       i = end;
     } else if (c == '"') {
-      inWord = true;
+      startWord();
       for (++i;; ++i) {
-        if (i >= line.size())
+        if (i >= size)
           return false;
         if (line[i] == '"')
           break;
-        if (line[i] == '\\' && i + 1 < line.size() &&
+        if (line[i] == '\\' && i + 1 < size &&
             (line[i + 1] == '"' || line[i + 1] == '\\' || line[i + 1] == '$' || line[i + 1] == '`'))
           ++i;
-        word += line[i];
+        *word += line[i];
       }
     } else if (c == '\\') {
-      if (i + 1 < line.size())
-        word += line[++i];
-      inWord = true;
+      startWord();
+      if (i + 1 < size)
+        *word += line[++i];
     } else {
-      word += c;
-      inWord = true;
+      // A run of plain characters at once.
+      std::size_t end = i + 1;
+      while (end < size && line[end] != ' ' && line[end] != '\t' && line[end] != '\r' &&
+             line[end] != '\'' && line[end] != '"' && line[end] != '\\')
+        ++end;
+      startWord();
+      word->append(line, i, end - i);
+      i = end - 1;
     }
   }
-  if (inWord)
-    words.push_back(word);
+  words.resize(count);
   return true;
 }
 
@@ -116,6 +128,9 @@ private:
   bool owned_ = false;          ///< Opened here.
 };
 
+/// Bytes of results a batch gathers before it writes them.
+constexpr std::size_t kOutputPiece = 64 * 1024;
+
 /// "ostracli: FILE:N: " in front of every line of \p messages.
 std::string NameLine(const std::string& messages, const std::string& where) {
   std::string named;
@@ -160,13 +175,24 @@ int RunBatch(const CommandTree& tree, const std::string& file,
   long applied = 0, failed = 0, stoppedAt = 0;
   std::string fatal; // Why the batch cannot be kept, or "".
   std::string line;
+  std::vector<std::string> words;
+  std::string out, err;
+  // The lines' results are passed on in large pieces, and before anything
+  // goes to standard error, so that the two keep their order. A write that
+  // fails stops the batch before it is kept.
+  std::string pending;
+  auto flush = [&]() {
+    bool written = WriteAll(stdout, pending);
+    pending.clear();
+    return written;
+  };
   for (long number = 1; input.Next(line); ++number) {
     std::size_t start = line.find_first_not_of(" \t\r");
     if (start == std::string::npos || line[start] == '#')
       continue;
-    std::vector<std::string> words;
     int status;
-    std::string out, err;
+    out.clear();
+    err.clear();
     if (line.find('\0') != std::string::npos) {
       err = "Error: the line holds a NUL byte\n";
       status = ExitUsage;
@@ -179,13 +205,14 @@ int RunBatch(const CommandTree& tree, const std::string& file,
       words.insert(words.begin(), defaults.begin(), defaults.end());
       status = RunCommandLine(tree, words, out, err, mode);
     }
-    const std::string where = "ostracli: " + name + ":" + std::to_string(number) + ": ";
-    if (!WriteAll(stdout, out)) {
+    pending += out;
+    if ((pending.size() >= kOutputPiece || !err.empty()) && !flush()) {
       fatal = "cannot write the output: " + std::string(std::strerror(errno));
       stoppedAt = number;
       break;
     }
-    WriteAll(stderr, NameLine(err, where));
+    if (!err.empty())
+      WriteAll(stderr, NameLine(err, "ostracli: " + name + ":" + std::to_string(number) + ": "));
     worst = std::max(worst, status);
     (status == ExitOk ? applied : failed) += 1;
     if (HostCtl::Session::BatchLost()) {
@@ -198,6 +225,8 @@ int RunBatch(const CommandTree& tree, const std::string& file,
       break;
     }
   }
+  if (fatal.empty() && !flush())
+    fatal = "cannot write the output: " + std::string(std::strerror(errno));
   if (fatal.empty() && input.Failed()) {
     fatal = "cannot read the batch: " + std::string(std::strerror(errno));
     worst = std::max(worst, static_cast<int>(ExitUsage));

@@ -40,10 +40,10 @@ void Collect(const MetaObj::MetaObjectPtr& value, Shapes& shapes) {
   auto [entry, added] = shapes.try_emplace(structure.GetName());
   if (!added)
     return;
-  for (const auto& field : structure.GetFields())
-    entry->second.push_back(field.name);
-  for (const auto& field : structure.GetFields())
-    Collect(field.value, shapes);
+  for (std::size_t i = 0; i < structure.GetFieldCount(); ++i)
+    entry->second.push_back(structure.GetFieldName(i));
+  for (std::size_t i = 0; i < structure.GetFieldCount(); ++i)
+    Collect(structure.GetFieldValue(i).GetObject(), shapes);
 }
 
 std::string Join(const std::vector<std::string>& names) {

@@ -70,6 +70,74 @@ private:
   std::string& text_; ///< Destination.
 };
 
+/// A stream buffer that writes to a file in large pieces and remembers a
+/// failed write (with its errno).
+class FileBuffer final : public std::streambuf {
+public:
+  explicit FileBuffer(std::FILE* file) : file_(file) {}
+  /// Writes what is buffered; false once a write failed.
+  bool Flush() {
+    if (!failed_ && !buffer_.empty() && file_ &&
+        std::fwrite(buffer_.data(), 1, buffer_.size(), file_) != buffer_.size()) {
+      failed_ = true;
+      error_ = errno;
+    }
+    buffer_.clear();
+    if (failed_)
+      errno = error_;
+    return !failed_;
+  }
+
+protected:
+  int_type overflow(int_type c) override {
+    if (!traits_type::eq_int_type(c, traits_type::eof())) {
+      char byte = traits_type::to_char_type(c);
+      xsputn(&byte, 1);
+    }
+    return traits_type::not_eof(c);
+  }
+  std::streamsize xsputn(const char* data, std::streamsize count) override {
+    const auto size = static_cast<std::size_t>(count);
+    if (buffer_.size() + size < kPiece) {
+      buffer_.append(data, size);
+      return count;
+    }
+    // A large piece goes to the file as it is, not through the buffer.
+    if (Flush() && file_ && std::fwrite(data, 1, size, file_) != size) {
+      failed_ = true;
+      error_ = errno;
+    }
+    return count;
+  }
+
+private:
+  static constexpr std::size_t kPiece = 256 * 1024; ///< Bytes passed on at a time.
+  std::FILE* file_;                                 ///< Destination.
+  std::string buffer_;                              ///< Bytes not yet written.
+  bool failed_ = false;                             ///< A write failed.
+  int error_ = 0;                                   ///< errno of the failed write.
+};
+
+/// True for the result template of a command that changes the host: a
+/// command whose result is a boolean is an action; every other command
+/// reports what it reads. The walk of the whole tree in the registration
+/// test keeps this true.
+bool IsAction(const MetaObj::MetaObjectPtr& shape) {
+  return shape && shape->GetType() == MetaObj::Boolean;
+}
+
+/// The element template of a result that is a list of structures: the rows
+/// of such a result can stream. Null for any other result.
+const MetaObj::MetaStruct* StreamedElement(const MetaObj::MetaObjectPtr& shape) {
+  if (!shape || shape->GetType() != MetaObj::List)
+    return nullptr;
+  const auto& list = static_cast<const MetaObj::MetaList&>(*shape);
+  const MetaObj::MetaObjectPtr& element = list.GetElementTemplate();
+  if (list.GetElementType() != MetaObj::Struct || !element || element->GetType() != MetaObj::Struct)
+    return nullptr;
+  return static_cast<const MetaObj::MetaStruct*>(element.get());
+}
+
 std::string ExecutableDirectory() {
   char buffer[PATH_MAX];
   ssize_t length = ::readlink("/proc/self/exe", buffer, sizeof buffer - 1);
@@ -143,11 +211,8 @@ void SelectHost(const std::string& path, bool isDefault) {
 }
 
 bool ChangesHost(AutoCli::CommandSpec& command) {
-  // A command whose result is a boolean is an action; every other command
-  // reports what it reads. The walk of the whole tree in the registration
-  // test keeps this true.
   std::shared_ptr<CallSpec::OutputSpec> spec = command.GetOutputSpec();
-  return spec && spec->GetRootObject() && spec->GetRootObject()->GetType() == MetaObj::Boolean;
+  return IsAction(spec ? spec->GetRootObject() : nullptr);
 }
 
 std::string ShortenEchoes(std::string text, const std::vector<std::string>& words) {
@@ -421,12 +486,35 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
       return ExitCommandError;
     }
   }
+  const std::shared_ptr<CallSpec::OutputSpec> outputSpec = command->GetOutputSpec();
+  const MetaObj::MetaObjectPtr shape = outputSpec ? outputSpec->GetRootObject() : nullptr;
   try {
-    HostCtl::Session::BeginCommand(ChangesHost(*command));
+    HostCtl::Session::BeginCommand(IsAction(shape));
   } catch (const HostCtl::Lib::HostCtlException& e) {
     err += (mode.inBatch ? "" : "ostracli: ") + std::string(e.what()) + "\n";
     return ExitCommandError;
   }
+
+  std::string formatterName = global.formatter;
+  if (formatterName.empty())
+    formatterName = command->GetDefaultOutputFormatter();
+  std::unique_ptr<Format::Formatter> formatter = Format::MakeFormatter(formatterName);
+  if (!formatter)
+    formatter = Format::MakeFormatter("simple");
+  Format::Parameters params;
+  if (!formatter->IsMachineFormat())
+    for (const auto& [key, value] : command->GetDefaultOutputParameters())
+      params.Set(key, value);
+  for (const auto& [key, value] : global.params)
+    params.Set(key, value);
+  // A listing is formatted row by row while it runs, and the rows are not
+  // kept (MetaObj::StreamRows): its memory stays flat in the number of rows.
+  std::unique_ptr<Format::ListWriter> stream;
+  if (const MetaObj::MetaStruct* element = StreamedElement(shape)) {
+    stream = formatter->StreamList(*element, params);
+    MetaObj::StreamRows(element, stream.get());
+  }
+
   auto output = CallSpec::Output::New();
   HostCtl::Session::ClearNotAvailable();
   try {
@@ -439,6 +527,22 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     output->AddErrorMessage(std::string("Internal error: ") + e.what());
   } catch (...) {
     output->AddErrorMessage("Internal error: unknown exception");
+  }
+  MetaObj::StreamRows(nullptr, nullptr);
+  // The rows of a streamed result are all formatted before the command's
+  // transaction ends.
+  const MetaObj::MetaObjectPtr& root = output->GetRootObject();
+  auto* streamed = root && root->GetType() == MetaObj::List &&
+                           static_cast<MetaObj::MetaList&>(*root).IsStreamed()
+                       ? static_cast<MetaObj::MetaList*>(root.get())
+                       : nullptr;
+  if (streamed) {
+    try {
+      streamed->Flush();
+    } catch (const std::exception& e) {
+      output->AddErrorMessage(std::string("Internal error: ") + e.what());
+      streamed = nullptr;
+    }
   }
   // The steps a command completed before the host refused a later one stay,
   // as each command's documented order promises; --atomic and a batch line
@@ -453,24 +557,36 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     return ExitCommandError;
   }
 
-  if (const MetaObj::MetaObjectPtr& root = output->GetRootObject()) {
-    std::string name = global.formatter;
-    if (name.empty())
-      name = command->GetDefaultOutputFormatter();
-    if (name.empty())
-      name = "simple";
-    std::unique_ptr<Format::Formatter> formatter = Format::MakeFormatter(name);
-    if (!formatter)
-      formatter = Format::MakeFormatter("simple");
-    Format::Parameters params;
-    if (!formatter->IsMachineFormat())
-      for (const auto& [key, value] : command->GetDefaultOutputParameters())
-        params.Set(key, value);
-    for (const auto& [key, value] : global.params)
-      params.Set(key, value);
+  int writeError = 0; // errno of a failed write of a streamed result.
+  if (root && (streamed || !(root->GetType() == MetaObj::List &&
+                             static_cast<MetaObj::MetaList&>(*root).IsStreamed()))) {
+    // A long result goes straight to the output file where there is one,
+    // after what the run wrote before it.
+    const bool direct = mode.direct && streamed;
+    FileBuffer file(mode.direct);
     AppendBuffer buffer(out);
-    std::ostream text(&buffer);
-    formatter->Write(text, root, params);
+    std::ostream text(direct ? static_cast<std::streambuf*>(&file) : &buffer);
+    if (direct && !WriteAll(mode.direct, out)) {
+      writeError = errno;
+      out.clear();
+      std::clearerr(mode.direct);
+    } else {
+      if (direct)
+        out.clear();
+      try {
+        if (streamed)
+          stream->Finish(text);
+        else
+          formatter->Write(text, root, params);
+      } catch (const std::exception& e) {
+        output->AddErrorMessage(std::string("Internal error: ") + e.what());
+      }
+      if (direct && (!file.Flush() || !WriteAll(mode.direct, ""))) {
+        writeError = errno;
+        // Reported here; the caller's last flush must not report it again.
+        std::clearerr(mode.direct);
+      }
+    }
   }
   // A command that failed because the host lacks an operation it needs is
   // reported as one line naming the command, not as the operation's failure.
@@ -481,6 +597,12 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
   else
     for (const std::string& message : output->GetErrorMessages())
       err += message + "\n";
+  if (writeError != 0) {
+    // The command's changes, if any, are committed: only its report is lost.
+    err =
+        "ostracli: cannot write the output: " + std::string(std::strerror(writeError)) + "\n" + err;
+    return ExitCommandError;
+  }
   return output->HasError() ? ExitCommandError : ExitOk;
 }
 
@@ -573,6 +695,7 @@ int RunHost(int argc, char** argv, std::unique_ptr<CommandTree>& tree) {
   }
   RunMode mode;
   mode.atomic = first >= 0 && global.atomic;
+  mode.direct = stdout;
   int status = RunCommandLine(*tree, args, out, err, mode);
   if (!WriteAll(stdout, out)) {
     // The command's changes, if any, are committed: only its report is lost.

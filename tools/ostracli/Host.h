@@ -73,6 +73,9 @@ int ParseGlobalOptions(const std::vector<std::string>& args, GlobalOptions& opti
 struct RunMode {
   bool inBatch = false; ///< A line of a batch: a savepoint of the batch's transaction.
   bool atomic = false;  ///< --atomic: a command that reports an error changes nothing.
+  /// Where a streamed listing is written as it is finished, instead of into
+  /// the output text; null for the text.
+  std::FILE* direct = nullptr;
 };
 
 /// Runs one command per line of \p file ("-" for standard input) with the

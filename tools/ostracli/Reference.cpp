@@ -84,10 +84,11 @@ void Structures(const MetaObj::MetaObjectPtr& value, std::vector<std::string>& s
       return;
   seen.push_back(structure.GetName());
   out += "\nStructure `" + structure.GetName() + "`:\n\n| field | type |\n|---|---|\n";
-  for (const auto& field : structure.GetFields())
-    out += "| " + Cell(field.name) + " | " + Describe(field.value) + " |\n";
-  for (const auto& field : structure.GetFields())
-    Structures(field.value, seen, out);
+  for (std::size_t i = 0; i < structure.GetFieldCount(); ++i)
+    out += "| " + Cell(structure.GetFieldName(i)) + " | " +
+           Describe(structure.GetFieldValue(i).ToObject()) + " |\n";
+  for (std::size_t i = 0; i < structure.GetFieldCount(); ++i)
+    Structures(structure.GetFieldValue(i).GetObject(), seen, out);
 }
 
 void Walk(const AutoCli::NamespaceNodePtr& node, std::string& out) {

@@ -9,16 +9,20 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cerrno>
+#include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <fcntl.h>
+#include <ostream>
+#include <stdexcept>
+#include <unistd.h>
 
 namespace Fabrik::Format {
 
-using MetaObj::MetaBool;
-using MetaObj::MetaInt;
 using MetaObj::MetaList;
-using MetaObj::MetaObject;
-using MetaObj::MetaObjectPtr;
-using MetaObj::MetaString;
 using MetaObj::MetaStruct;
+using MetaObj::MetaValue;
 
 namespace {
 
@@ -115,8 +119,8 @@ std::vector<std::string> SplitNames(const std::string& value) {
   return names;
 }
 
-std::vector<const MetaStruct::Field*>
-SelectFields(const MetaStruct& value, const Parameters& params, bool atRoot, Style style) {
+std::vector<std::size_t> SelectFields(const MetaStruct& value, const Parameters& params,
+                                      bool atRoot, Style style) {
   const std::string& name = value.GetName();
   const std::string fieldsKey = "fields:" + name;
   const std::string columnsKey = "table-columns:" + name;
@@ -141,44 +145,37 @@ SelectFields(const MetaStruct& value, const Parameters& params, bool atRoot, Sty
     }
   }
 
-  std::vector<const MetaStruct::Field*> fields;
+  std::vector<std::size_t> fields;
+  const std::size_t count = value.GetFieldCount();
   if (!list) {
-    for (const MetaStruct::Field& field : value.GetFields())
-      fields.push_back(&field);
+    for (std::size_t i = 0; i < count; ++i)
+      fields.push_back(i);
     return fields;
   }
   for (const std::string& wanted : SplitNames(*list)) {
-    for (const MetaStruct::Field& field : value.GetFields()) {
-      if (field.name == wanted) {
-        if (std::find(fields.begin(), fields.end(), &field) == fields.end())
-          fields.push_back(&field);
-        break;
-      }
-    }
+    const std::size_t index = value.GetLayout().Find(wanted);
+    if (index < count && std::find(fields.begin(), fields.end(), index) == fields.end())
+      fields.push_back(index);
   }
   return fields;
-}
-
-bool IsShown(const MetaObjectPtr& value) {
-  return value && value->IsSet();
 }
 
 bool IsPlainList(const MetaList& list) {
   if (list.GetElementType() == MetaObj::Struct)
     return false;
-  return std::all_of(list.GetItems().begin(), list.GetItems().end(), [](const MetaObjectPtr& item) {
-    return !item || (item->GetType() != MetaObj::Struct && item->GetType() != MetaObj::List);
+  return std::all_of(list.GetItems().begin(), list.GetItems().end(), [](const MetaValue& item) {
+    return item.IsNull() || (item.GetType() != MetaObj::Struct && item.GetType() != MetaObj::List);
   });
 }
 
-std::string ScalarText(const MetaObject& value) {
+std::string ScalarText(const MetaValue& value) {
   switch (value.GetType()) {
   case MetaObj::Boolean:
-    return static_cast<const MetaBool&>(value).GetValue() ? "true" : "false";
+    return value.GetBool() ? "true" : "false";
   case MetaObj::Integer:
-    return std::to_string(static_cast<const MetaInt&>(value).GetValue());
+    return std::to_string(value.GetInt());
   case MetaObj::String:
-    return static_cast<const MetaString&>(value).GetValue();
+    return value.GetString();
   case MetaObj::Struct:
   case MetaObj::List:
     break;
@@ -188,30 +185,30 @@ std::string ScalarText(const MetaObject& value) {
 
 namespace {
 
-std::string CompactTextAt(const MetaObjectPtr& value, const Parameters& params, bool nested) {
+std::string CompactTextAt(const MetaValue& value, const Parameters& params, bool nested) {
   if (!IsShown(value))
     return "";
-  switch (value->GetType()) {
+  switch (value.GetType()) {
   case MetaObj::Struct: {
-    const auto& structure = static_cast<const MetaStruct&>(*value);
+    const MetaStruct& structure = value.AsStruct();
     std::string text = "{";
     bool first = true;
-    for (const MetaStruct::Field* field :
-         SelectFields(structure, params, /*atRoot=*/false, Style::Table)) {
-      if (!IsShown(field->value))
+    for (std::size_t field : SelectFields(structure, params, /*atRoot=*/false, Style::Table)) {
+      if (!IsShown(structure.GetFieldValue(field)))
         continue;
       if (!first)
         text += ", ";
       first = false;
-      text += field->name + ": " + CompactTextAt(field->value, params, true);
+      text += structure.GetFieldName(field) + ": " +
+              CompactTextAt(structure.GetFieldValue(field), params, true);
     }
     return text + "}";
   }
   case MetaObj::List: {
-    const auto& list = static_cast<const MetaList&>(*value);
+    const MetaList& list = value.AsList();
     std::string text;
     bool first = true;
-    for (const MetaObjectPtr& item : list.GetItems()) {
+    for (const MetaValue& item : list.GetItems()) {
       if (!IsShown(item))
         continue;
       if (!first)
@@ -230,12 +227,12 @@ std::string CompactTextAt(const MetaObjectPtr& value, const Parameters& params, 
   case MetaObj::String:
     break;
   }
-  return ScalarText(*value);
+  return ScalarText(value);
 }
 
 } // namespace
 
-std::string CompactText(const MetaObjectPtr& value, const Parameters& params) {
+std::string CompactText(const MetaValue& value, const Parameters& params) {
   return CompactTextAt(value, params, false);
 }
 
@@ -253,7 +250,7 @@ std::optional<std::string> HeaderLine(const MetaStruct& value, const Parameters&
     if (close == std::string::npos)
       break;
     line.append(*header, pos, open - pos);
-    const MetaObjectPtr* field = value.GetField(header->substr(open + 1, close - open - 1));
+    const MetaValue* field = value.GetField(header->substr(open + 1, close - open - 1));
     if (field) {
       line += CompactText(*field, params);
       pos = close + 1;
@@ -290,9 +287,10 @@ bool BoolParameter(const Parameters& params, const std::string& key, bool fallba
 }
 
 std::size_t DisplayWidth(const std::string& text) {
-  return static_cast<std::size_t>(std::count_if(text.begin(), text.end(), [](char c) {
-    return (static_cast<unsigned char>(c) & 0xC0) != 0x80;
-  }));
+  std::size_t continuations = 0;
+  for (const char c : text)
+    continuations += (static_cast<unsigned char>(c) & 0xC0) == 0x80;
+  return text.size() - continuations;
 }
 
 std::size_t Utf8SequenceLength(const std::string& text, std::size_t pos) {
@@ -350,8 +348,20 @@ std::string ValidUtf8(const std::string& text) {
   return valid;
 }
 
+bool NeedsEscapes(const std::string& text) {
+  // C1 controls are encoded with the lead byte 0xC2.
+  return std::any_of(text.begin(), text.end(), [](char c) {
+    const auto byte = static_cast<unsigned char>(c);
+    return byte < 0x20 || byte == 0x7F || byte == 0xC2;
+  });
+}
+
 std::string EscapeControls(const std::string& text, Escapes which) {
   static const char* const kHex = "0123456789abcdef";
+  // Nearly every text is printable ASCII or UTF-8 without C1 controls: it
+  // stays as it is.
+  if (which == Escapes::Controls && !NeedsEscapes(text))
+    return text;
   std::string escaped;
   escaped.reserve(text.size());
   std::size_t pos = 0;
@@ -417,14 +427,167 @@ const char* TypeName(MetaObj::MetaType type) {
 }
 
 const std::string* ElementStructName(const MetaList& list) {
-  const MetaObjectPtr& element = list.GetElementTemplate();
+  const MetaObj::MetaObjectPtr& element = list.GetElementTemplate();
   if (element && element->GetType() == MetaObj::Struct)
     return &static_cast<const MetaStruct&>(*element).GetName();
-  for (const MetaObjectPtr& item : list.GetItems()) {
-    if (item && item->GetType() == MetaObj::Struct)
-      return &static_cast<const MetaStruct&>(*item).GetName();
+  for (const MetaValue& item : list.GetItems()) {
+    if (!item.IsNull() && item.GetType() == MetaObj::Struct)
+      return &item.AsStruct().GetName();
   }
   return nullptr;
+}
+
+// Spool
+
+namespace {
+
+/// Bytes written to or read from the file at a time.
+constexpr std::size_t SpoolChunk = 256 << 10;
+
+[[noreturn]] void SpoolFailure(const char* what) {
+  throw std::runtime_error(std::string("cannot ") + what +
+                           " the temporary file of the listing: " + std::strerror(errno));
+}
+
+void WriteFully(int fd, const char* data, std::size_t size) {
+  while (size > 0) {
+    ssize_t done = ::write(fd, data, size);
+    if (done < 0 && errno == EINTR)
+      continue;
+    if (done <= 0)
+      SpoolFailure("write");
+    data += done;
+    size -= static_cast<std::size_t>(done);
+  }
+}
+
+/// Reads up to \p size bytes at \p offset; 0 at the end.
+std::size_t ReadAt(int fd, char* data, std::size_t size, std::size_t offset) {
+  for (;;) {
+    ssize_t done = ::pread(fd, data, size, static_cast<off_t>(offset));
+    if (done < 0 && errno == EINTR)
+      continue;
+    if (done < 0)
+      SpoolFailure("read");
+    return static_cast<std::size_t>(done);
+  }
+}
+
+} // namespace
+
+Spool::~Spool() {
+  if (fd_ >= 0)
+    ::close(fd_);
+}
+
+void Spool::Spill() {
+  if (fd_ < 0) {
+    const char* dir = std::getenv("TMPDIR");
+    std::string directory = dir && *dir ? dir : "/tmp";
+    // An unnamed file where the system offers one; else a named one that is
+    // unlinked at once. Either way nothing is left behind.
+    fd_ = ::open(directory.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
+    if (fd_ < 0) {
+      std::string path = directory + "/ostracli-listing-XXXXXX";
+      fd_ = ::mkostemp(path.data(), O_CLOEXEC);
+      if (fd_ < 0)
+        SpoolFailure("create");
+      ::unlink(path.c_str());
+    }
+  }
+  WriteFully(fd_, memory_.data(), memory_.size());
+  inFile_ += memory_.size();
+  memory_.clear();
+}
+
+void Spool::Append(const char* data, std::size_t size) {
+  if (memory_.capacity() < Spool::SpoolMemory)
+    Reserve();
+  memory_.append(data, size);
+  Grown();
+}
+
+void Spool::AppendRecord(const std::string& text) {
+  const auto length = static_cast<std::uint32_t>(text.size());
+  char prefix[sizeof length];
+  std::memcpy(prefix, &length, sizeof length);
+  Append(prefix, sizeof prefix);
+  Append(text);
+}
+
+void Spool::CopyTo(std::ostream& out) {
+  if (fd_ >= 0) {
+    std::string chunk(SpoolChunk, '\0');
+    std::size_t offset = 0;
+    while (std::size_t got = ReadAt(fd_, chunk.data(), chunk.size(), offset)) {
+      out.write(chunk.data(), static_cast<std::streamsize>(got));
+      offset += got;
+    }
+  }
+  out.write(memory_.data(), static_cast<std::streamsize>(memory_.size()));
+}
+
+Spool::Reader::Reader(Spool& spool) : spool_(spool) {}
+
+bool Spool::Reader::Fill(std::size_t want) {
+  if (buffer_.size() - pos_ >= want)
+    return true;
+  buffer_.erase(0, pos_);
+  pos_ = 0;
+  std::string chunk;
+  while (buffer_.size() < want) {
+    const std::size_t inFile = spool_.inFile_;
+    if (offset_ < inFile) {
+      if (chunk.empty())
+        chunk.resize(std::max(want, SpoolChunk));
+      std::size_t got =
+          ReadAt(spool_.fd_, chunk.data(), std::min(chunk.size(), inFile - offset_), offset_);
+      if (got == 0)
+        return false;
+      buffer_.append(chunk.data(), got);
+      offset_ += got;
+      continue;
+    }
+    // The file is read: the rest is in memory.
+    const std::size_t start = offset_ - inFile;
+    if (start >= spool_.memory_.size())
+      return false;
+    buffer_.append(spool_.memory_, start, std::string::npos);
+    offset_ += spool_.memory_.size() - start;
+  }
+  return true;
+}
+
+bool Spool::Reader::Next(std::string& text) {
+  std::uint32_t length = 0;
+  if (!Fill(sizeof length))
+    return false;
+  std::memcpy(&length, buffer_.data() + pos_, sizeof length);
+  pos_ += sizeof length;
+  if (!Fill(length))
+    return false;
+  text.assign(buffer_, pos_, length);
+  pos_ += length;
+  return true;
+}
+
+// SpoolWriter
+
+void Spool::Reserve() {
+  // The whole of the memory at once: pages not written to are not used,
+  // and the text is never copied to grow.
+  memory_.reserve(Spool::SpoolMemory + SpoolChunk);
+}
+
+void Spool::Grown() {
+  if (memory_.size() >= (fd_ < 0 ? Spool::SpoolMemory : SpoolChunk))
+    Spill();
+}
+
+void SpoolWriter::Finish(std::ostream& out) {
+  End(spool_.Memory(), rows_);
+  spool_.Grown();
+  spool_.CopyTo(out);
 }
 
 } // namespace Detail

@@ -15,12 +15,10 @@
 
 namespace Fabrik::Format::Detail {
 
-using MetaObj::MetaBool;
-using MetaObj::MetaInt;
 using MetaObj::MetaList;
 using MetaObj::MetaObjectPtr;
-using MetaObj::MetaString;
 using MetaObj::MetaStruct;
+using MetaObj::MetaValue;
 
 namespace {
 
@@ -29,13 +27,36 @@ constexpr std::size_t IndentStep = 2;
 /// Bytes of text the writer keeps before passing them on to its sink.
 constexpr std::size_t FlushSize = 64 * 1024;
 
+/// The bytes that a JSON string holds as they are: printable ASCII but the
+/// quote and the backslash.
+struct PlainBytes {
+  bool plain[256] = {};
+  constexpr PlainBytes() {
+    for (int c = 0x20; c < 0x80; ++c)
+      plain[c] = c != '"' && c != '\\';
+  }
+};
+constexpr PlainBytes Plain;
+
 /// True for a byte that a JSON string holds as it is.
 inline bool IsPlain(unsigned char c) {
-  return c >= 0x20 && c < 0x80 && c != '"' && c != '\\';
+  return Plain.plain[c];
 }
 
 void WriteString(std::string& out, const std::string& text) {
   static const char Hex[] = "0123456789abcdef";
+  std::size_t plain = 0;
+  while (plain < text.size() && IsPlain(static_cast<unsigned char>(text[plain])))
+    ++plain;
+  if (plain == text.size()) {
+    // Nearly every text: copied whole, between its quotes.
+    const std::size_t at = out.size();
+    out.resize(at + text.size() + 2);
+    out[at] = '"';
+    text.copy(out.data() + at + 1, text.size());
+    out[at + text.size() + 1] = '"';
+    return;
+  }
   out += '"';
   std::size_t pos = 0;
   while (pos < text.size()) {
@@ -86,95 +107,32 @@ public:
   }
 
   /// Writes \p value; the caller has written the indent of its first line.
-  void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
+  void Value(const MetaValue& value, std::size_t indent, bool atRoot) {
     if (!IsShown(value)) {
       out_ += "null";
       return;
     }
-    switch (value->GetType()) {
+    switch (value.GetType()) {
     case MetaObj::Boolean:
-      out_ += static_cast<const MetaBool&>(*value).GetValue() ? "true" : "false";
+      out_ += value.GetBool() ? "true" : "false";
       return;
     case MetaObj::Integer: {
       char digits[24];
-      auto end = std::to_chars(digits, digits + sizeof digits,
-                               static_cast<const MetaInt&>(*value).GetValue())
-                     .ptr;
+      auto end = std::to_chars(digits, digits + sizeof digits, value.GetInt()).ptr;
       out_.append(digits, end);
       return;
     }
     case MetaObj::String:
-      WriteString(out_, static_cast<const MetaString&>(*value).GetValue());
+      WriteString(out_, value.GetString());
       return;
     case MetaObj::List:
-      Array(static_cast<const MetaList&>(*value), indent, atRoot);
+      Array(value.AsList(), indent, atRoot);
       return;
     case MetaObj::Struct:
-      Object(static_cast<const MetaStruct&>(*value), indent, atRoot);
+      Object(value.AsStruct(), indent, atRoot);
       return;
     }
     out_ += "null";
-  }
-
-private:
-  /// The fields chosen for structures of one name and layout; the rows of a
-  /// list share it, so the formatter parameters are read once per list.
-  struct Selection {
-    std::string name;                 ///< Structure name.
-    bool atRoot = false;              ///< Chosen for the root level.
-    std::vector<std::string> layout;  ///< Field names of the structure, in order.
-    std::vector<std::size_t> indices; ///< Indices of the chosen fields, in order.
-    /// What precedes each chosen field's value at indent prefixIndent: the
-    /// line break and indent (pretty) and the quoted name with its colon.
-    std::vector<std::string> prefixes;
-    std::size_t prefixIndent = std::string::npos; ///< Indent of prefixes.
-  };
-
-  static bool SameLayout(const Selection& selection, const MetaStruct& value) {
-    const std::vector<MetaStruct::Field>& fields = value.GetFields();
-    if (fields.size() != selection.layout.size())
-      return false;
-    for (std::size_t i = 0; i < fields.size(); ++i)
-      if (fields[i].name != selection.layout[i])
-        return false;
-    return true;
-  }
-
-  Selection& Select(const MetaStruct& value, bool atRoot) {
-    for (Selection& selection : selections_)
-      if (selection.atRoot == atRoot && selection.name == value.GetName() &&
-          SameLayout(selection, value))
-        return selection;
-    Selection selection;
-    selection.name = value.GetName();
-    selection.atRoot = atRoot;
-    const std::vector<MetaStruct::Field>& fields = value.GetFields();
-    for (const MetaStruct::Field& field : fields)
-      selection.layout.push_back(field.name);
-    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine))
-      selection.indices.push_back(static_cast<std::size_t>(field - fields.data()));
-    selections_.push_back(std::move(selection));
-    return selections_.back();
-  }
-
-  /// The prefixes of \p selection's fields for members at \p indent.
-  const std::vector<std::string>& Prefixes(Selection& selection, const MetaStruct& value,
-                                           std::size_t indent) {
-    if (selection.prefixIndent == indent)
-      return selection.prefixes;
-    selection.prefixes.clear();
-    for (std::size_t index : selection.indices) {
-      std::string prefix;
-      if (pretty_) {
-        prefix += '\n';
-        prefix.append(indent, ' ');
-      }
-      WriteString(prefix, value.GetFields()[index].name);
-      prefix += pretty_ ? ": " : ":";
-      selection.prefixes.push_back(std::move(prefix));
-    }
-    selection.prefixIndent = indent;
-    return selection.prefixes;
   }
 
   /// Starts the next item or member of a container at \p indent.
@@ -196,10 +154,79 @@ private:
     out_ += bracket;
   }
 
+  void Object(const MetaStruct& value, std::size_t indent, bool atRoot) {
+    out_ += '{';
+    bool first = true;
+    // Selections live in a deque: writing nested structures may add some
+    // without moving this one, but may change its prefixes (a structure of
+    // the same kind at another depth), so they are looked up per field.
+    Selection& selection = Select(value, atRoot);
+    for (std::size_t i = 0; i < selection.indices.size(); ++i) {
+      const MetaValue& field = value.GetFieldValue(selection.indices[i]);
+      if (!IsShown(field))
+        continue;
+      if (!first)
+        out_ += ',';
+      first = false;
+      out_ += Prefixes(selection, value, indent + IndentStep)[i];
+      Value(field, indent + IndentStep, false);
+    }
+    if (first)
+      out_ += '}';
+    else
+      Close('}', indent);
+  }
+
+private:
+  /// The fields chosen for structures of one layout; the rows of a list
+  /// share it, so the formatter parameters are read once per list.
+  struct Selection {
+    const MetaObj::MetaLayout* layout = nullptr; ///< Name and fields of the structures.
+    bool atRoot = false;                         ///< Chosen for the root level.
+    std::vector<std::size_t> indices;            ///< Indices of the chosen fields, in order.
+    /// What precedes each chosen field's value at indent prefixIndent: the
+    /// line break and indent (pretty) and the quoted name with its colon.
+    std::vector<std::string> prefixes;
+    std::size_t prefixIndent = std::string::npos; ///< Indent of prefixes.
+  };
+
+  Selection& Select(const MetaStruct& value, bool atRoot) {
+    const MetaObj::MetaLayout* layout = &value.GetLayout();
+    for (Selection& selection : selections_)
+      if (selection.layout == layout && selection.atRoot == atRoot)
+        return selection;
+    Selection selection;
+    selection.layout = layout;
+    selection.atRoot = atRoot;
+    selection.indices = SelectFields(value, params_, atRoot, Style::Machine);
+    selections_.push_back(std::move(selection));
+    return selections_.back();
+  }
+
+  /// The prefixes of \p selection's fields for members at \p indent.
+  const std::vector<std::string>& Prefixes(Selection& selection, const MetaStruct& value,
+                                           std::size_t indent) {
+    if (selection.prefixIndent == indent)
+      return selection.prefixes;
+    selection.prefixes.clear();
+    for (std::size_t index : selection.indices) {
+      std::string prefix;
+      if (pretty_) {
+        prefix += '\n';
+        prefix.append(indent, ' ');
+      }
+      WriteString(prefix, value.GetFieldName(index));
+      prefix += pretty_ ? ": " : ":";
+      selection.prefixes.push_back(std::move(prefix));
+    }
+    selection.prefixIndent = indent;
+    return selection.prefixes;
+  }
+
   void Array(const MetaList& list, std::size_t indent, bool atRoot) {
     out_ += '[';
     bool first = true;
-    for (const MetaObjectPtr& item : list.GetItems()) {
+    for (const MetaValue& item : list.GetItems()) {
       Separate(first, indent + IndentStep);
       first = false;
       Value(item, indent + IndentStep, atRoot);
@@ -212,34 +239,38 @@ private:
       Close(']', indent);
   }
 
-  void Object(const MetaStruct& value, std::size_t indent, bool atRoot) {
-    out_ += '{';
-    bool first = true;
-    // Selections live in a deque: writing nested structures may add some
-    // without moving this one, but may change its prefixes (a structure of
-    // the same kind at another depth), so they are looked up per field.
-    Selection& selection = Select(value, atRoot);
-    for (std::size_t i = 0; i < selection.indices.size(); ++i) {
-      const MetaStruct::Field& field = value.GetFields()[selection.indices[i]];
-      if (!IsShown(field.value))
-        continue;
-      if (!first)
-        out_ += ',';
-      first = false;
-      out_ += Prefixes(selection, value, indent + IndentStep)[i];
-      Value(field.value, indent + IndentStep, false);
-    }
-    if (first)
-      out_ += '}';
-    else
-      Close('}', indent);
-  }
-
   std::string& out_;                 ///< Destination.
   const Parameters& params_;         ///< Formatter parameters.
   bool pretty_;                      ///< One item or member per line, indented.
   std::ostream* sink_;               ///< Where Flush passes the text on, if anywhere.
   std::deque<Selection> selections_; ///< Fields chosen so far, by structure.
+};
+
+/// A list at the root, row by row: the same text as JsonWriter::Array.
+class JsonListWriter final : public SpoolWriter {
+public:
+  explicit JsonListWriter(const Parameters& params)
+      : params_(params), writer_(Text(), params_, /*pretty=*/true) {
+    Text() += '[';
+  }
+  void Row(const MetaStruct& row) override {
+    writer_.Separate(rows_ == 0, IndentStep);
+    writer_.Object(row, IndentStep, /*atRoot=*/true);
+    ++rows_;
+    Pass();
+  }
+
+private:
+  void End(std::string& text, std::size_t rows) override {
+    if (rows == 0)
+      text += ']';
+    else
+      writer_.Close(']', 0);
+    text += '\n';
+  }
+
+  Parameters params_; ///< Formatter parameters, kept for the writer.
+  JsonWriter writer_; ///< Writes into the text of SpoolWriter.
 };
 
 class JsonFormatter final : public Formatter {
@@ -250,16 +281,20 @@ public:
       return;
     std::string text;
     JsonWriter writer(text, params, /*pretty=*/true, &out);
-    writer.Value(root, 0, /*atRoot=*/true);
+    writer.Value(MetaValue(root), 0, /*atRoot=*/true);
     text += '\n';
     writer.Flush();
+  }
+  std::unique_ptr<ListWriter> StreamList(const MetaStruct& /*element*/,
+                                         const Parameters& params) const override {
+    return std::make_unique<JsonListWriter>(params);
   }
   bool IsMachineFormat() const override { return true; }
 };
 
 } // namespace
 
-std::string CompactJson(const MetaObjectPtr& value, const Parameters& params) {
+std::string CompactJson(const MetaValue& value, const Parameters& params) {
   std::string out;
   JsonWriter writer(out, params, /*pretty=*/false);
   writer.Value(value, 0, /*atRoot=*/false);

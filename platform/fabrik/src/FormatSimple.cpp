@@ -13,6 +13,7 @@ namespace Fabrik::Format::Detail {
 using MetaObj::MetaList;
 using MetaObj::MetaObjectPtr;
 using MetaObj::MetaStruct;
+using MetaObj::MetaValue;
 
 namespace {
 
@@ -24,19 +25,19 @@ class SimpleWriter {
 public:
   explicit SimpleWriter(const Parameters& params) : params_(params) {}
 
-  void Root(const MetaObjectPtr& root) {
+  void Root(const MetaValue& root) {
     if (!IsShown(root))
       return;
-    switch (root->GetType()) {
+    switch (root.GetType()) {
     case MetaObj::Struct:
-      Structure(static_cast<const MetaStruct&>(*root), 0, /*atRoot=*/true);
+      Structure(root.AsStruct(), 0, /*atRoot=*/true);
       break;
     case MetaObj::List: {
-      const auto& list = static_cast<const MetaList&>(*root);
+      const MetaList& list = root.AsList();
       if (IsPlainList(list)) {
-        for (const MetaObjectPtr& item : list.GetItems()) {
+        for (const MetaValue& item : list.GetItems()) {
           if (IsShown(item))
-            lines_.push_back(ScalarText(*item));
+            lines_.push_back(ScalarText(item));
         }
       } else {
         Blocks(list, 0, /*atRoot=*/true);
@@ -46,14 +47,11 @@ public:
     case MetaObj::Boolean:
     case MetaObj::Integer:
     case MetaObj::String:
-      lines_.push_back(ScalarText(*root));
+      lines_.push_back(ScalarText(root));
       break;
     }
   }
 
-  const std::vector<std::string>& Lines() const { return lines_; }
-
-private:
   /// The lines of one structure block at \p indent, header first.
   void Structure(const MetaStruct& value, std::size_t indent, bool atRoot) {
     if (std::optional<std::string> header = HeaderLine(value, params_)) {
@@ -61,38 +59,42 @@ private:
       indent += IndentStep;
     }
     const std::string pad(indent, ' ');
-    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Simple)) {
-      const MetaObjectPtr& item = field->value;
+    for (std::size_t field : SelectFields(value, params_, atRoot, Style::Simple)) {
+      const MetaValue& item = value.GetFieldValue(field);
+      const std::string& name = value.GetFieldName(field);
       if (!IsShown(item))
         continue;
-      if (item->GetType() == MetaObj::Struct) {
-        lines_.push_back(pad + field->name + ":");
-        Structure(static_cast<const MetaStruct&>(*item), indent + IndentStep, false);
+      if (item.GetType() == MetaObj::Struct) {
+        lines_.push_back(pad + name + ":");
+        Structure(item.AsStruct(), indent + IndentStep, false);
         continue;
       }
-      if (item->GetType() == MetaObj::List && !IsPlainList(static_cast<const MetaList&>(*item))) {
-        lines_.push_back(pad + field->name + ":");
-        Blocks(static_cast<const MetaList&>(*item), indent + IndentStep, false);
+      if (item.GetType() == MetaObj::List && !IsPlainList(item.AsList())) {
+        lines_.push_back(pad + name + ":");
+        Blocks(item.AsList(), indent + IndentStep, false);
         continue;
       }
-      std::string text = WithUnit(CompactText(item, params_), value, field->name, params_);
-      lines_.push_back(pad + field->name + ":" + (text.empty() ? "" : " " + text));
+      std::string text = WithUnit(CompactText(item, params_), value, name, params_);
+      lines_.push_back(pad + name + ":" + (text.empty() ? "" : " " + text));
     }
   }
 
+  std::vector<std::string>& Lines() { return lines_; }
+
+private:
   /// The elements of a list of structures, one block each, with one blank
   /// line between blocks that have any lines.
   void Blocks(const MetaList& list, std::size_t indent, bool atRoot) {
     bool any = false;
-    for (const MetaObjectPtr& item : list.GetItems()) {
+    for (const MetaValue& item : list.GetItems()) {
       if (!IsShown(item))
         continue;
       const std::size_t start = lines_.size();
       if (any)
         lines_.emplace_back();
       const std::size_t first = lines_.size();
-      if (item->GetType() == MetaObj::Struct)
-        Structure(static_cast<const MetaStruct&>(*item), indent, atRoot);
+      if (item.GetType() == MetaObj::Struct)
+        Structure(item.AsStruct(), indent, atRoot);
       else
         lines_.push_back(std::string(indent, ' ') + CompactText(item, params_));
       if (lines_.size() == first)
@@ -106,23 +108,64 @@ private:
   std::vector<std::string> lines_; ///< Output lines, without line breaks.
 };
 
+/// Appends \p lines to \p text, each escaped and ended by a line break. The
+/// layout itself holds no control characters: any a line holds come from
+/// stored text, which must neither forge lines nor reach the terminal.
+void AppendLines(std::string& text, const std::vector<std::string>& lines) {
+  for (const std::string& line : lines) {
+    text += EscapeControls(line);
+    text += '\n';
+  }
+}
+
+/// A list of structures at the root, block by block, as SimpleWriter::Blocks
+/// writes it.
+class SimpleListWriter final : public SpoolWriter {
+public:
+  explicit SimpleListWriter(const Parameters& params) : params_(params), writer_(params_) {}
+  void Row(const MetaStruct& row) override {
+    std::vector<std::string>& lines = writer_.Lines();
+    lines.clear();
+    writer_.Structure(row, 0, /*atRoot=*/true);
+    if (lines.empty())
+      return;
+    if (rows_++ > 0)
+      Text() += '\n';
+    AppendLines(Text(), lines);
+    Pass();
+  }
+
+private:
+  void End(std::string& /*text*/, std::size_t /*rows*/) override {}
+
+  Parameters params_;   ///< Formatter parameters, kept for the writer.
+  SimpleWriter writer_; ///< Makes the lines of a block.
+};
+
 class SimpleFormatter final : public Formatter {
 public:
   void Write(std::ostream& out, const MetaObjectPtr& root,
              const Parameters& params) const override {
-    WriteSimple(out, root, params);
+    WriteSimple(out, MetaValue(root), params);
+  }
+  std::unique_ptr<ListWriter> StreamList(const MetaStruct& /*element*/,
+                                         const Parameters& params) const override {
+    return MakeSimpleListWriter(params);
   }
 };
 
 } // namespace
 
-void WriteSimple(std::ostream& out, const MetaObjectPtr& root, const Parameters& params) {
+void WriteSimple(std::ostream& out, const MetaValue& root, const Parameters& params) {
   SimpleWriter writer(params);
   writer.Root(root);
-  // The layout itself holds no control characters: any a line holds come
-  // from stored text, which must neither forge lines nor reach the terminal.
-  for (const std::string& line : writer.Lines())
-    out << EscapeControls(line) << '\n';
+  std::string text;
+  AppendLines(text, writer.Lines());
+  out << text;
+}
+
+std::unique_ptr<ListWriter> MakeSimpleListWriter(const Parameters& params) {
+  return std::make_unique<SimpleListWriter>(params);
 }
 
 std::unique_ptr<Formatter> MakeSimpleFormatter() {

@@ -13,6 +13,7 @@ namespace Fabrik::Format::Detail {
 using MetaObj::MetaList;
 using MetaObj::MetaObjectPtr;
 using MetaObj::MetaStruct;
+using MetaObj::MetaValue;
 
 namespace {
 
@@ -129,33 +130,84 @@ std::string Backslashed(const std::string& text) {
 }
 
 /// True for a boolean, integer or string, which is written on one line.
-bool IsScalar(const MetaObjectPtr& value) {
-  const MetaObj::MetaType type = value->GetType();
+bool IsScalar(const MetaValue& value) {
+  const MetaObj::MetaType type = value.GetType();
   return type != MetaObj::Struct && type != MetaObj::List;
 }
 
 /// Writes the elements of a result, one per line, indented by level.
 class XmlWriter {
 public:
-  XmlWriter(std::ostream& out, const Parameters& params) : out_(out), params_(params) {}
+  XmlWriter(std::string& out, const Parameters& params) : out_(out), params_(params) {}
 
   /// Writes the element of a shown \p value on lines of its own at \p indent.
-  void Value(const MetaObjectPtr& value, std::size_t indent, bool atRoot) {
-    const std::string pad(indent, ' ');
-    switch (value->GetType()) {
+  void Value(const MetaValue& value, std::size_t indent, bool atRoot) {
+    switch (value.GetType()) {
     case MetaObj::Boolean:
     case MetaObj::Integer:
     case MetaObj::String:
-      out_ << pad;
-      Scalar(*value);
-      out_ << '\n';
+      out_.append(indent, ' ');
+      Scalar(value);
+      out_ += '\n';
       return;
     case MetaObj::List:
-      List(static_cast<const MetaList&>(*value), indent, atRoot);
+      List(value.AsList(), indent, atRoot);
       return;
     case MetaObj::Struct:
-      Structure(static_cast<const MetaStruct&>(*value), indent, atRoot);
+      Structure(value.AsStruct(), indent, atRoot);
       return;
+    }
+  }
+
+  /// Opens a list element of \p type at \p indent, without ending its tag.
+  void OpenList(MetaObj::MetaType type, std::size_t indent) {
+    out_.append(indent, ' ');
+    out_ += "<list type=\"";
+    out_ += TypeName(type);
+    out_ += '"';
+  }
+
+  /// Ends a list element opened at \p indent that holds \p items.
+  void CloseList(std::size_t indent, bool empty) {
+    if (empty) {
+      out_ += "/>\n";
+      return;
+    }
+    out_.append(indent, ' ');
+    out_ += "</list>\n";
+  }
+
+  void Structure(const MetaStruct& value, std::size_t indent, bool atRoot) {
+    out_.append(indent, ' ');
+    out_ += "<structure typeName=\"";
+    out_ += Escape(value.GetName());
+    out_ += '"';
+    bool first = true;
+    for (std::size_t field : SelectFields(value, params_, atRoot, Style::Machine)) {
+      const MetaValue& item = value.GetFieldValue(field);
+      if (!IsShown(item))
+        continue;
+      if (first)
+        out_ += ">\n";
+      first = false;
+      out_.append(indent + IndentStep, ' ');
+      out_ += "<field name=\"";
+      out_ += Escape(value.GetFieldName(field));
+      out_ += "\">";
+      if (IsScalar(item)) {
+        Scalar(item);
+      } else {
+        out_ += '\n';
+        Value(item, indent + 2 * IndentStep, false);
+        out_.append(indent + IndentStep, ' ');
+      }
+      out_ += "</field>\n";
+    }
+    if (first) {
+      out_ += "/>\n";
+    } else {
+      out_.append(indent, ' ');
+      out_ += "</structure>\n";
     }
   }
 
@@ -163,63 +215,67 @@ private:
   /// Writes <boolean>, <integer> or <string> with its text, on the current line.
   /// A string XML cannot carry as it stands is written with backslash
   /// escapes and marked escaped="backslash".
-  void Scalar(const MetaObj::MetaObject& value) {
+  void Scalar(const MetaValue& value) {
     const char* name = TypeName(value.GetType());
     std::string text = ScalarText(value);
-    if (NeedsBackslashes(text))
-      out_ << '<' << name << " escaped=\"backslash\">" << Escape(Backslashed(text));
-    else
-      out_ << '<' << name << '>' << Escape(text);
-    out_ << "</" << name << '>';
+    out_ += '<';
+    out_ += name;
+    if (NeedsBackslashes(text)) {
+      out_ += " escaped=\"backslash\">";
+      out_ += Escape(Backslashed(text));
+    } else {
+      out_ += '>';
+      out_ += Escape(text);
+    }
+    out_ += "</";
+    out_ += name;
+    out_ += '>';
   }
 
   void List(const MetaList& list, std::size_t indent, bool atRoot) {
-    const std::string pad(indent, ' ');
-    out_ << pad << "<list type=\"" << TypeName(list.GetElementType()) << '"';
+    OpenList(list.GetElementType(), indent);
     bool first = true;
-    for (const MetaObjectPtr& item : list.GetItems()) {
+    for (const MetaValue& item : list.GetItems()) {
       if (!IsShown(item))
         continue;
       if (first)
-        out_ << ">\n";
+        out_ += ">\n";
       first = false;
       Value(item, indent + IndentStep, atRoot);
     }
-    if (first)
-      out_ << "/>\n";
-    else
-      out_ << pad << "</list>\n";
+    CloseList(indent, first);
   }
 
-  void Structure(const MetaStruct& value, std::size_t indent, bool atRoot) {
-    const std::string pad(indent, ' ');
-    const std::string inner(indent + IndentStep, ' ');
-    out_ << pad << "<structure typeName=\"" << Escape(value.GetName()) << '"';
-    bool first = true;
-    for (const MetaStruct::Field* field : SelectFields(value, params_, atRoot, Style::Machine)) {
-      if (!IsShown(field->value))
-        continue;
-      if (first)
-        out_ << ">\n";
-      first = false;
-      out_ << inner << "<field name=\"" << Escape(field->name) << "\">";
-      if (IsScalar(field->value)) {
-        Scalar(*field->value);
-      } else {
-        out_ << '\n';
-        Value(field->value, indent + 2 * IndentStep, false);
-        out_ << inner;
-      }
-      out_ << "</field>\n";
-    }
-    if (first)
-      out_ << "/>\n";
-    else
-      out_ << pad << "</structure>\n";
-  }
-
-  std::ostream& out_;        ///< Destination.
+  std::string& out_;         ///< Destination.
   const Parameters& params_; ///< Formatter parameters.
+};
+
+constexpr const char* Declaration = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
+
+/// A list of structures at the root, structure by structure, as
+/// XmlWriter::List writes it inside <output>.
+class XmlListWriter final : public SpoolWriter {
+public:
+  explicit XmlListWriter(const Parameters& params) : params_(params), writer_(Text(), params_) {
+    Text() += Declaration;
+    Text() += "<output>\n";
+    writer_.OpenList(MetaObj::Struct, IndentStep);
+  }
+  void Row(const MetaStruct& row) override {
+    if (rows_++ == 0)
+      Text() += ">\n";
+    writer_.Structure(row, 2 * IndentStep, /*atRoot=*/true);
+    Pass();
+  }
+
+private:
+  void End(std::string& text, std::size_t rows) override {
+    writer_.CloseList(IndentStep, rows == 0);
+    text += "</output>\n";
+  }
+
+  Parameters params_; ///< Formatter parameters, kept for the writer.
+  XmlWriter writer_;  ///< Writes into the text of SpoolWriter.
 };
 
 class XmlFormatter final : public Formatter {
@@ -228,14 +284,20 @@ public:
              const Parameters& params) const override {
     if (!root)
       return;
-    out << "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n";
-    if (!IsShown(root)) {
-      out << "<output/>\n";
+    std::string text = Declaration;
+    const MetaValue value(root);
+    if (!IsShown(value)) {
+      out << text << "<output/>\n";
       return;
     }
-    out << "<output>\n";
-    XmlWriter(out, params).Value(root, IndentStep, /*atRoot=*/true);
-    out << "</output>\n";
+    text += "<output>\n";
+    XmlWriter(text, params).Value(value, IndentStep, /*atRoot=*/true);
+    text += "</output>\n";
+    out << text;
+  }
+  std::unique_ptr<ListWriter> StreamList(const MetaStruct& /*element*/,
+                                         const Parameters& params) const override {
+    return std::make_unique<XmlListWriter>(params);
   }
   bool IsMachineFormat() const override { return true; }
 };

@@ -258,6 +258,17 @@ private:
   std::vector<std::pair<std::string, std::string>> pairs_; ///< In order of first Set.
 };
 
+/// Formats the rows of a list at the root as the command adds them
+/// (MetaObj::StreamRows) and keeps the text aside, in memory up to a few MiB
+/// and then in a temporary file, until the command has ended: only then is
+/// it known whether the list is the result. The text is the same as Write
+/// gives for the whole list.
+class ListWriter : public MetaObj::RowSink {
+public:
+  /// Writes the result, the list with every row handed over, to \p out.
+  virtual void Finish(std::ostream& out) = 0;
+};
+
 /// Turns a result into text.
 class Formatter {
 public:
@@ -265,6 +276,10 @@ public:
   /// Writes \p root (which may be null: nothing is written) to \p out.
   virtual void Write(std::ostream& out, const MetaObj::MetaObjectPtr& root,
                      const Parameters& params) const = 0;
+  /// A writer for a list at the root whose elements are structures made
+  /// from \p element.
+  virtual std::unique_ptr<ListWriter> StreamList(const MetaObj::MetaStruct& element,
+                                                 const Parameters& params) const = 0;
   /// True for formats meant for programs rather than people ("json", "xml",
   /// "csv", "keyvalue"); the command host passes them only the parameters
   /// the user gave.
