@@ -244,24 +244,39 @@ void ExportCore(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   Statement rows = store.Prepare(
       "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, speed, "
       "duplex, mac, mtu, dpu_id FROM pnic ORDER BY ord");
+  enum {
+    kName,
+    kPciAddress,
+    kVendor,
+    kDevice,
+    kPseudoDesc,
+    kDriver,
+    kAdminUp,
+    kLinkUp,
+    kSpeed,
+    kDuplex,
+    kMac,
+    kMtu,
+    kDpuId
+  };
   while (rows.Step()) {
     ordered_json nic = ordered_json::object();
-    nic["name"] = rows.Text(0);
-    if (!rows.IsNull(1))
-      nic["pciAddress"] = rows.Text(1);
-    nic["vendor"] = rows.Text(2);
-    nic["device"] = rows.Text(3);
-    if (!rows.Text(4).empty())
-      nic["pseudoDevice"] = rows.Text(4);
-    nic["driver"] = rows.Text(5);
-    nic["adminUp"] = rows.Bool(6);
-    nic["linkUp"] = rows.Bool(7);
-    nic["speed"] = rows.Int(8);
-    nic["duplex"] = rows.Int(9);
-    nic["mac"] = rows.Text(10);
-    nic["mtu"] = rows.Int(11);
-    if (!rows.IsNull(12))
-      nic["dpuId"] = rows.Text(12);
+    nic["name"] = rows.Text(kName);
+    if (!rows.IsNull(kPciAddress))
+      nic["pciAddress"] = rows.Text(kPciAddress);
+    nic["vendor"] = rows.Text(kVendor);
+    nic["device"] = rows.Text(kDevice);
+    if (!rows.Text(kPseudoDesc).empty())
+      nic["pseudoDevice"] = rows.Text(kPseudoDesc);
+    nic["driver"] = rows.Text(kDriver);
+    nic["adminUp"] = rows.Bool(kAdminUp);
+    nic["linkUp"] = rows.Bool(kLinkUp);
+    nic["speed"] = rows.Int(kSpeed);
+    nic["duplex"] = rows.Int(kDuplex);
+    nic["mac"] = rows.Text(kMac);
+    nic["mtu"] = rows.Int(kMtu);
+    if (!rows.IsNull(kDpuId))
+      nic["dpuId"] = rows.Text(kDpuId);
     nics.push_back(std::move(nic));
   }
   host["nics"] = std::move(nics);
@@ -285,17 +300,19 @@ const Part kCorePart = {
 };
 
 int64_t AllocatePortId(Store& store) {
-  Statement next = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 FROM port");
+  Statement next = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 AS next_id FROM port");
+  enum { kNextId };
   next.Step();
-  return next.Int(0);
+  return next.Int(kNextId);
 }
 
 std::optional<std::string> GetSetting(Store& store, std::string_view key) {
   Statement get = store.Prepare("SELECT value FROM setting WHERE key = ?");
+  enum { kValue };
   get.Bind(1, key);
   if (!get.Step())
     return std::nullopt;
-  return get.Text(0);
+  return get.Text(kValue);
 }
 
 void PutSetting(Store& store, std::string_view key, std::string_view value) {

@@ -85,10 +85,11 @@ void ImportEns(const JsonObject& root, Store& store) {
     if (lcore.Has("switch")) {
       std::string name = lcore.String("switch");
       Statement portset = store.Prepare("SELECT id FROM portset WHERE name = ?");
+      enum { kId };
       portset.Bind(1, name);
       if (!portset.Step())
         lcore.Fail("switch", "there is no switch named \"" + name + "\"");
-      insert.Bind(2, portset.Int(0));
+      insert.Bind(2, portset.Int(kId));
     }
     insert.Run();
   }
@@ -104,11 +105,12 @@ void ExportEns(ordered_json& host, Store& store) {
   ordered_json lcores = ordered_json::array();
   Statement rows = store.Prepare("SELECT l.id, p.name, l.affinity FROM ens_lcore l "
                                  "LEFT JOIN portset p ON p.id = l.portset_id ORDER BY l.id");
+  enum { kId, kName, kAffinity };
   while (rows.Step()) {
-    ordered_json lcore = {{"id", rows.Int(0)}};
-    if (!rows.IsNull(1))
-      lcore["switch"] = rows.Text(1);
-    lcore["affinity"] = rows.Int(2);
+    ordered_json lcore = {{"id", rows.Int(kId)}};
+    if (!rows.IsNull(kName))
+      lcore["switch"] = rows.Text(kName);
+    lcore["affinity"] = rows.Int(kAffinity);
     lcores.push_back(std::move(lcore));
   }
   ens["lcores"] = std::move(lcores);
@@ -158,27 +160,30 @@ PortPlace PlacePort(const JsonObject& port, Store& store) {
   PortPlace place;
   std::string name = port.String("switch");
   Statement portset = store.Prepare("SELECT id, kind FROM portset WHERE name = ?");
+  enum { kId, kKind };
   portset.Bind(1, name);
   if (!portset.Step())
     port.Fail("switch", "there is no switch named \"" + name + "\"");
-  place.portsetId = portset.Int(0);
-  if (portset.Text(1) == "standard") {
+  place.portsetId = portset.Int(kId);
+  if (portset.Text(kKind) == "standard") {
     std::string group = port.String("portgroup");
     Statement pg = store.Prepare("SELECT id FROM portgroup WHERE name = ? AND portset_id = ?");
+    enum { kPgId };
     pg.BindAll(group, place.portsetId);
     if (!pg.Step())
       port.Fail("portgroup", "switch \"" + name + "\" has no port group \"" + group + "\"");
-    place.pg = pg.Int(0);
+    place.pg = pg.Int(kPgId);
     if (port.Has("dvport"))
       port.Fail("dvport", "a port on a standard switch has no distributed port");
   } else {
     std::string key = port.String("dvport");
     Statement dv =
         store.Prepare("SELECT is_uplink FROM dvport WHERE portset_id = ? AND port_key = ?");
+    enum { kIsUplink };
     dv.BindAll(place.portsetId, key);
     if (!dv.Step())
       port.Fail("dvport", "switch \"" + name + "\" has no distributed port \"" + key + "\"");
-    if (dv.Bool(0))
+    if (dv.Bool(kIsUplink))
       port.Fail("dvport", "distributed port \"" + key + "\" is an uplink port");
     Statement used = store.Prepare("SELECT 1 FROM port WHERE portset_id = ? AND dvport_key = ?");
     used.BindAll(place.portsetId, key);
@@ -286,27 +291,37 @@ void ImportVms(const JsonObject& root, Store& store) {
   }
 }
 
+/// The ports of one VM, in the columns ExportPort reads.
+constexpr const char* kVmPortsSql =
+    "SELECT p.id, s.name, g.name, p.dvport_key, p.port_type FROM port p "
+    "JOIN portset s ON s.id = p.portset_id LEFT JOIN portgroup g ON g.id = p.portgroup_id "
+    "WHERE p.world_id = ? AND p.client_kind = 'vm' ORDER BY p.id";
+enum VmPortColumn { kPortId, kPortSwitch, kPortGroup, kPortDvport, kPortType };
+
+/// One row of kVmPortsSql as the host description holds it.
 ordered_json ExportPort(Store& store, const Statement& port) {
-  int64_t id = port.Int(0);
-  ordered_json out = {{"id", id}, {"switch", port.Text(1)}};
-  if (!port.IsNull(2))
-    out["portgroup"] = port.Text(2);
-  if (!port.IsNull(3))
-    out["dvport"] = port.Text(3);
-  out["type"] = port.Int(4);
+  int64_t id = port.Int(kPortId);
+  ordered_json out = {{"id", id}, {"switch", port.Text(kPortSwitch)}};
+  if (!port.IsNull(kPortGroup))
+    out["portgroup"] = port.Text(kPortGroup);
+  if (!port.IsNull(kPortDvport))
+    out["dvport"] = port.Text(kPortDvport);
+  out["type"] = port.Int(kPortType);
   ordered_json macs = ordered_json::array();
   Statement mac = store.Prepare("SELECT mac FROM vm_port_mac WHERE port_id = ? ORDER BY ord");
+  enum { kMac };
   mac.Bind(1, id);
   while (mac.Step())
-    macs.push_back(mac.Text(0));
+    macs.push_back(mac.Text(kMac));
   out["macs"] = std::move(macs);
   Statement vmPort =
       store.Prepare("SELECT ipv4, team_uplink FROM port WHERE id = ? AND ipv4 IS NOT NULL");
+  enum { kIpv4, kTeamUplink };
   vmPort.Bind(1, id);
   if (vmPort.Step()) {
     out["ipv4"] =
-        HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(0))).GetStringAddress();
-    out["teamUplink"] = vmPort.Text(1);
+        HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(kIpv4))).GetStringAddress();
+    out["teamUplink"] = vmPort.Text(kTeamUplink);
   }
   Statement counters = store.Prepare(
       "SELECT rx_bytes, tx_bytes, rx_packets, rx_multicast, rx_broadcast, tx_packets, "
@@ -321,9 +336,11 @@ ordered_json ExportPort(Store& store, const Statement& port) {
     out["stats"] = std::move(stats);
   }
   Statement filter = store.Prepare("SELECT filters FROM port WHERE id = ?");
+  enum { kFilters };
   filter.Bind(1, id);
-  ordered_json filters = filter.Step() && !filter.IsNull(0) ? ordered_json::parse(filter.Text(0))
-                                                            : ordered_json::array();
+  ordered_json filters = filter.Step() && !filter.IsNull(kFilters)
+                             ? ordered_json::parse(filter.Text(kFilters))
+                             : ordered_json::array();
   out["filters"] = std::move(filters);
   return out;
 }
@@ -331,17 +348,15 @@ ordered_json ExportPort(Store& store, const Statement& port) {
 void ExportVms(ordered_json& host, Store& store) {
   ordered_json vms = ordered_json::array();
   Statement world = store.Prepare("SELECT id, name FROM world ORDER BY id");
+  enum { kId, kName };
   while (world.Step()) {
-    int64_t worldId = world.Int(0);
+    int64_t worldId = world.Int(kId);
     ordered_json ports = ordered_json::array();
-    Statement port = store.Prepare(
-        "SELECT p.id, s.name, g.name, p.dvport_key, p.port_type FROM port p "
-        "JOIN portset s ON s.id = p.portset_id LEFT JOIN portgroup g ON g.id = p.portgroup_id "
-        "WHERE p.world_id = ? AND p.client_kind = 'vm' ORDER BY p.id");
+    Statement port = store.Prepare(kVmPortsSql);
     port.Bind(1, worldId);
     while (port.Step())
       ports.push_back(ExportPort(store, port));
-    vms.push_back({{"worldId", worldId}, {"name", world.Text(1)}, {"ports", std::move(ports)}});
+    vms.push_back({{"worldId", worldId}, {"name", world.Text(kName)}, {"ports", std::move(ports)}});
   }
   if (!vms.empty())
     host["vms"] = std::move(vms);

@@ -91,21 +91,23 @@ struct Switch {
 std::vector<Switch> StandardSwitches(Store& store) {
   std::vector<Switch> switches;
   Statement rows = store.Prepare(
-      "SELECT id, name, num_ports, (SELECT count(*) FROM port WHERE portset_id = p.id) "
+      "SELECT id, name, num_ports, (SELECT count(*) FROM port WHERE portset_id = p.id) AS used "
       "FROM portset p WHERE kind = 'standard' AND system = 0 ORDER BY ord");
+  enum { kId, kName, kNumPorts, kUsed };
   while (rows.Step()) {
     Switch s;
-    s.id = rows.Int(0);
-    s.name = rows.Text(1);
-    s.numPorts = rows.Int(2);
-    s.usedPorts = rows.Int(3);
+    s.id = rows.Int(kId);
+    s.name = rows.Text(kName);
+    s.numPorts = rows.Int(kNumPorts);
+    s.usedPorts = rows.Int(kUsed);
     switches.push_back(std::move(s));
   }
   for (Switch& s : switches) {
     Statement uplinks = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+    enum { kNic };
     uplinks.Bind(1, s.id);
     while (uplinks.Step())
-      s.uplinks.push_back(uplinks.Text(0));
+      s.uplinks.push_back(uplinks.Text(kNic));
   }
   return switches;
 }
@@ -150,9 +152,10 @@ void GeneratePortGroups(Store& store, int64_t count, std::vector<Switch>& switch
     return;
   Require(!switches.empty(), "The host has no standard switch for the port groups");
   std::vector<PolicyVariant> variants = PolicyVariants();
-  Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM portgroup");
+  Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 AS next_ord FROM portgroup");
+  enum { kNextOrd };
   ord.Step();
-  int64_t nextOrd = ord.Int(0);
+  int64_t nextOrd = ord.Int(kNextOrd);
   Statement insert = store.Prepare(
       "INSERT INTO portgroup(name, portset_id, vlan_id, system, ord) VALUES(?, ?, ?, 0, ?)");
   Statement policy = store.Prepare(
@@ -185,9 +188,10 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     if (s.portgroups.empty()) {
       Statement groups = store.Prepare(
           "SELECT id FROM portgroup WHERE portset_id = ? AND system = 0 ORDER BY ord");
+      enum { kId };
       groups.Bind(1, s.id);
       while (groups.Step())
-        s.portgroups.push_back(groups.Int(0));
+        s.portgroups.push_back(groups.Int(kId));
     }
     Require(!s.portgroups.empty() || s.vmPorts == 0,
             "Switch " + s.name + " has no port group for the VM ports");
@@ -200,9 +204,11 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     total += needed;
   }
   Statement others = store.Prepare(
-      "SELECT coalesce(sum(num_ports), 0) FROM portset WHERE kind = 'standard' AND system = 1");
+      "SELECT coalesce(sum(num_ports), 0) AS ports FROM portset WHERE kind = 'standard' AND "
+      "system = 1");
+  enum { kPorts };
   others.Step();
-  total += others.Int(0);
+  total += others.Int(kPorts);
   Require(total <= HostCtl::Network::VirtualSwitch::MAX_HOST_PORTS,
           std::to_string(vms * portsPerVm) +
               " VM ports do not fit: the standard switches would need " + std::to_string(total) +
@@ -215,9 +221,10 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     grow.Reset();
   }
 
-  Statement firstId = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 FROM port");
+  Statement firstId = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 AS next_id FROM port");
+  enum { kNextId };
   firstId.Step();
-  int64_t portId = firstId.Int(0);
+  int64_t portId = firstId.Int(kNextId);
   Statement world = store.Prepare("INSERT INTO world(id, name) VALUES(?, ?)");
   Statement port = store.Prepare(
       "INSERT INTO port(id, portset_id, portgroup_id, dvport_key, client_kind, client, world_id, "

@@ -121,8 +121,9 @@ void ReplaceHost(Store& store, const ordered_json& host, Streamed&& streamed) {
     {
       Statement list = store.Prepare(
           "SELECT name FROM sqlite_master WHERE type='table' AND name NOT LIKE 'sqlite_%'");
+      enum { kName };
       while (list.Step())
-        tables.push_back(list.Text(0));
+        tables.push_back(list.Text(kName));
     }
     for (const std::string& table : tables)
       store.Exec(("DELETE FROM \"" + table + "\"").c_str());

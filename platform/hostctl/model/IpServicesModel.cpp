@@ -38,11 +38,13 @@ std::string Destination(const Ipv6Network& network) {
 bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv4Network& network) {
   Statement rows = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = "
                                  "? AND enabled = 1 AND ipv4_address <> '0.0.0.0'");
+  enum { kIpv4Address, kIpv4Netmask };
   rows.Bind(1, netstack);
   while (rows.Step()) {
     uint32_t address = 0;
     uint32_t mask = 0;
-    if (!Ipv4Address::Parse(rows.Text(0), address) || !Ipv4Address::Parse(rows.Text(1), mask))
+    if (!Ipv4Address::Parse(rows.Text(kIpv4Address), address) ||
+        !Ipv4Address::Parse(rows.Text(kIpv4Netmask), mask))
       continue;
     if (Ipv4Network(Ipv4Address(address & mask), Ipv4Address(mask)) == network)
       return true;
@@ -54,12 +56,13 @@ bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv6Net
   Statement rows =
       store.Prepare("SELECT a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = "
                     "a.nic WHERE t.netstack = ? AND t.enabled = 1 AND a.status <> 3");
+  enum { kAddress, kPrefix };
   rows.Bind(1, netstack);
   while (rows.Step()) {
     std::array<uint8_t, 16> bytes{};
-    if (!Ipv6Address::Parse(rows.Text(0), bytes))
+    if (!Ipv6Address::Parse(rows.Text(kAddress), bytes))
       continue;
-    int prefix = static_cast<int>(rows.Int(1));
+    int prefix = static_cast<int>(rows.Int(kPrefix));
     const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
     for (int i = 0; i < 16; ++i)
       bytes[i] &= mask[i];
@@ -72,10 +75,11 @@ bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv6Net
 /// Refuses an interface name that is not an interface of \p netstack.
 void RequireInterfaceOf(Store& store, const std::string& netstack, const std::string& name) {
   Statement row = store.Prepare("SELECT netstack FROM tvknic WHERE name = ?");
+  enum { kNetstack };
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Interface " + name + " does not exist");
-  if (row.Text(0) != netstack)
+  if (row.Text(kNetstack) != netstack)
     throw HostCtlException("Interface " + name + " is not on netstack " + netstack);
 }
 
@@ -186,8 +190,9 @@ bool Ipv6Running(Store& store, const std::string& netstack) {
   if (kernel && *kernel == "0")
     return false;
   Statement row = store.Prepare("SELECT cur_ipv6 FROM netstack WHERE key = ?");
+  enum { kCurIpv6 };
   row.Bind(1, netstack);
-  return row.Step() && row.Bool(0);
+  return row.Step() && row.Bool(kCurIpv6);
 }
 
 void RequireIpv6(Store& store, const std::string& netstack) {
@@ -203,20 +208,22 @@ std::string ReachingInterface(Store& store, const std::string& netstack,
   Statement rows = store.Prepare(
       "SELECT name, ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = ? AND enabled = 1 "
       "AND ipv4_address <> '0.0.0.0' ORDER BY ord");
+  enum { kName, kIpv4Address, kIpv4Netmask };
   rows.Bind(1, netstack);
   std::string best;
   int bestLength = -1;
   while (rows.Step()) {
     uint32_t address = 0;
     uint32_t mask = 0;
-    if (!Ipv4Address::Parse(rows.Text(1), address) || !Ipv4Address::Parse(rows.Text(2), mask))
+    if (!Ipv4Address::Parse(rows.Text(kIpv4Address), address) ||
+        !Ipv4Address::Parse(rows.Text(kIpv4Netmask), mask))
       continue;
     Ipv4Address netmask(mask);
     if (!netmask.IsNetmask() || mask == 0)
       continue;
     if (Ipv4Network(Ipv4Address(address), netmask).Contains(gateway) &&
         netmask.PrefixLength() > bestLength) {
-      best = rows.Text(0);
+      best = rows.Text(kName);
       bestLength = netmask.PrefixLength();
     }
   }
@@ -231,16 +238,17 @@ std::string ReachingInterface(Store& store, const std::string& netstack,
   Statement rows = store.Prepare(
       "SELECT t.name, a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = a.nic "
       "WHERE t.netstack = ? AND t.enabled = 1 AND a.status <> 3 ORDER BY t.ord, a.ord");
+  enum { kName, kAddress, kPrefix };
   rows.Bind(1, netstack);
   std::string best;
   int bestLength = -1;
   while (rows.Step()) {
     std::array<uint8_t, 16> bytes{};
-    int prefix = static_cast<int>(rows.Int(2));
-    if (!Ipv6Address::Parse(rows.Text(1), bytes) || prefix <= 0 || prefix >= 128)
+    int prefix = static_cast<int>(rows.Int(kPrefix));
+    if (!Ipv6Address::Parse(rows.Text(kAddress), bytes) || prefix <= 0 || prefix >= 128)
       continue;
     if (Ipv6Network(Ipv6Address(bytes), prefix).Contains(gateway) && prefix > bestLength) {
-      best = rows.Text(0);
+      best = rows.Text(kName);
       bestLength = prefix;
     }
   }
@@ -307,8 +315,9 @@ bool IsStoredRouteSource(const std::string& source) {
 std::string ConfiguredGateway(Store& store, const std::string& netstack, int family) {
   Statement row = store.Prepare(family == 4 ? "SELECT gateway4 FROM netstack WHERE key = ?"
                                             : "SELECT gateway6 FROM netstack WHERE key = ?");
+  enum { kGateway };
   row.Bind(1, netstack);
-  return row.Step() ? row.Text(0) : std::string();
+  return row.Step() ? row.Text(kGateway) : std::string();
 }
 
 void PutConfiguredGateway(Store& store, const std::string& netstack, int family,
@@ -329,14 +338,16 @@ void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>
   domains.clear();
   Statement server =
       store.Prepare("SELECT address FROM ipsvc_dns_server WHERE netstack = ? ORDER BY ord");
+  enum { kAddress };
   server.Bind(1, netstack);
   while (server.Step())
-    servers.push_back(server.Text(0));
+    servers.push_back(server.Text(kAddress));
   Statement domain =
       store.Prepare("SELECT domain FROM ipsvc_dns_search WHERE netstack = ? ORDER BY ord");
+  enum { kDomain };
   domain.Bind(1, netstack);
   while (domain.Step())
-    domains.push_back(domain.Text(0));
+    domains.push_back(domain.Text(kDomain));
 }
 
 void SaveDns(Store& store, const std::string& netstack, const std::vector<std::string>& servers,
@@ -458,10 +469,11 @@ void InsertSa(Store& store, const IpSecSadParam& sa) {
   }
   Statement same =
       store.Prepare("SELECT name FROM ipsvc_ipsec_sa WHERE destination = ? AND spi = ?");
+  enum { kName };
   same.BindAll(destination, static_cast<int64_t>(sa.spi));
   if (same.Step())
-    throw HostCtlException("The SA " + same.Text(0) + " already uses destination " + destination +
-                           " with that SPI");
+    throw HostCtlException("The SA " + same.Text(kName) + " already uses destination " +
+                           destination + " with that SPI");
   store
       .Prepare("INSERT INTO ipsvc_ipsec_sa(name, source, destination, spi, mode, encryption, "
                "integrity, encryption_key, integrity_key, state, lifetime) "
@@ -510,10 +522,11 @@ void InsertSp(Store& store, const IpSecSpdParam& sp) {
       "SELECT name FROM ipsvc_ipsec_sp WHERE source = ? AND source_prefix = ? AND source_port = "
       "? AND destination = ? AND destination_prefix = ? AND destination_port = ? AND protocol = "
       "? AND direction = ?");
+  enum { kName };
   same.BindAll(source, sp.srcPrefixLength, static_cast<int64_t>(sp.srcPort), destination,
                sp.dstPrefixLength, static_cast<int64_t>(sp.dstPort), sp.ulProto, sp.direction);
   if (same.Step())
-    throw HostCtlException("The SP " + same.Text(0) +
+    throw HostCtlException("The SP " + same.Text(kName) +
                            " already covers that traffic in that direction");
   store
       .Prepare("INSERT INTO ipsvc_ipsec_sp(name, source, source_prefix, source_port, "

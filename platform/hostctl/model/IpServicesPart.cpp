@@ -520,8 +520,9 @@ void EmitDns(Store& store, const ExportStreams::Emit& emit) {
   Statement netstacks = store.Prepare(
       "SELECT key FROM netstack WHERE key IN (SELECT netstack FROM ipsvc_dns_server UNION "
       "SELECT netstack FROM ipsvc_dns_search) ORDER BY ord");
+  enum { kKey };
   while (netstacks.Step()) {
-    std::string netstack = netstacks.Text(0);
+    std::string netstack = netstacks.Text(kKey);
     std::vector<std::string> servers;
     std::vector<std::string> domains;
     IpSvc::LoadDns(store, netstack, servers, domains);
@@ -532,8 +533,9 @@ void EmitDns(Store& store, const ExportStreams::Emit& emit) {
 /// The worlds of host services.
 void EmitServiceWorlds(Store& store, const ExportStreams::Emit& emit) {
   Statement world = store.Prepare("SELECT id, name FROM ipsvc_world ORDER BY id");
+  enum { kId, kName };
   while (world.Step())
-    emit({{"id", world.Int(0)}, {"name", world.Text(1)}});
+    emit({{"id", world.Int(kId)}, {"name", world.Text(kName)}});
 }
 
 /// The sockets of every netstack, in the order they were described.
@@ -672,7 +674,8 @@ const ExportKind kExportKinds[] = {
 void ExportIpServices(ordered_json& host, Store& store, ExportStreams& streams) {
   for (const ExportKind& kind : kExportKinds) {
     Statement any = store.Prepare(kind.any);
-    if (any.Step() && any.Bool(0))
+    enum { kAny };
+    if (any.Step() && any.Bool(kAny))
       streams.Put(host, kind.key, kind.emit);
   }
 }

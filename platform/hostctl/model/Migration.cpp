@@ -37,20 +37,23 @@ namespace {
 
 constexpr const char* kOld = "layout2_";
 
+/// The names that \p sql, a SELECT of one column, returns.
 std::vector<std::string> Names(Store& store, const char* sql) {
   std::vector<std::string> names;
   Statement rows = store.Prepare(sql);
+  enum { kName };
   while (rows.Step())
-    names.push_back(rows.Text(0));
+    names.push_back(rows.Text(kName));
   return names;
 }
 
 std::vector<std::string> Columns(Store& store, const std::string& table) {
   std::vector<std::string> columns;
   Statement rows = store.Prepare("SELECT name FROM pragma_table_info(?) ORDER BY cid");
+  enum { kName };
   rows.Bind(1, table);
   while (rows.Step())
-    columns.push_back(rows.Text(0));
+    columns.push_back(rows.Text(kName));
   return columns;
 }
 
@@ -299,13 +302,14 @@ void CopyFilters(Store& store) {
 /// The IPv4 address of each VM port becomes a number.
 void CopyVmPortAddresses(Store& store) {
   Statement row = store.Prepare("SELECT port_id, ipv4 FROM layout2_vm_port");
+  enum { kPortId, kIpv4 };
   Statement update = store.Prepare("UPDATE port SET ipv4 = ? WHERE id = ?");
   uint32_t address = 0;
   while (row.Step()) {
     // The import checked the address; a value it would refuse reads as none.
-    if (!HostCtl::Network::Ipv4Address::Parse(row.Text(1), address))
+    if (!HostCtl::Network::Ipv4Address::Parse(row.Text(kIpv4), address))
       address = 0;
-    update.BindAll(static_cast<int64_t>(address), row.Int(0));
+    update.BindAll(static_cast<int64_t>(address), row.Int(kPortId));
     update.Run();
     update.Reset();
   }
@@ -419,11 +423,12 @@ void MigrateLayout(Store& store, int64_t from) {
                     "'layout2!_%' ESCAPE '!'"))
     store.Exec(("DROP TABLE \"" + table + "\"").c_str());
   Statement broken = store.Prepare("PRAGMA foreign_key_check");
+  enum { kTable, kRowId, kParent, kForeignKey };
   if (broken.Step())
     throw HostCtlException("The host state at " + store.GetPath() +
                            " cannot be brought to layout " + std::to_string(kLayoutVersion) +
-                           ": a row of " + broken.Text(0) + " refers to a missing row of " +
-                           broken.Text(2) + "; it was left as it was");
+                           ": a row of " + broken.Text(kTable) + " refers to a missing row of " +
+                           broken.Text(kParent) + "; it was left as it was");
 }
 
 } // namespace Model

@@ -596,10 +596,11 @@ bool NicHwPnicExists(Store& store, const std::string& nic) {
 
 bool LoadNicHwRecord(Store& store, const std::string& nic, const char* kind, std::string& text) {
   Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = ?");
+  enum { kValue };
   row.BindAll(nic, kind);
   if (!row.Step())
     return false;
-  text = row.Text(0);
+  text = row.Text(kValue);
   return true;
 }
 

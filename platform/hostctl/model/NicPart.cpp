@@ -254,10 +254,11 @@ NicSettings SettingsFromJson(const ordered_json& json) {
 NicSettings DefaultSettings(Store& store, const std::string& nic) {
   NicSettings settings;
   Statement row = store.Prepare("SELECT speed, duplex FROM pnic WHERE name = ?");
+  enum { kSpeed, kDuplex };
   row.Bind(1, nic);
-  if (row.Step() && row.Int(0) > 0)
+  if (row.Step() && row.Int(kSpeed) > 0)
     settings.info.advertisedModes.push_back(
-        {static_cast<uint32_t>(row.Int(0)), static_cast<uint32_t>(row.Int(1)), 1});
+        {static_cast<uint32_t>(row.Int(kSpeed)), static_cast<uint32_t>(row.Int(kDuplex)), 1});
   return settings;
 }
 
@@ -397,9 +398,10 @@ void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
 
     Statement stats =
         store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'stats'");
+    enum { kValue };
     stats.Bind(1, name);
     if (stats.Step())
-      nic["stats"] = ordered_json::parse(stats.Text(0));
+      nic["stats"] = ordered_json::parse(stats.Text(kValue));
 
     Statement sriov = store.Prepare("SELECT 1 FROM pnic WHERE name = ? AND sriov = 1");
     sriov.Bind(1, name);
@@ -408,13 +410,14 @@ void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
       ordered_json vfs = ordered_json::array();
       Statement rows = store.Prepare("SELECT vf_id, active, pci_address, owner_world, counters "
                                      "FROM sriov_vf WHERE nic = ? ORDER BY vf_id");
+      enum { kVfId, kActive, kPciAddress, kOwnerWorld, kCounters };
       rows.Bind(1, name);
       while (rows.Step())
-        vfs.push_back({{"id", rows.Int(0)},
-                       {"active", rows.Bool(1)},
-                       {"pciAddress", rows.Text(2)},
-                       {"ownerWorldId", rows.Text(3)},
-                       {"stats", ordered_json::parse(rows.Text(4))}});
+        vfs.push_back({{"id", rows.Int(kVfId)},
+                       {"active", rows.Bool(kActive)},
+                       {"pciAddress", rows.Text(kPciAddress)},
+                       {"ownerWorldId", rows.Text(kOwnerWorld)},
+                       {"stats", ordered_json::parse(rows.Text(kCounters))}});
       if (!vfs.empty())
         nic["vfs"] = std::move(vfs);
     }
@@ -422,9 +425,11 @@ void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
     ordered_json attachments = ordered_json::array();
     Statement branches =
         store.Prepare("SELECT branch, vlan_id FROM pnic_attachment WHERE trunk = ? ORDER BY ord");
+    enum { kBranch, kVlanId };
     branches.Bind(1, name);
     while (branches.Step())
-      attachments.push_back({{"branch", branches.Text(0)}, {"vlanId", branches.Int(1)}});
+      attachments.push_back(
+          {{"branch", branches.Text(kBranch)}, {"vlanId", branches.Int(kVlanId)}});
     if (!attachments.empty())
       nic["attachments"] = std::move(attachments);
 
@@ -437,10 +442,12 @@ void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
     ordered_json counters = ordered_json::array();
     Statement vlans = store.Prepare("SELECT vlan_id, rx_packets, tx_packets FROM "
                                     "pnic_vlan_counter WHERE nic = ? ORDER BY vlan_id");
+    enum { kVlansVlanId, kVlansRxPackets, kVlansTxPackets };
     vlans.Bind(1, name);
     while (vlans.Step())
-      counters.push_back(
-          {{"vlanId", vlans.Int(0)}, {"rxPackets", vlans.Int(1)}, {"txPackets", vlans.Int(2)}});
+      counters.push_back({{"vlanId", vlans.Int(kVlansVlanId)},
+                          {"rxPackets", vlans.Int(kVlansRxPackets)},
+                          {"txPackets", vlans.Int(kVlansTxPackets)}});
     if (!counters.empty())
       nic["vlanCounters"] = std::move(counters);
   }
@@ -450,10 +457,11 @@ void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
 
 NicSettings LoadNicSettings(Store& store, const std::string& nic) {
   Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'info'");
+  enum { kValue };
   row.Bind(1, nic);
   if (!row.Step())
     return DefaultSettings(store, nic);
-  return SettingsFromJson(ordered_json::parse(row.Text(0)));
+  return SettingsFromJson(ordered_json::parse(row.Text(kValue)));
 }
 
 void SaveNicSettings(Store& store, const std::string& nic, const NicSettings& settings) {
@@ -484,8 +492,9 @@ void AddAttachment(Store& store, const std::string& trunk, const std::string& br
   // The cached statement is reset when each look-up's Statement goes away.
   auto trunkOf = [&](const std::string& nic) -> std::optional<std::string> {
     Statement row = store.Prepare("SELECT trunk FROM pnic_attachment WHERE branch = ?");
+    enum { kTrunk };
     row.Bind(1, nic);
-    return row.Step() ? std::optional<std::string>(row.Text(0)) : std::nullopt;
+    return row.Step() ? std::optional<std::string>(row.Text(kTrunk)) : std::nullopt;
   };
   if (std::optional<std::string> current = trunkOf(branch))
     throw HostCtlException("Uplink " + branch + " is already attached to " + *current);
@@ -501,18 +510,21 @@ void AddAttachment(Store& store, const std::string& trunk, const std::string& br
   {
     Statement sameVlan =
         store.Prepare("SELECT branch FROM pnic_attachment WHERE trunk = ? AND vlan_id = ?");
+    enum { kBranch };
     sameVlan.BindAll(trunk, vlanId);
     if (sameVlan.Step())
       throw HostCtlException("VLAN " + std::to_string(vlanId) + " of trunk " + trunk +
-                             " is already used by branch " + sameVlan.Text(0));
+                             " is already used by branch " + sameVlan.Text(kBranch));
   }
   int64_t ord = 0;
   {
     Statement next =
-        store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM pnic_attachment WHERE trunk = ?");
+        store.Prepare("SELECT coalesce(max(ord), -1) + 1 AS next_ord FROM pnic_attachment WHERE "
+                      "trunk = ?");
+    enum { kNextOrd };
     next.Bind(1, trunk);
     next.Step();
-    ord = next.Int(0);
+    ord = next.Int(kNextOrd);
   }
   store.Prepare("INSERT INTO pnic_attachment(branch, trunk, vlan_id, ord) VALUES(?, ?, ?, ?)")
       .BindAll(branch, trunk, vlanId, ord)

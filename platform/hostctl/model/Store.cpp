@@ -207,13 +207,15 @@ Store::Store(const std::string& path) : path_(path), cache_(std::make_unique<Cac
   sqlite3_busy_timeout(db_, LockTimeoutSlot());
   try {
     Exec("PRAGMA synchronous=FULL; PRAGMA foreign_keys=ON");
+    // Each pragma below returns one row of one column.
+    enum { kValue };
     Statement check = Prepare("PRAGMA application_id");
     check.Step();
-    int64_t app = check.Int(0);
+    int64_t app = check.Int(kValue);
     check.Reset();
     Statement version = Prepare("PRAGMA user_version");
     version.Step();
-    int64_t schema = version.Int(0);
+    int64_t schema = version.Int(kValue);
     version.Reset();
     if (app != kApplicationId)
       throw HostCtlException("The file " + path + " is not a host state database");
@@ -237,12 +239,14 @@ void Store::Upgrade(int64_t from) {
   // Layout 1 kept changes in a write-ahead log beside the file; the rollback
   // journal keeps every committed change in the file itself. Leaving the log
   // needs the file to ourselves, which may take a moment.
+  // Each pragma below returns one row of one column.
+  enum { kValue };
   Statement mode = Prepare("PRAGMA journal_mode");
-  std::string journal = mode.Step() ? mode.Text(0) : std::string();
+  std::string journal = mode.Step() ? mode.Text(kValue) : std::string();
   mode.Reset();
   if (journal == "wal") {
     Statement change = Prepare("PRAGMA journal_mode=DELETE");
-    journal = change.Step() ? change.Text(0) : std::string();
+    journal = change.Step() ? change.Text(kValue) : std::string();
     change.Reset();
     if (journal == "wal")
       throw HostCtlException("The host state at " + path_ +
@@ -256,7 +260,7 @@ void Store::Upgrade(int64_t from) {
     Exec("BEGIN IMMEDIATE");
     Statement version = Prepare("PRAGMA user_version");
     version.Step();
-    int64_t current = version.Int(0);
+    int64_t current = version.Int(kValue);
     version.Reset();
     // Another process may have migrated the file while this one waited.
     if (current == from) {

@@ -406,9 +406,10 @@ void ImportSwitching(const ordered_json& host, Store& store) {
 std::vector<std::string> UplinksOf(Store& store, int64_t id) {
   std::vector<std::string> names;
   Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+  enum { kNic };
   rows.Bind(1, id);
   while (rows.Step())
-    names.push_back(rows.Text(0));
+    names.push_back(rows.Text(kNic));
   return names;
 }
 
@@ -417,16 +418,17 @@ ordered_json ExportPortGroups(Store& store, int64_t id) {
   Statement rows = store.Prepare(
       "SELECT g.name, g.vlan_id, g.system, p.teaming, p.security, p.shaping FROM portgroup g "
       "JOIN portgroup_policy p ON p.portgroup_id = g.id WHERE g.portset_id = ? ORDER BY g.ord");
+  enum { kName, kVlanId, kSystem, kTeaming, kSecurity, kShaping };
   rows.Bind(1, id);
   while (rows.Step()) {
     ordered_json pg = ordered_json::object();
-    pg["name"] = rows.Text(0);
-    pg["vlanId"] = rows.Int(1);
-    if (rows.Bool(2))
+    pg["name"] = rows.Text(kName);
+    pg["vlanId"] = rows.Int(kVlanId);
+    if (rows.Bool(kSystem))
       pg["system"] = true;
     const char* keys[] = {"teaming", "security", "shaping"};
     for (int i = 0; i < 3; ++i) {
-      ordered_json policy = ordered_json::parse(rows.Text(3 + i));
+      ordered_json policy = ordered_json::parse(rows.Text(kTeaming + i));
       if (!policy.empty())
         pg[keys[i]] = std::move(policy);
     }
@@ -441,22 +443,36 @@ void ExportStandard(ordered_json& host, Store& store) {
       "SELECT p.id, p.name, p.system, p.num_ports, p.mtu, v.cdp, v.beacon_interval, "
       "v.beacon_threshold, v.teaming, v.security, v.shaping, v.capabilities FROM portset p "
       "JOIN vswitch v ON v.portset_id = p.id WHERE p.kind = 'standard' ORDER BY p.ord");
+  enum {
+    kId,
+    kName,
+    kSystem,
+    kNumPorts,
+    kMtu,
+    kCdp,
+    kBeaconInterval,
+    kBeaconThreshold,
+    kTeaming,
+    kSecurity,
+    kShaping,
+    kCapabilities
+  };
   while (rows.Step()) {
-    int64_t id = rows.Int(0);
+    int64_t id = rows.Int(kId);
     ordered_json vs = ordered_json::object();
-    vs["name"] = rows.Text(1);
-    if (rows.Bool(2))
+    vs["name"] = rows.Text(kName);
+    if (rows.Bool(kSystem))
       vs["system"] = true;
-    vs["ports"] = rows.Int(3);
-    vs["mtu"] = rows.Int(4);
-    vs["cdp"] = kCdpNames[rows.Int(5) & 3];
-    vs["beaconInterval"] = rows.Int(6);
-    vs["beaconThreshold"] = rows.Int(7);
+    vs["ports"] = rows.Int(kNumPorts);
+    vs["mtu"] = rows.Int(kMtu);
+    vs["cdp"] = kCdpNames[rows.Int(kCdp) & 3];
+    vs["beaconInterval"] = rows.Int(kBeaconInterval);
+    vs["beaconThreshold"] = rows.Int(kBeaconThreshold);
     vs["uplinks"] = UplinksOf(store, id);
-    vs["teaming"] = ordered_json::parse(rows.Text(8));
-    vs["security"] = ordered_json::parse(rows.Text(9));
-    vs["shaping"] = ordered_json::parse(rows.Text(10));
-    vs["capabilities"] = ordered_json::parse(rows.Text(11));
+    vs["teaming"] = ordered_json::parse(rows.Text(kTeaming));
+    vs["security"] = ordered_json::parse(rows.Text(kSecurity));
+    vs["shaping"] = ordered_json::parse(rows.Text(kShaping));
+    vs["capabilities"] = ordered_json::parse(rows.Text(kCapabilities));
     vs["portgroups"] = ExportPortGroups(store, id);
     list.push_back(std::move(vs));
   }
@@ -468,15 +484,16 @@ ordered_json ExportLags(Store& store, int64_t id) {
   ordered_json lags = ordered_json::array();
   Statement rows = store.Prepare("SELECT lag_id, name, mode, load_balancing, uplink_count, nics "
                                  "FROM lag WHERE portset_id = ? ORDER BY ord");
+  enum { kLagId, kName, kMode, kLoadBalancing, kUplinkCount, kNics };
   rows.Bind(1, id);
   while (rows.Step()) {
     ordered_json lag = ordered_json::object();
-    lag["id"] = rows.Int(0);
-    lag["name"] = rows.Text(1);
-    lag["mode"] = rows.Int(2) == 2 ? "passive" : "active";
-    lag["loadBalancing"] = rows.Int(3);
-    lag["uplinkCount"] = rows.Int(4);
-    ordered_json nics = ordered_json::parse(rows.Text(5));
+    lag["id"] = rows.Int(kLagId);
+    lag["name"] = rows.Text(kName);
+    lag["mode"] = rows.Int(kMode) == 2 ? "passive" : "active";
+    lag["loadBalancing"] = rows.Int(kLoadBalancing);
+    lag["uplinkCount"] = rows.Int(kUplinkCount);
+    ordered_json nics = ordered_json::parse(rows.Text(kNics));
     lag["nics"] = std::move(nics);
     lags.push_back(std::move(lag));
   }
@@ -489,44 +506,70 @@ void ExportDistributed(ordered_json& host, Store& store, const char* key, const 
       "SELECT p.id, p.name, p.system, p.num_ports, p.mtu, d.uuid, d.display_name, d.class_name, "
       "d.configured_ports, d.cdp, d.beacon_timeout, d.branded, d.lacp_on_dpu FROM portset p "
       "JOIN dvswitch d ON d.portset_id = p.id WHERE p.kind = ? ORDER BY p.ord");
+  enum {
+    kId,
+    kName,
+    kSystem,
+    kNumPorts,
+    kMtu,
+    kUuid,
+    kDisplayName,
+    kClassName,
+    kConfiguredPorts,
+    kCdp,
+    kBeaconTimeout,
+    kBranded,
+    kLacpOnDpu
+  };
   rows.Bind(1, kind);
   while (rows.Step()) {
-    int64_t id = rows.Int(0);
+    int64_t id = rows.Int(kId);
     ordered_json dvs = ordered_json::object();
-    dvs["name"] = rows.Text(1);
-    if (rows.Bool(2))
+    dvs["name"] = rows.Text(kName);
+    if (rows.Bool(kSystem))
       dvs["system"] = true;
-    dvs["numPorts"] = rows.Int(3);
-    dvs["mtu"] = rows.Int(4);
-    dvs["uuid"] = rows.Text(5);
-    dvs["displayName"] = rows.Text(6);
-    dvs["class"] = rows.Text(7);
-    dvs["configuredPorts"] = rows.Int(8);
-    dvs["cdp"] = rows.Text(9);
-    dvs["beaconTimeout"] = rows.Int(10);
-    dvs["branded"] = rows.Bool(11);
-    dvs["lacpOnDpu"] = rows.Bool(12);
+    dvs["numPorts"] = rows.Int(kNumPorts);
+    dvs["mtu"] = rows.Int(kMtu);
+    dvs["uuid"] = rows.Text(kUuid);
+    dvs["displayName"] = rows.Text(kDisplayName);
+    dvs["class"] = rows.Text(kClassName);
+    dvs["configuredPorts"] = rows.Int(kConfiguredPorts);
+    dvs["cdp"] = rows.Text(kCdp);
+    dvs["beaconTimeout"] = rows.Int(kBeaconTimeout);
+    dvs["branded"] = rows.Bool(kBranded);
+    dvs["lacpOnDpu"] = rows.Bool(kLacpOnDpu);
     dvs["uplinks"] = UplinksOf(store, id);
     ordered_json ports = ordered_json::array();
     Statement port = store.Prepare(
         "SELECT d.port_key, d.portgroup_key, d.connection_id, d.is_uplink, d.name, "
         "d.lacp_enabled, d.lacp_mode, d.uplink_pg_key, "
         "(SELECT client FROM port WHERE portset_id = d.portset_id AND dvport_key = d.port_key "
-        " AND client_kind = 'uplink') FROM dvport d "
+        " AND client_kind = 'uplink') AS nic FROM dvport d "
         "WHERE d.portset_id = ? ORDER BY d.ord");
+    enum {
+      kPortKey,
+      kPortgroupKey,
+      kConnectionId,
+      kIsUplink,
+      kPortName,
+      kLacpEnabled,
+      kLacpMode,
+      kUplinkPgKey,
+      kNic
+    };
     port.Bind(1, id);
     while (port.Step()) {
       ordered_json entry = ordered_json::object();
-      entry["key"] = port.Text(0);
-      entry["name"] = port.Text(4);
-      entry["portgroupKey"] = port.Text(1);
-      entry["connectionId"] = port.Int(2);
-      entry["uplink"] = port.Bool(3);
-      if (!port.IsNull(8))
-        entry["nic"] = port.Text(8);
-      entry["lacpEnabled"] = port.Bool(5);
-      entry["lacpMode"] = port.Int(6);
-      entry["uplinkPortgroupKey"] = port.Text(7);
+      entry["key"] = port.Text(kPortKey);
+      entry["name"] = port.Text(kPortName);
+      entry["portgroupKey"] = port.Text(kPortgroupKey);
+      entry["connectionId"] = port.Int(kConnectionId);
+      entry["uplink"] = port.Bool(kIsUplink);
+      if (!port.IsNull(kNic))
+        entry["nic"] = port.Text(kNic);
+      entry["lacpEnabled"] = port.Bool(kLacpEnabled);
+      entry["lacpMode"] = port.Int(kLacpMode);
+      entry["uplinkPortgroupKey"] = port.Text(kUplinkPgKey);
       ports.push_back(std::move(entry));
     }
     dvs["dvports"] = std::move(ports);
