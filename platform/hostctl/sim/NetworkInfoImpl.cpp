@@ -24,21 +24,35 @@ NetworkInfoImpl::GetPnics(HostCtl::Network::PnicGetType type) {
     Statement rows = store.Prepare(
         "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, "
         "speed, duplex, mac, mtu FROM pnic ORDER BY ord");
+    enum {
+      kName,
+      kPciAddress,
+      kVendor,
+      kDevice,
+      kPseudoDesc,
+      kDriver,
+      kAdminUp,
+      kLinkUp,
+      kSpeed,
+      kDuplex,
+      kMac,
+      kMtu
+    };
     while (rows.Step()) {
       PnicData data;
-      data.name = rows.Text(0);
-      data.hasPci = !rows.IsNull(1);
-      data.pciAddress = rows.Text(1);
-      data.vendor = rows.Text(2);
-      data.device = rows.Text(3);
-      data.pseudoDevice = rows.Text(4);
-      data.driver = rows.Text(5);
-      data.adminUp = rows.Bool(6);
-      data.carrier = rows.Bool(7);
-      data.speed = static_cast<uint32_t>(rows.Int(8));
-      data.duplex = static_cast<uint32_t>(rows.Int(9));
-      data.mac = rows.Text(10);
-      data.mtu = static_cast<uint32_t>(rows.Int(11));
+      data.name = rows.Text(kName);
+      data.hasPci = !rows.IsNull(kPciAddress);
+      data.pciAddress = rows.Text(kPciAddress);
+      data.vendor = rows.Text(kVendor);
+      data.device = rows.Text(kDevice);
+      data.pseudoDevice = rows.Text(kPseudoDesc);
+      data.driver = rows.Text(kDriver);
+      data.adminUp = rows.Bool(kAdminUp);
+      data.carrier = rows.Bool(kLinkUp);
+      data.speed = static_cast<uint32_t>(rows.Int(kSpeed));
+      data.duplex = static_cast<uint32_t>(rows.Int(kDuplex));
+      data.mac = rows.Text(kMac);
+      data.mtu = static_cast<uint32_t>(rows.Int(kMtu));
       nics.push_back(std::make_unique<PnicImpl>(std::move(data)));
     }
   });
@@ -78,10 +92,11 @@ std::unique_ptr<SmartNic> GetSmartNicByPnic(const std::string& pnicName) {
   return store.Read([&]() -> std::unique_ptr<SmartNic> {
     Model::Statement row =
         store.Prepare("SELECT dpu_id FROM pnic WHERE name = ? AND dpu_id IS NOT NULL");
+    enum { kDpuId };
     row.Bind(1, pnicName);
     if (!row.Step())
       return nullptr;
-    return std::make_unique<SmartNicImpl>(row.Text(0));
+    return std::make_unique<SmartNicImpl>(row.Text(kDpuId));
   });
 }
 

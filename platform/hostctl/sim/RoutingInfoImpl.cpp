@@ -64,7 +64,10 @@ bool DeleteNeighbors(Store& store, int family, const Neighbor& neighbor,
   return store.Changes() > 0;
 }
 
-/// The neighbour rows of a netstack.
+/// The columns of NeighborRows.
+enum NeighborColumn { kNeighborAddress, kNeighborMac, kNeighborInterface, kExpiry, kType, kState };
+
+/// The neighbour rows of a netstack (NeighborColumn).
 Statement NeighborRows(Store& store, int family, const std::string& netstack,
                        const std::string& interfaceName, PortsetGetType selector) {
   Statement rows = store.Prepare(
@@ -106,26 +109,29 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
     Statement nics = store.Prepare(
         "SELECT name, ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = ? AND system = ? "
         "AND enabled = 1 AND ipv4_address <> '0.0.0.0' ORDER BY ord");
+    enum { kName, kIpv4Address, kIpv4Netmask };
     nics.BindAll(netstack_, system);
     while (nics.Step()) {
       uint32_t address = 0;
       uint32_t mask = 0;
-      if (!Ipv4Address::Parse(nics.Text(1), address) || !Ipv4Address::Parse(nics.Text(2), mask) ||
-          mask == 0 || !Ipv4Address(mask).IsNetmask())
+      if (!Ipv4Address::Parse(nics.Text(kIpv4Address), address) ||
+          !Ipv4Address::Parse(nics.Text(kIpv4Netmask), mask) || mask == 0 ||
+          !Ipv4Address(mask).IsNetmask())
         continue;
       Ipv4Network network(Ipv4Address(address & mask), Ipv4Address(mask));
       sources_.emplace(SourceKey(network), SOURCE_CONNECTED);
-      routes.emplace_back(network, Ipv4Address(), nics.Text(0));
+      routes.emplace_back(network, Ipv4Address(), nics.Text(kName));
     }
     Statement rows = store.Prepare(
         "SELECT network, prefix, gateway, interface, source FROM ipsvc_route WHERE netstack = ? "
         "AND family = 4 AND system = ? ORDER BY id");
+    enum { kNetwork, kPrefix, kGateway, kInterface, kSource };
     rows.BindAll(netstack_, system);
     while (rows.Step()) {
-      Ipv4Network network(IpSvc::Ipv4Column(rows, 0),
-                          Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));
-      sources_.emplace(SourceKey(network), rows.Text(4));
-      routes.emplace_back(network, IpSvc::Ipv4Column(rows, 2), rows.Text(3));
+      Ipv4Network network(IpSvc::Ipv4Column(rows, kNetwork),
+                          Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(kPrefix))));
+      sources_.emplace(SourceKey(network), rows.Text(kSource));
+      routes.emplace_back(network, IpSvc::Ipv4Column(rows, kGateway), rows.Text(kInterface));
     }
   });
   return routes;
@@ -166,13 +172,14 @@ template <typename Address>
 std::optional<Address> RunningGateway(Store& store, const std::string& netstack, int family) {
   Statement row = store.Prepare("SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? "
                                 "AND system = 0 AND prefix = 0");
+  enum { kGateway };
   row.BindAll(netstack, family);
   if (!row.Step())
     return std::nullopt;
   if constexpr (std::is_same_v<Address, Ipv4Address>)
-    return IpSvc::Ipv4Column(row, 0);
+    return IpSvc::Ipv4Column(row, kGateway);
   else
-    return IpSvc::Ipv6Column(row, 0);
+    return IpSvc::Ipv6Column(row, kGateway);
 }
 
 } // namespace
@@ -224,18 +231,21 @@ std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network)
     Statement row = store.Prepare(
         "SELECT source FROM ipsvc_route WHERE netstack = ? AND family = 4 AND network = ? AND "
         "prefix = ? ORDER BY system");
+    enum { kSource };
     row.Bind(1, netstack_);
     IpSvc::BindAddress(row, 2, network.GetNetwork());
     row.Bind(3, network.GetPrefixLength());
     if (row.Step())
-      return row.Text(0);
+      return row.Text(kSource);
     Statement nics = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack "
                                    "= ? AND enabled = 1 AND ipv4_address <> '0.0.0.0'");
+    enum { kIpv4Address, kIpv4Netmask };
     nics.Bind(1, netstack_);
     while (nics.Step()) {
       uint32_t address = 0;
       uint32_t mask = 0;
-      if (Ipv4Address::Parse(nics.Text(0), address) && Ipv4Address::Parse(nics.Text(1), mask) &&
+      if (Ipv4Address::Parse(nics.Text(kIpv4Address), address) &&
+          Ipv4Address::Parse(nics.Text(kIpv4Netmask), mask) &&
           Ipv4Network(Ipv4Address(address & mask), Ipv4Address(mask)) == network)
         return std::string(SOURCE_CONNECTED);
     }
@@ -258,24 +268,27 @@ std::vector<Ipv6Route> RoutingInfoImpl::GetCurrentIpv6TarvikRoutes(PortsetGetTyp
         "SELECT t.name, a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = a.nic "
         "WHERE t.netstack = ? AND t.system = ? AND t.enabled = 1 AND a.status <> 3 AND "
         "a.prefix > 0 AND a.prefix < 128 ORDER BY t.ord, a.ord");
+    enum { kName, kAddress, kPrefix };
     nics.BindAll(netstack_, system);
     while (nics.Step()) {
       std::array<uint8_t, 16> bytes{};
-      if (!Ipv6Address::Parse(nics.Text(1), bytes))
+      if (!Ipv6Address::Parse(nics.Text(kAddress), bytes))
         continue;
-      int prefix = static_cast<int>(nics.Int(2));
+      int prefix = static_cast<int>(nics.Int(kPrefix));
       const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
       for (int i = 0; i < 16; ++i)
         bytes[i] &= mask[i];
-      routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(0));
+      routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(kName));
     }
     Statement rows = store.Prepare(
         "SELECT network, prefix, gateway, interface FROM ipsvc_route WHERE netstack = ? AND "
         "family = 6 AND system = ? ORDER BY id");
+    enum { kRowsNetwork, kRowsPrefix, kRowsGateway, kRowsInterface };
     rows.BindAll(netstack_, system);
     while (rows.Step())
-      routes.emplace_back(Ipv6Network(IpSvc::Ipv6Column(rows, 0), static_cast<int>(rows.Int(1))),
-                          IpSvc::Ipv6Column(rows, 2), rows.Text(3));
+      routes.emplace_back(Ipv6Network(IpSvc::Ipv6Column(rows, kRowsNetwork),
+                                      static_cast<int>(rows.Int(kRowsPrefix))),
+                          IpSvc::Ipv6Column(rows, kRowsGateway), rows.Text(kRowsInterface));
   });
   return routes;
 }
@@ -363,8 +376,9 @@ void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& l
     IpSvc::RequireNetstack(store, netstack_);
     Statement rows = NeighborRows(store, 4, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(IpSvc::Ipv4Column(rows, 0), rows.Text(1), rows.Text(2), rows.Int(3),
-                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+      list.emplace_back(IpSvc::Ipv4Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
+                        rows.Text(kNeighborInterface), rows.Int(kExpiry),
+                        static_cast<int>(rows.Int(kType)), static_cast<int>(rows.Int(kState)));
   });
 }
 
@@ -379,8 +393,9 @@ void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& l
       return;
     Statement rows = NeighborRows(store, 6, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(IpSvc::Ipv6Column(rows, 0), rows.Text(1), rows.Text(2), rows.Int(3),
-                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+      list.emplace_back(IpSvc::Ipv6Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
+                        rows.Text(kNeighborInterface), rows.Int(kExpiry),
+                        static_cast<int>(rows.Int(kType)), static_cast<int>(rows.Int(kState)));
   });
 }
 

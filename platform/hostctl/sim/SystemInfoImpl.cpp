@@ -29,9 +29,10 @@ bool ReadState(const char* operation, const char* sql) {
   store.CheckFault(operation, FirewallModuleName);
   return store.Read([&] {
     Statement row = store.Prepare(sql);
+    enum { kState };
     if (!row.Step())
       throw HostCtlException("The host has no firewall state");
-    return row.Bool(0);
+    return row.Bool(kState);
   });
 }
 
@@ -98,8 +99,9 @@ std::vector<std::unique_ptr<FirewallRuleset>> SystemInfoImpl::GetFirewallRuleset
   std::vector<std::unique_ptr<FirewallRuleset>> sets;
   store.Read([&] {
     Statement rows = store.Prepare("SELECT id FROM fw_ruleset ORDER BY ord");
+    enum { kId };
     while (rows.Step())
-      sets.push_back(std::make_unique<FirewallRulesetImpl>(rows.Text(0)));
+      sets.push_back(std::make_unique<FirewallRulesetImpl>(rows.Text(kId)));
   });
   return sets;
 }

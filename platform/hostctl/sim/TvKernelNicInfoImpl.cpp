@@ -23,17 +23,18 @@ namespace {
 #define TVKNIC_COLUMNS                                                                             \
   "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "                                     \
   "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
+enum TvknicColumn { kName, kNetstack, kMac, kMtu, kTsoMss, kRxQueues, kEnabled, kPortId };
 
 std::unique_ptr<TvkNic> ReadRow(const Statement& row) {
   TvkNicData data;
-  data.name = row.Text(0);
-  data.netstack = row.Text(1);
-  data.mac = row.Text(2);
-  data.mtu = static_cast<uint32_t>(row.Int(3));
-  data.tsoMss = static_cast<uint32_t>(row.Int(4));
-  data.rxQueues = static_cast<uint32_t>(row.Int(5));
-  data.enabled = row.Bool(6);
-  data.portId = row.Int(7);
+  data.name = row.Text(kName);
+  data.netstack = row.Text(kNetstack);
+  data.mac = row.Text(kMac);
+  data.mtu = static_cast<uint32_t>(row.Int(kMtu));
+  data.tsoMss = static_cast<uint32_t>(row.Int(kTsoMss));
+  data.rxQueues = static_cast<uint32_t>(row.Int(kRxQueues));
+  data.enabled = row.Bool(kEnabled);
+  data.portId = row.Int(kPortId);
   return std::make_unique<TvkNicImpl>(std::move(data));
 }
 
@@ -108,9 +109,10 @@ void TvKernelNicInfoImpl::GetTvkernelNicNamesByInstanceKey(std::vector<std::stri
   store.Read([&] {
     Statement rows = store.Prepare(
         "SELECT name FROM tvknic WHERE netstack = ? AND system = ? ORDER BY ord, name");
+    enum { kName };
     rows.BindAll(netstack, selector == 1);
     while (rows.Step())
-      names.push_back(rows.Text(0));
+      names.push_back(rows.Text(kName));
   });
 }
 
