@@ -127,7 +127,7 @@ void CheckKey(const std::string& what, const std::string& algorithm, const std::
                          std::to_string(bytes * 2) + " hex digits";
   bool hex = key.size() > 2 && key[0] == '0' && (key[1] == 'x' || key[1] == 'X');
   if (hex) {
-    if (key.size() != static_cast<std::size_t>(2 + bytes * 2) || !IsHexDigits(key, 2))
+    if (key.size() != 2 + static_cast<std::size_t>(bytes) * 2 || !IsHexDigits(key, 2))
       throw HostCtlException(expected);
     return;
   }

@@ -308,7 +308,7 @@ void ImportNeighbor(const JsonObject& neighbor, Store& store) {
   else
     IpSvc::BindAddress(insert, 3, Ipv4Address(address));
   insert.Bind(4, HostCtl::Network::MacAddress(mac).GetStringAddress())
-      .Bind(5, neighbor.Int("expiry", 0, 86400 * 365, 0))
+      .Bind(5, neighbor.Int("expiry", 0, int64_t{86400} * 365, 0))
       .Bind(6, type)
       .Bind(7, state);
   AsField(neighbor, "address", [&] {

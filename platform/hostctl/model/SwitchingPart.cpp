@@ -17,6 +17,7 @@
 #include "model/SwitchingModel.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <set>
 
 namespace Model {
@@ -657,8 +658,9 @@ ordered_json TeamingToJson(const NicTeamingPolicy& policy) {
     const std::vector<std::string>& order = policy.GetUplinkOrder();
     std::size_t active = static_cast<std::size_t>(std::max(0, policy.GetMaxActiveUplinks()));
     active = std::min(active, order.size());
-    out["activeUplinks"] = std::vector<std::string>(order.begin(), order.begin() + active);
-    out["standbyUplinks"] = std::vector<std::string>(order.begin() + active, order.end());
+    auto split = order.begin() + static_cast<std::ptrdiff_t>(active);
+    out["activeUplinks"] = std::vector<std::string>(order.begin(), split);
+    out["standbyUplinks"] = std::vector<std::string>(split, order.end());
   }
   return out;
 }

@@ -38,20 +38,30 @@ bool KernelIpv6Running(Store& store) {
 
 #define NETSTACK_COLUMNS                                                                           \
   "key, name, state, max_conn, cur_max_conn, ccalgo, ipv6, cur_ipv6, ecn FROM netstack "
-enum NetstackColumn { kKey, kName, kState, kMaxConn, kCurMaxConn, kCcalgo, kIpv6, kCurIpv6, kEcn };
+enum NetstackColumn {
+  kNetstackKey,
+  kNetstackName,
+  kNetstackState,
+  kNetstackMaxConn,
+  kNetstackCurMaxConn,
+  kNetstackCcalgo,
+  kNetstackIpv6,
+  kNetstackCurIpv6,
+  kNetstackEcn
+};
 
 /// One row of NETSTACK_COLUMNS.
 NetstackData ReadNetstack(const Statement& row, bool kernelIpv6) {
   NetstackData data;
-  data.key = row.Text(kKey);
-  data.name = row.Text(kName);
-  data.state = static_cast<uint32_t>(row.Int(kState));
-  data.maxConnections = static_cast<uint32_t>(row.Int(kMaxConn));
-  data.curMaxConnections = static_cast<uint32_t>(row.Int(kCurMaxConn));
-  data.ccAlgorithm = row.Text(kCcalgo);
-  data.ipv6 = row.Bool(kIpv6);
-  data.curIpv6 = row.Bool(kCurIpv6) && kernelIpv6;
-  data.ecn = row.Text(kEcn);
+  data.key = row.Text(kNetstackKey);
+  data.name = row.Text(kNetstackName);
+  data.state = static_cast<uint32_t>(row.Int(kNetstackState));
+  data.maxConnections = static_cast<uint32_t>(row.Int(kNetstackMaxConn));
+  data.curMaxConnections = static_cast<uint32_t>(row.Int(kNetstackCurMaxConn));
+  data.ccAlgorithm = row.Text(kNetstackCcalgo);
+  data.ipv6 = row.Bool(kNetstackIpv6);
+  data.curIpv6 = row.Bool(kNetstackCurIpv6) && kernelIpv6;
+  data.ecn = row.Text(kNetstackEcn);
   return data;
 }
 

@@ -196,7 +196,6 @@ std::unique_ptr<HostCtl::Network::Port> PnicImpl::GetPort() const {
 namespace Sim {
 
 WorldImpl::WorldImpl(int64_t worldId) : worldId_(worldId) {}
-WorldImpl::~WorldImpl() = default;
 
 std::string WorldImpl::GetWorldName() const {
   Model::Store& store = Model::Store::Host();

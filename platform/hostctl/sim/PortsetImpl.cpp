@@ -23,17 +23,17 @@ PortsetKind KindOf(const std::string& text) {
 }
 
 /// The columns ReadPortset reads: "SELECT id, name, kind, system FROM portset".
-enum PortsetColumn { kPortsetId, kPortsetName, kPortsetKind, kPortsetSystem };
+enum PortsetColumn { kRowPortsetId, kRowPortsetName, kRowPortsetKind, kRowPortsetSystem };
 
 /// The next row of a statement that selects the PortsetColumn columns.
 std::optional<PortsetData> ReadPortset(Statement& row) {
   if (!row.Step())
     return std::nullopt;
   PortsetData data;
-  data.id = row.Int(kPortsetId);
-  data.name = row.Text(kPortsetName);
-  data.kind = KindOf(row.Text(kPortsetKind));
-  data.system = row.Bool(kPortsetSystem);
+  data.id = row.Int(kRowPortsetId);
+  data.name = row.Text(kRowPortsetName);
+  data.kind = KindOf(row.Text(kRowPortsetKind));
+  data.system = row.Bool(kRowPortsetSystem);
   return data;
 }
 

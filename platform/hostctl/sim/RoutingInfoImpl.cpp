@@ -65,7 +65,14 @@ bool DeleteNeighbors(Store& store, int family, const Neighbor& neighbor,
 }
 
 /// The columns of NeighborRows.
-enum NeighborColumn { kNeighborAddress, kNeighborMac, kNeighborInterface, kExpiry, kType, kState };
+enum NeighborColumn {
+  kNeighborAddress,
+  kNeighborMac,
+  kNeighborInterface,
+  kNeighborExpiry,
+  kNeighborType,
+  kNeighborState
+};
 
 /// The neighbour rows of a netstack (NeighborColumn).
 Statement NeighborRows(Store& store, int family, const std::string& netstack,
@@ -377,8 +384,9 @@ void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& l
     Statement rows = NeighborRows(store, 4, netstack_, interfaceName, selector);
     while (rows.Step())
       list.emplace_back(IpSvc::Ipv4Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
-                        rows.Text(kNeighborInterface), rows.Int(kExpiry),
-                        static_cast<int>(rows.Int(kType)), static_cast<int>(rows.Int(kState)));
+                        rows.Text(kNeighborInterface), rows.Int(kNeighborExpiry),
+                        static_cast<int>(rows.Int(kNeighborType)),
+                        static_cast<int>(rows.Int(kNeighborState)));
   });
 }
 
@@ -394,8 +402,9 @@ void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& l
     Statement rows = NeighborRows(store, 6, netstack_, interfaceName, selector);
     while (rows.Step())
       list.emplace_back(IpSvc::Ipv6Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
-                        rows.Text(kNeighborInterface), rows.Int(kExpiry),
-                        static_cast<int>(rows.Int(kType)), static_cast<int>(rows.Int(kState)));
+                        rows.Text(kNeighborInterface), rows.Int(kNeighborExpiry),
+                        static_cast<int>(rows.Int(kNeighborType)),
+                        static_cast<int>(rows.Int(kNeighborState)));
   });
 }
 

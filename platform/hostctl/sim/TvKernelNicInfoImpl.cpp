@@ -23,18 +23,27 @@ namespace {
 #define TVKNIC_COLUMNS                                                                             \
   "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "                                     \
   "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
-enum TvknicColumn { kName, kNetstack, kMac, kMtu, kTsoMss, kRxQueues, kEnabled, kPortId };
+enum TvknicColumn {
+  kNicName,
+  kNicNetstack,
+  kNicMac,
+  kNicMtu,
+  kNicTsoMss,
+  kNicRxQueues,
+  kNicEnabled,
+  kNicPortId
+};
 
 std::unique_ptr<TvkNic> ReadRow(const Statement& row) {
   TvkNicData data;
-  data.name = row.Text(kName);
-  data.netstack = row.Text(kNetstack);
-  data.mac = row.Text(kMac);
-  data.mtu = static_cast<uint32_t>(row.Int(kMtu));
-  data.tsoMss = static_cast<uint32_t>(row.Int(kTsoMss));
-  data.rxQueues = static_cast<uint32_t>(row.Int(kRxQueues));
-  data.enabled = row.Bool(kEnabled);
-  data.portId = row.Int(kPortId);
+  data.name = row.Text(kNicName);
+  data.netstack = row.Text(kNicNetstack);
+  data.mac = row.Text(kNicMac);
+  data.mtu = static_cast<uint32_t>(row.Int(kNicMtu));
+  data.tsoMss = static_cast<uint32_t>(row.Int(kNicTsoMss));
+  data.rxQueues = static_cast<uint32_t>(row.Int(kNicRxQueues));
+  data.enabled = row.Bool(kNicEnabled);
+  data.portId = row.Int(kNicPortId);
   return std::make_unique<TvkNicImpl>(std::move(data));
 }
 
