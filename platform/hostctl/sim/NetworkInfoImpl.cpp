@@ -7,8 +7,6 @@
 
 namespace Sim {
 
-bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
-
 using Model::Statement;
 using Model::Store;
 
@@ -21,40 +19,8 @@ NetworkInfoImpl::GetPnics(HostCtl::Network::PnicGetType type) {
   store.CheckFault("GetPnics", "*");
   std::vector<std::unique_ptr<HostCtl::Network::Pnic>> nics;
   store.Read([&] {
-    Statement rows = store.Prepare(
-        "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, "
-        "speed, duplex, mac, mtu FROM pnic ORDER BY ord");
-    enum {
-      kName,
-      kPciAddress,
-      kVendor,
-      kDevice,
-      kPseudoDesc,
-      kDriver,
-      kAdminUp,
-      kLinkUp,
-      kSpeed,
-      kDuplex,
-      kMac,
-      kMtu
-    };
-    while (rows.Step()) {
-      PnicData data;
-      data.name = rows.Text(kName);
-      data.hasPci = !rows.IsNull(kPciAddress);
-      data.pciAddress = rows.Text(kPciAddress);
-      data.vendor = rows.Text(kVendor);
-      data.device = rows.Text(kDevice);
-      data.pseudoDevice = rows.Text(kPseudoDesc);
-      data.driver = rows.Text(kDriver);
-      data.adminUp = rows.Bool(kAdminUp);
-      data.carrier = rows.Bool(kLinkUp);
-      data.speed = static_cast<uint32_t>(rows.Int(kSpeed));
-      data.duplex = static_cast<uint32_t>(rows.Int(kDuplex));
-      data.mac = rows.Text(kMac);
-      data.mtu = static_cast<uint32_t>(rows.Int(kMtu));
+    for (PnicData& data : ListPnicData(store))
       nics.push_back(std::make_unique<PnicImpl>(std::move(data)));
-    }
   });
   return nics;
 }

@@ -16,8 +16,6 @@
 
 namespace Sim {
 
-bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
-
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
 using Model::Store;
