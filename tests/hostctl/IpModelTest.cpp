@@ -360,7 +360,9 @@ TEST_F(IpModelTest, HostProgramsActOnTheModelOnly) {
   EXPECT_EQ(127, TvkCtl::Util::TvkCtl_Exec("/bin/true", false, true, false));
   Model::Store& store = Model::Store::Host();
   store.Write([&] {
-    store.Exec("INSERT INTO fault VALUES('TvkCtl_Exec', '/etc/init.d/quilld', 'no daemon')");
+    Model::PutSetting(store, Model::kFaultsSetting,
+                      R"([{"operation": "TvkCtl_Exec", "object": "/etc/init.d/quilld", )"
+                      R"("message": "no daemon"}])");
   });
   Model::Store::CloseHost();
   EXPECT_EQ(1, TvkCtl::Util::TvkCtl_Exec(command, false, true, false));

@@ -40,8 +40,8 @@ using TvkCtl::Network::IpSecConfigImpl;
 using TvkCtl::Network::RoutingInfoImpl;
 
 const char* const kHostRows = R"sql(
-INSERT INTO netstack(key, ord, name) VALUES('defaultTcpipStack', 0, 'defaultTcpipStack'),
-  ('ops', 1, 'ops');
+INSERT INTO netstack(key, ord, name, state) VALUES('defaultTcpipStack', 0, 'defaultTcpipStack', 4660),
+  ('ops', 1, 'ops', 4660);
 INSERT INTO tvknic(name, ord, netstack, mac, system, ipv4_mode, ipv4_address, ipv4_netmask) VALUES
   ('vmk0', 0, 'defaultTcpipStack', '00:50:56:60:00:01', 0, 'static', '10.0.0.5', '255.255.255.0'),
   ('vmk1', 1, 'defaultTcpipStack', '00:50:56:60:00:02', 0, 'static', '10.0.0.77', '255.255.0.0'),
@@ -49,11 +49,11 @@ INSERT INTO tvknic(name, ord, netstack, mac, system, ipv4_mode, ipv4_address, ip
   ('vmk9', 3, 'defaultTcpipStack', '00:50:56:60:00:09', 1, 'static', '169.254.1.1', '255.255.0.0');
 INSERT INTO tvknic_ipv6(nic, address, prefix, ord) VALUES('vmk0', '2001:db8:1::5', 64, 0);
 INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) VALUES
-  (4, 'vmk1', '10.0.9.9', '00:50:56:aa:00:02', 300, 1, 0),
-  (4, 'vmk0', '10.0.0.1', '00:50:56:aa:00:01', 1200, 1, 0),
-  (6, 'vmk0', '2001:db8:1::1', '00:50:56:aa:00:01', 30, 4, 2),
-  (4, 'vmk2', '172.16.0.1', '00:50:56:aa:00:03', 20, 2, 0),
-  (4, 'vmk9', '169.254.1.2', '00:50:56:aa:00:09', 0, 3, 0);
+  (4, 'vmk1', 0x0A000909, '00:50:56:aa:00:02', 300, 1, 0),
+  (4, 'vmk0', 0x0A000001, '00:50:56:aa:00:01', 1200, 1, 0),
+  (6, 'vmk0', X'20010DB8000100000000000000000001', '00:50:56:aa:00:01', 30, 4, 2),
+  (4, 'vmk2', 0xAC100001, '00:50:56:aa:00:03', 20, 2, 0),
+  (4, 'vmk9', 0xA9FE0102, '00:50:56:aa:00:09', 0, 3, 0);
 INSERT INTO ipsvc_world(id, name) VALUES(2101, 'sshd');
 INSERT INTO world(id, name) VALUES(3300, 'vm-web01');
 INSERT INTO ipsvc_connection(netstack, protocol, local_address, local_port, foreign_address,
@@ -266,7 +266,7 @@ TEST_F(IpServicesTest, DnsChangesOfTwoWritersAreBothKept) {
 }
 
 TEST_F(IpServicesTest, HostsEntriesAreCheckedAndSystemEntriesStayHidden) {
-  Exec("INSERT INTO ipsvc_hosts(address, hostname, system) VALUES('127.0.0.1', 'localhost', 1)");
+  Exec("INSERT INTO ipsvc_hosts(address, hostname, system) VALUES(0x7F000001, 'localhost', 1)");
   HostsFile hosts;
   hosts.AddEntryFromUser("10.0.0.20", "build01.lab.example", {"build01", "ci", "b1"}, "");
   hosts.AddEntryFromUser("2001:DB8::20", "build02", {}, "second builder");
@@ -431,8 +431,9 @@ TEST_F(IpServicesTest, PoliciesLoseTheirSaWhenItIsRemoved) {
 }
 
 TEST_F(IpServicesTest, FaultsDeclaredForAnOperationAreThrown) {
-  Exec("INSERT INTO fault(operation, object, message) VALUES('GetCurrentTarvikRoutes', "
-       "'defaultTcpipStack', 'routing table unreadable')");
+  Exec("INSERT INTO setting(key, value) VALUES('faults', '[{\"operation\": "
+       "\"GetCurrentTarvikRoutes\", \"object\": \"defaultTcpipStack\", \"message\": "
+       "\"routing table unreadable\"}]')");
   Model::Store::CloseHost();
   RoutingInfoImpl routing("defaultTcpipStack");
   ExpectRefused([&] { routing.GetCurrentTarvikRoutes(PortsetGetRegular); },

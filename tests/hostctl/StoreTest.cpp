@@ -370,14 +370,14 @@ std::vector<std::string> Column(Model::Store& store, const char* sql) {
   return values;
 }
 
-// A host written by the release before layout 2 (a write-ahead log, resolver
+// A host written by the first release (layout 1: a write-ahead log, resolver
 // tables that SQLite 3.40's integrity check misreads) is brought up to date
 // when it is first opened, and stays the same host.
 TEST_F(StoreTest, UpgradesAFileOfTheLayoutBefore) {
   std::system(("cp " HOSTCTL_FIXTURES "/layout1.db " + path_).c_str());
   {
     Model::Store old(path_);
-    EXPECT_EQ(Column(old, "PRAGMA user_version"), std::vector<std::string>{"2"});
+    EXPECT_EQ(Column(old, "PRAGMA user_version"), std::vector<std::string>{"3"});
     EXPECT_EQ(Column(old, "PRAGMA journal_mode"), std::vector<std::string>{"delete"});
     EXPECT_EQ(Column(old, "PRAGMA integrity_check"), std::vector<std::string>{"ok"});
     EXPECT_TRUE(Column(old, "PRAGMA foreign_key_check").empty());

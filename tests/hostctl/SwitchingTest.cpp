@@ -65,8 +65,8 @@ protected:
   void AttachTvknic(const std::string& group) {
     Model::Store& store = Model::Store::Host();
     store.Write([&] {
-      store.Exec("INSERT OR IGNORE INTO netstack(key, ord, name) "
-                 "VALUES('defaultTcpipStack', 0, 'defaultTcpipStack')");
+      store.Exec("INSERT OR IGNORE INTO netstack(key, ord, name, state) "
+                 "VALUES('defaultTcpipStack', 0, 'defaultTcpipStack', 4660)");
       int64_t port = Model::AllocatePortId(store);
       store
           .Prepare("INSERT INTO port(id, portset_id, portgroup_id, client_kind, client) "

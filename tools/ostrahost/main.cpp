@@ -24,8 +24,10 @@
 #include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
+#include <memory>
 #include <new>
 #include <string>
+#include <string_view>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <utility>
@@ -91,13 +93,38 @@ int64_t ParseSize(const std::string& text) {
   }
 }
 
-/// Reads \p file ("-": standard input) into \p text, at most \p limit bytes;
-/// "" on success, else the reason.
-std::string ReadLimited(const std::string& file, int64_t limit, std::string& text) {
+/// The refusal of input beyond the import limit.
+std::string TooLarge(const std::string& file, int64_t limit) {
+  return (file == "-" ? std::string("the standard input") : file) +
+         " holds more than the import limit of " + std::to_string(limit) +
+         " bytes (raise it with --max-size)";
+}
+
+/// Opens \p file ("-": standard input) for reading from its start as often as
+/// needed, refusing more than \p limit bytes; "" on success, else the reason.
+/// A regular file is read in place; anything else (a pipe, a device) is
+/// copied to a temporary file first, at most \p limit bytes of it.
+std::string OpenLimited(const std::string& file, int64_t limit, std::FILE*& out) {
   int fd = file == "-" ? 0 : ::open(file.c_str(), O_RDONLY | O_CLOEXEC);
   if (fd < 0)
     return "cannot read " + file + ": " + std::strerror(errno);
+  struct stat st {};
+  if (::fstat(fd, &st) == 0 && S_ISREG(st.st_mode) && fd != 0) {
+    if (st.st_size > limit) {
+      ::close(fd);
+      return TooLarge(file, limit);
+    }
+    out = ::fdopen(fd, "r");
+    return out ? "" : "cannot read " + file + ": " + std::strerror(errno);
+  }
+  std::FILE* copy = std::tmpfile();
+  if (!copy) {
+    if (fd != 0)
+      ::close(fd);
+    return std::string("cannot make a temporary file: ") + std::strerror(errno);
+  }
   std::string problem;
+  int64_t total = 0;
   char buffer[1 << 16];
   for (;;) {
     ssize_t got = ::read(fd, buffer, sizeof buffer);
@@ -109,17 +136,26 @@ std::string ReadLimited(const std::string& file, int64_t limit, std::string& tex
     }
     if (got == 0)
       break;
-    if (static_cast<int64_t>(text.size()) + got > limit) {
-      problem = (file == "-" ? std::string("the standard input") : file) +
-                " holds more than the import limit of " + std::to_string(limit) +
-                " bytes (raise it with --max-size)";
+    total += got;
+    if (total > limit) {
+      problem = TooLarge(file, limit);
       break;
     }
-    text.append(buffer, static_cast<std::size_t>(got));
+    if (std::fwrite(buffer, 1, static_cast<std::size_t>(got), copy) !=
+        static_cast<std::size_t>(got)) {
+      problem = std::string("cannot write a temporary file: ") + std::strerror(errno);
+      break;
+    }
   }
   if (fd != 0)
     ::close(fd);
-  return problem;
+  if (!problem.empty()) {
+    std::fclose(copy);
+    return problem;
+  }
+  std::rewind(copy);
+  out = copy;
+  return "";
 }
 
 /// Makes \p path's directory entry durable.
@@ -162,14 +198,14 @@ template <typename Fill> void CreateHost(const std::string& path, Fill&& fill) {
   SyncDirectory(path);
 }
 
-/// Creates \p path from \p host, or replaces the host it holds.
-void WriteHost(const std::string& path, const nlohmann::ordered_json& host) {
+/// Creates \p path by \p import, or replaces the host it holds.
+template <typename Import> void WriteHost(const std::string& path, Import&& import) {
   if (Exists(path)) {
     Model::Store store(path);
-    Model::ImportHost(store, host);
+    import(store);
     return;
   }
-  CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, host); });
+  CreateHost(path, import);
 }
 
 /// Reads a non-negative count; false when \p text is not one.
@@ -184,6 +220,130 @@ bool ParseCount(const std::string& text, int64_t& value) {
 void WriteGeneratedHost(const std::string& path, const Model::HostSizes& sizes) {
   Model::CheckHostSizes(sizes);
   CreateHost(path, [&](Model::Store& store) { Model::GenerateHost(store, sizes); });
+}
+
+/// The command line, parsed once for every command.
+struct Options {
+  std::vector<std::string> positional;   ///< Arguments that are no options.
+  std::string host;                      ///< --host.
+  std::string profile = "demo";          ///< --profile.
+  Model::HostSizes sizes;                ///< generate's sizes.
+  bool sized = false;                    ///< A size was given.
+  int64_t maxImport = kDefaultMaxImport; ///< --max-size.
+  bool limited = false;                  ///< --max-size was given.
+};
+
+int RunInit(const Options& options) {
+  const std::string& path = options.positional[0];
+  if (Exists(path))
+    return Fail("the file " + path + " exists already");
+  // Always a new file: another init may make the same path meanwhile,
+  // and its host must not be replaced (WriteHost would import into it).
+  nlohmann::ordered_json description = Model::Profile(options.profile);
+  CreateHost(path, [&](Model::Store& store) { Model::ImportHost(store, description); });
+  return 0;
+}
+
+int RunGenerate(const Options& options) {
+  const std::string& path = options.positional[0];
+  if (Exists(path))
+    return Fail("the file " + path + " exists already");
+  WriteGeneratedHost(path, options.sizes);
+  return 0;
+}
+
+int RunImport(const Options& options) {
+  std::FILE* file = nullptr;
+  if (std::string problem = OpenLimited(options.positional[0], options.maxImport, file);
+      !problem.empty())
+    return Fail(problem);
+  std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, std::fclose);
+  // The description is checked whole before the host is touched, then read
+  // again as it is imported: the large arrays are never in memory whole.
+  nlohmann::ordered_json description = Model::ReadDescription(file);
+  WriteHost(HostPath(options.host),
+            [&](Model::Store& store) { Model::ImportHost(store, description, file); });
+  return 0;
+}
+
+/// A write to standard output failed (errno tells why).
+struct OutputFailed {};
+
+int RunExport(const Options& options) {
+  Model::Store store(HostPath(options.host));
+  try {
+    Model::WriteHostDescription(store, [](std::string_view text) {
+      if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size())
+        throw OutputFailed{};
+    });
+    if (std::fflush(stdout) != 0)
+      throw OutputFailed{};
+  } catch (const OutputFailed&) {
+    return Fail(std::string("cannot write the output: ") + std::strerror(errno));
+  }
+  return 0;
+}
+
+int RunProfile(const Options& options) {
+  return Write(Model::Profile(options.positional[0]).dump(2) + "\n");
+}
+
+/// One command of ostrahost (Usage.cpp describes them to the user).
+struct Subcommand {
+  const char* name;       ///< First word of the command line.
+  std::size_t positional; ///< Arguments it takes.
+  const char* misuse;     ///< Its refusal of another number of arguments.
+  int (*run)(const Options& options);
+};
+
+const Subcommand kSubcommands[] = {
+    {"init", 1, "init takes one PATH", RunInit},
+    {"generate", 1, "generate takes one PATH", RunGenerate},
+    {"import", 1, "import takes one FILE", RunImport},
+    {"export", 0, "export takes no arguments", RunExport},
+    {"profile", 1, "profile takes one NAME", RunProfile},
+};
+
+/// Reads the options after the command word into \p options; "" on success,
+/// else the refusal.
+std::string ParseOptions(const std::vector<std::string>& args, Options& options) {
+  Model::HostSizes& sizes = options.sizes;
+  const std::pair<const char*, int64_t*> sizeOptions[] = {
+      {"--routes", &sizes.routes},
+      {"--portgroups", &sizes.portgroups},
+      {"--vms", &sizes.vms},
+      {"--ports-per-vm", &sizes.portsPerVm},
+      {"--neighbours", &sizes.neighbours},
+      {"--hosts-entries", &sizes.hostsEntries},
+  };
+  for (std::size_t i = 1; i < args.size(); ++i) {
+    const std::string& arg = args[i];
+    int64_t* size = nullptr;
+    for (const auto& [name, target] : sizeOptions)
+      if (arg == name)
+        size = target;
+    bool takesValue = size || arg == "--host" || arg == "--profile" || arg == "--max-size";
+    if (takesValue && i + 1 >= args.size())
+      return "option " + arg + " requires a value";
+    if (size) {
+      if (!ParseCount(args[++i], *size))
+        return "option " + arg + " takes a count, not \"" + args[i] + "\"";
+      options.sized = true;
+    } else if (arg == "--host" || arg == "--profile") {
+      (arg == "--host" ? options.host : options.profile) = args[++i];
+    } else if (arg == "--max-size") {
+      options.maxImport = ParseSize(args[++i]);
+      if (options.maxImport < 0)
+        return "option --max-size takes a size in bytes with an optional K, M or G, not \"" +
+               args[i] + "\"";
+      options.limited = true;
+    } else if (arg.size() > 1 && arg[0] == '-' && arg != "-") {
+      return "unknown option " + arg;
+    } else {
+      options.positional.push_back(arg);
+    }
+  }
+  return "";
 }
 
 } // namespace
@@ -201,99 +361,24 @@ int main(int argc, char** argv) {
     std::fwrite(text.data(), 1, text.size(), stdout);
     return 0;
   }
-  std::string command = args[0];
-  std::vector<std::string> positional;
-  std::string host, profile = "demo";
-  Model::HostSizes sizes;
-  const std::pair<const char*, int64_t*> sizeOptions[] = {
-      {"--routes", &sizes.routes},
-      {"--portgroups", &sizes.portgroups},
-      {"--vms", &sizes.vms},
-      {"--ports-per-vm", &sizes.portsPerVm},
-      {"--neighbours", &sizes.neighbours},
-      {"--hosts-entries", &sizes.hostsEntries},
-  };
-  bool sized = false;
-  int64_t maxImport = kDefaultMaxImport;
-  bool limited = false;
-  for (std::size_t i = 1; i < args.size(); ++i) {
-    const std::string& arg = args[i];
-    int64_t* size = nullptr;
-    for (const auto& [name, target] : sizeOptions)
-      if (arg == name)
-        size = target;
-    if (size) {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      if (!ParseCount(args[++i], *size))
-        return Usage("option " + arg + " takes a count, not \"" + args[i] + "\"");
-      sized = true;
-    } else if (arg == "--host" || arg == "--profile") {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      (arg == "--host" ? host : profile) = args[++i];
-    } else if (arg == "--max-size") {
-      if (i + 1 >= args.size())
-        return Usage("option " + arg + " requires a value");
-      maxImport = ParseSize(args[++i]);
-      if (maxImport < 0)
-        return Usage("option --max-size takes a size in bytes with an optional K, M or G, not \"" +
-                     args[i] + "\"");
-      limited = true;
-    } else if (arg.size() > 1 && arg[0] == '-' && arg != "-") {
-      return Usage("unknown option " + arg);
-    } else {
-      positional.push_back(arg);
-    }
-  }
-  if (sized && command != "generate")
+  const std::string& command = args[0];
+  Options options;
+  if (std::string refusal = ParseOptions(args, options); !refusal.empty())
+    return Usage(refusal);
+  if (options.sized && command != "generate")
     return Usage("only generate takes sizes");
-  if (limited && command != "import")
+  if (options.limited && command != "import")
     return Usage("only import takes --max-size");
-  try {
-    if (command == "init") {
-      if (positional.size() != 1)
-        return Usage("init takes one PATH");
-      if (Exists(positional[0]))
-        return Fail("the file " + positional[0] + " exists already");
-      // Always a new file: another init may make the same path meanwhile,
-      // and its host must not be replaced (WriteHost would import into it).
-      nlohmann::ordered_json description = Model::Profile(profile);
-      CreateHost(positional[0], [&](Model::Store& store) { Model::ImportHost(store, description); });
-      return 0;
-    }
-    if (command == "generate") {
-      if (positional.size() != 1)
-        return Usage("generate takes one PATH");
-      if (Exists(positional[0]))
-        return Fail("the file " + positional[0] + " exists already");
-      WriteGeneratedHost(positional[0], sizes);
-      return 0;
-    }
-    if (command == "import") {
-      if (positional.size() != 1)
-        return Usage("import takes one FILE");
-      std::string text;
-      if (std::string problem = ReadLimited(positional[0], maxImport, text); !problem.empty())
-        return Fail(problem);
-      nlohmann::ordered_json doc = Model::ParseDescription(text);
-      text = std::string();
-      WriteHost(HostPath(host), doc);
-      return 0;
-    }
-    if (command == "export") {
-      if (!positional.empty())
-        return Usage("export takes no arguments");
-      Model::Store store(HostPath(host));
-      std::string text = Model::ExportHost(store).dump(2) + "\n";
-      return Write(text);
-    }
-    if (command == "profile") {
-      if (positional.size() != 1)
-        return Usage("profile takes one NAME");
-      return Write(Model::Profile(positional[0]).dump(2) + "\n");
-    }
+  const Subcommand* subcommand = nullptr;
+  for (const Subcommand& candidate : kSubcommands)
+    if (command == candidate.name)
+      subcommand = &candidate;
+  if (!subcommand)
     return Usage("unknown command " + command);
+  if (options.positional.size() != subcommand->positional)
+    return Usage(subcommand->misuse);
+  try {
+    return subcommand->run(options);
   } catch (const Model::ImportError& e) {
     return Fail(std::string("invalid host description: ") + e.what());
   } catch (const HostCtl::Lib::HostCtlException& e) {

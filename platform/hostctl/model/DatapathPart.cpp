@@ -39,46 +39,11 @@ using nlohmann::ordered_json;
 namespace {
 
 const char* const kDatapathSchema = R"sql(
--- VM ports (rows of port with client_kind 'vm'): the adapter's IPv4 address
--- and the uplink the team scheduler chose ('' for none).
-CREATE TABLE vm_port(
-  port_id INTEGER PRIMARY KEY REFERENCES port(id) ON DELETE CASCADE,
-  ipv4 TEXT NOT NULL DEFAULT '0.0.0.0',
-  team_uplink TEXT NOT NULL DEFAULT ''
-);
-
 -- MAC addresses of a VM port's adapter, in order.
 CREATE TABLE vm_port_mac(
   port_id INTEGER NOT NULL REFERENCES port(id) ON DELETE CASCADE,
   ord INTEGER NOT NULL,
   mac TEXT NOT NULL,
-  PRIMARY KEY(port_id, ord)
-) WITHOUT ROWID;
-
--- Counters of a port (unsigned 64-bit values kept in signed columns). A port
--- without a row has all counters zero.
-CREATE TABLE port_counter(
-  port_id INTEGER PRIMARY KEY REFERENCES port(id) ON DELETE CASCADE,
-  rx_bytes INTEGER NOT NULL DEFAULT 0, tx_bytes INTEGER NOT NULL DEFAULT 0,
-  rx_packets INTEGER NOT NULL DEFAULT 0, rx_multicast INTEGER NOT NULL DEFAULT 0,
-  rx_broadcast INTEGER NOT NULL DEFAULT 0, tx_packets INTEGER NOT NULL DEFAULT 0,
-  tx_multicast INTEGER NOT NULL DEFAULT 0, tx_broadcast INTEGER NOT NULL DEFAULT 0,
-  rx_dropped INTEGER NOT NULL DEFAULT 0, tx_dropped INTEGER NOT NULL DEFAULT 0
-);
-
--- Packet filters of a port, in the host's order, with their counters.
-CREATE TABLE port_filter(
-  port_id INTEGER NOT NULL REFERENCES port(id) ON DELETE CASCADE,
-  ord INTEGER NOT NULL,
-  name TEXT NOT NULL,
-  sort_key TEXT NOT NULL DEFAULT '',
-  active INTEGER NOT NULL DEFAULT 1,
-  direction INTEGER NOT NULL DEFAULT 0,
-  extended INTEGER NOT NULL DEFAULT 0,
-  packets_in INTEGER NOT NULL DEFAULT 0, packets_out INTEGER NOT NULL DEFAULT 0,
-  packets_dropped INTEGER NOT NULL DEFAULT 0, packets_filtered INTEGER NOT NULL DEFAULT 0,
-  packets_faulted INTEGER NOT NULL DEFAULT 0, packets_queued INTEGER NOT NULL DEFAULT 0,
-  packets_injected INTEGER NOT NULL DEFAULT 0, packet_errors INTEGER NOT NULL DEFAULT 0,
   PRIMARY KEY(port_id, ord)
 ) WITHOUT ROWID;
 
@@ -88,7 +53,6 @@ CREATE TABLE ens_lcore(
   portset_id INTEGER REFERENCES portset(id) ON DELETE SET NULL,
   affinity INTEGER NOT NULL DEFAULT 0
 );
-CREATE INDEX ens_lcore_by_portset ON ens_lcore(portset_id);
 )sql";
 
 void ImportEns(const JsonObject& root, Store& store) {
@@ -121,10 +85,11 @@ void ImportEns(const JsonObject& root, Store& store) {
     if (lcore.Has("switch")) {
       std::string name = lcore.String("switch");
       Statement portset = store.Prepare("SELECT id FROM portset WHERE name = ?");
+      enum { kId };
       portset.Bind(1, name);
       if (!portset.Step())
         lcore.Fail("switch", "there is no switch named \"" + name + "\"");
-      insert.Bind(2, portset.Int(0));
+      insert.Bind(2, portset.Int(kId));
     }
     insert.Run();
   }
@@ -140,25 +105,25 @@ void ExportEns(ordered_json& host, Store& store) {
   ordered_json lcores = ordered_json::array();
   Statement rows = store.Prepare("SELECT l.id, p.name, l.affinity FROM ens_lcore l "
                                  "LEFT JOIN portset p ON p.id = l.portset_id ORDER BY l.id");
+  enum { kId, kName, kAffinity };
   while (rows.Step()) {
-    ordered_json lcore = {{"id", rows.Int(0)}};
-    if (!rows.IsNull(1))
-      lcore["switch"] = rows.Text(1);
-    lcore["affinity"] = rows.Int(2);
+    ordered_json lcore = {{"id", rows.Int(kId)}};
+    if (!rows.IsNull(kName))
+      lcore["switch"] = rows.Text(kName);
+    lcore["affinity"] = rows.Int(kAffinity);
     lcores.push_back(std::move(lcore));
   }
   ens["lcores"] = std::move(lcores);
   host["ens"] = std::move(ens);
 }
 
-/// Description keys of a port's counters, in the column order of
-/// port_counter.
+/// Description keys of a port's counters, in the order of the counter
+/// columns of port.
 const char* const kCounterKeys[] = {"rxBytes",     "txBytes",   "rxPackets",   "rxMulticast",
                                     "rxBroadcast", "txPackets", "txMulticast", "txBroadcast",
                                     "rxDropped",   "txDropped"};
 
-/// Description keys of a filter's counters, in the column order of
-/// port_filter.
+/// Description keys of a filter's counters.
 const char* const kFilterCounterKeys[] = {"packetsIn",       "packetsOut",     "packetsDropped",
                                           "packetsFiltered", "packetsFaulted", "packetsQueued",
                                           "packetsInjected", "packetErrors"};
@@ -195,27 +160,30 @@ PortPlace PlacePort(const JsonObject& port, Store& store) {
   PortPlace place;
   std::string name = port.String("switch");
   Statement portset = store.Prepare("SELECT id, kind FROM portset WHERE name = ?");
+  enum { kId, kKind };
   portset.Bind(1, name);
   if (!portset.Step())
     port.Fail("switch", "there is no switch named \"" + name + "\"");
-  place.portsetId = portset.Int(0);
-  if (portset.Text(1) == "standard") {
+  place.portsetId = portset.Int(kId);
+  if (portset.Text(kKind) == "standard") {
     std::string group = port.String("portgroup");
     Statement pg = store.Prepare("SELECT id FROM portgroup WHERE name = ? AND portset_id = ?");
+    enum { kPgId };
     pg.BindAll(group, place.portsetId);
     if (!pg.Step())
       port.Fail("portgroup", "switch \"" + name + "\" has no port group \"" + group + "\"");
-    place.pg = pg.Int(0);
+    place.pg = pg.Int(kPgId);
     if (port.Has("dvport"))
       port.Fail("dvport", "a port on a standard switch has no distributed port");
   } else {
     std::string key = port.String("dvport");
     Statement dv =
         store.Prepare("SELECT is_uplink FROM dvport WHERE portset_id = ? AND port_key = ?");
+    enum { kIsUplink };
     dv.BindAll(place.portsetId, key);
     if (!dv.Step())
       port.Fail("dvport", "switch \"" + name + "\" has no distributed port \"" + key + "\"");
-    if (dv.Bool(0))
+    if (dv.Bool(kIsUplink))
       port.Fail("dvport", "distributed port \"" + key + "\" is an uplink port");
     Statement used = store.Prepare("SELECT 1 FROM port WHERE portset_id = ? AND dvport_key = ?");
     used.BindAll(place.portsetId, key);
@@ -259,8 +227,8 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
     if (!up.Step())
       port.Fail("teamUplink", "\"" + uplink + "\" is no uplink of the port's switch");
   }
-  store.Prepare("INSERT INTO vm_port(port_id, ipv4, team_uplink) VALUES(?, ?, ?)")
-      .BindAll(id, ipv4, uplink)
+  store.Prepare("UPDATE port SET ipv4 = ?, team_uplink = ? WHERE id = ?")
+      .BindAll(static_cast<int64_t>(HostCtl::Network::Ipv4Address(ipv4).GetValue()), uplink, id)
       .Run();
   int ord = 0;
   for (const std::string& mac : port.Strings("macs")) {
@@ -273,13 +241,13 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
   if (std::optional<JsonObject> stats = port.Object("stats")) {
     CheckPlainKeys(*stats, kCounterKeys);
     Statement counters = store.Prepare(
-        "INSERT INTO port_counter(port_id, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
-        "rx_broadcast, tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped) "
-        "VALUES(?,?,?,?,?,?,?,?,?,?,?)");
-    counters.Bind(1, id);
-    int column = 2;
+        "UPDATE port SET rx_bytes = ?, tx_bytes = ?, rx_packets = ?, rx_multicast = ?, "
+        "rx_broadcast = ?, tx_packets = ?, tx_multicast = ?, tx_broadcast = ?, rx_dropped = ?, "
+        "tx_dropped = ? WHERE id = ?");
+    int column = 1;
     for (const char* key : kCounterKeys)
       counters.Bind(column++, ReadCounter(*stats, key));
+    counters.Bind(column, id);
     // Multicast and broadcast packets are part of all packets, so that the
     // unicast count (the rest) is never negative.
     for (const char* direction : {"rx", "tx"}) {
@@ -292,20 +260,20 @@ void ImportPort(const JsonObject& port, Store& store, int64_t worldId, const std
     }
     counters.Run();
   }
-  int filterOrd = 0;
+  // The packet filters, in the host's order, as the description has them.
+  ordered_json filters = ordered_json::array();
   for (const JsonObject& filter : port.Objects("filters")) {
-    Statement insertFilter = store.Prepare(
-        "INSERT INTO port_filter(port_id, ord, name, sort_key, active, direction, extended, "
-        "packets_in, packets_out, packets_dropped, packets_filtered, packets_faulted, "
-        "packets_queued, packets_injected, packet_errors) VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
-    insertFilter.BindAll(id, filterOrd++, filter.String("name"), filter.String("sortKey", ""),
-                         filter.Bool("active", true), filter.Bool("outbound", false),
-                         filter.Bool("extended", false));
-    int column = 8;
+    ordered_json f = {{"name", filter.String("name")},
+                      {"sortKey", filter.String("sortKey", "")},
+                      {"active", filter.Bool("active", true)},
+                      {"outbound", filter.Bool("outbound", false)},
+                      {"extended", filter.Bool("extended", false)}};
     for (const char* key : kFilterCounterKeys)
-      insertFilter.Bind(column++, ReadCounter(filter, key));
-    insertFilter.Run();
+      f[key] = static_cast<uint64_t>(ReadCounter(filter, key));
+    filters.push_back(std::move(f));
   }
+  if (!filters.empty())
+    store.Prepare("UPDATE port SET filters = ? WHERE id = ?").BindAll(filters.dump(), id).Run();
 }
 
 void ImportVms(const JsonObject& root, Store& store) {
@@ -323,29 +291,42 @@ void ImportVms(const JsonObject& root, Store& store) {
   }
 }
 
+/// The ports of one VM, in the columns ExportPort reads.
+constexpr const char* kVmPortsSql =
+    "SELECT p.id, s.name, g.name, p.dvport_key, p.port_type FROM port p "
+    "JOIN portset s ON s.id = p.portset_id LEFT JOIN portgroup g ON g.id = p.portgroup_id "
+    "WHERE p.world_id = ? AND p.client_kind = 'vm' ORDER BY p.id";
+enum VmPortColumn { kPortId, kPortSwitch, kPortGroup, kPortDvport, kPortType };
+
+/// One row of kVmPortsSql as the host description holds it.
 ordered_json ExportPort(Store& store, const Statement& port) {
-  int64_t id = port.Int(0);
-  ordered_json out = {{"id", id}, {"switch", port.Text(1)}};
-  if (!port.IsNull(2))
-    out["portgroup"] = port.Text(2);
-  if (!port.IsNull(3))
-    out["dvport"] = port.Text(3);
-  out["type"] = port.Int(4);
+  int64_t id = port.Int(kPortId);
+  ordered_json out = {{"id", id}, {"switch", port.Text(kPortSwitch)}};
+  if (!port.IsNull(kPortGroup))
+    out["portgroup"] = port.Text(kPortGroup);
+  if (!port.IsNull(kPortDvport))
+    out["dvport"] = port.Text(kPortDvport);
+  out["type"] = port.Int(kPortType);
   ordered_json macs = ordered_json::array();
   Statement mac = store.Prepare("SELECT mac FROM vm_port_mac WHERE port_id = ? ORDER BY ord");
+  enum { kMac };
   mac.Bind(1, id);
   while (mac.Step())
-    macs.push_back(mac.Text(0));
+    macs.push_back(mac.Text(kMac));
   out["macs"] = std::move(macs);
-  Statement vmPort = store.Prepare("SELECT ipv4, team_uplink FROM vm_port WHERE port_id = ?");
+  Statement vmPort =
+      store.Prepare("SELECT ipv4, team_uplink FROM port WHERE id = ? AND ipv4 IS NOT NULL");
+  enum { kIpv4, kTeamUplink };
   vmPort.Bind(1, id);
   if (vmPort.Step()) {
-    out["ipv4"] = vmPort.Text(0);
-    out["teamUplink"] = vmPort.Text(1);
+    out["ipv4"] =
+        HostCtl::Network::Ipv4Address(static_cast<uint32_t>(vmPort.Int(kIpv4))).GetStringAddress();
+    out["teamUplink"] = vmPort.Text(kTeamUplink);
   }
   Statement counters = store.Prepare(
       "SELECT rx_bytes, tx_bytes, rx_packets, rx_multicast, rx_broadcast, tx_packets, "
-      "tx_multicast, tx_broadcast, rx_dropped, tx_dropped FROM port_counter WHERE port_id = ?");
+      "tx_multicast, tx_broadcast, rx_dropped, tx_dropped FROM port WHERE id = ? "
+      "AND rx_bytes IS NOT NULL");
   counters.Bind(1, id);
   if (counters.Step()) {
     ordered_json stats = ordered_json::object();
@@ -354,23 +335,12 @@ ordered_json ExportPort(Store& store, const Statement& port) {
       stats[key] = static_cast<uint64_t>(counters.Int(column++));
     out["stats"] = std::move(stats);
   }
-  ordered_json filters = ordered_json::array();
-  Statement filter = store.Prepare(
-      "SELECT name, sort_key, active, direction, extended, packets_in, packets_out, "
-      "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
-      "packet_errors FROM port_filter WHERE port_id = ? ORDER BY ord");
+  Statement filter = store.Prepare("SELECT filters FROM port WHERE id = ?");
+  enum { kFilters };
   filter.Bind(1, id);
-  while (filter.Step()) {
-    ordered_json f = {{"name", filter.Text(0)},
-                      {"sortKey", filter.Text(1)},
-                      {"active", filter.Bool(2)},
-                      {"outbound", filter.Bool(3)},
-                      {"extended", filter.Bool(4)}};
-    int column = 5;
-    for (const char* key : kFilterCounterKeys)
-      f[key] = static_cast<uint64_t>(filter.Int(column++));
-    filters.push_back(std::move(f));
-  }
+  ordered_json filters = filter.Step() && !filter.IsNull(kFilters)
+                             ? ordered_json::parse(filter.Text(kFilters))
+                             : ordered_json::array();
   out["filters"] = std::move(filters);
   return out;
 }
@@ -378,17 +348,15 @@ ordered_json ExportPort(Store& store, const Statement& port) {
 void ExportVms(ordered_json& host, Store& store) {
   ordered_json vms = ordered_json::array();
   Statement world = store.Prepare("SELECT id, name FROM world ORDER BY id");
+  enum { kId, kName };
   while (world.Step()) {
-    int64_t worldId = world.Int(0);
+    int64_t worldId = world.Int(kId);
     ordered_json ports = ordered_json::array();
-    Statement port = store.Prepare(
-        "SELECT p.id, s.name, g.name, p.dvport_key, p.port_type FROM port p "
-        "JOIN portset s ON s.id = p.portset_id LEFT JOIN portgroup g ON g.id = p.portgroup_id "
-        "WHERE p.world_id = ? AND p.client_kind = 'vm' ORDER BY p.id");
+    Statement port = store.Prepare(kVmPortsSql);
     port.Bind(1, worldId);
     while (port.Step())
       ports.push_back(ExportPort(store, port));
-    vms.push_back({{"worldId", worldId}, {"name", world.Text(1)}, {"ports", std::move(ports)}});
+    vms.push_back({{"worldId", worldId}, {"name", world.Text(kName)}, {"ports", std::move(ports)}});
   }
   if (!vms.empty())
     host["vms"] = std::move(vms);
@@ -400,7 +368,7 @@ void ImportDatapath(const ordered_json& host, Store& store) {
   ImportEns(root, store);
 }
 
-void ExportDatapath(ordered_json& host, Store& store) {
+void ExportDatapath(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ExportVms(host, store);
   ExportEns(host, store);
 }

@@ -35,28 +35,23 @@ const char* const kFirewallSchema = R"sql(
 -- Kernel modules of the host and whether they are loaded.
 CREATE TABLE kmodule(
   name TEXT PRIMARY KEY,
-  loaded INTEGER NOT NULL DEFAULT 0,
+  loaded INTEGER NOT NULL,
   options TEXT NOT NULL DEFAULT ''
 ) WITHOUT ROWID;
 
--- The firewall's global state (one row). `filters_active` tells whether the
--- filters built from the rulesets are in place.
-CREATE TABLE fw_state(
-  id INTEGER PRIMARY KEY CHECK(id = 1),
-  enabled INTEGER NOT NULL,
-  default_pass INTEGER NOT NULL,
-  filters_active INTEGER NOT NULL
-);
+-- The firewall's global state is kept in `setting`: "firewall.enabled",
+-- "firewall.defaultPass" and "firewall.filtersActive" (whether the filters
+-- built from the rulesets are in place), each 0 or 1.
 
 -- Rulesets by label, in the host's order.
 CREATE TABLE fw_ruleset(
   id TEXT PRIMARY KEY,
   ord INTEGER NOT NULL,
-  enabled INTEGER NOT NULL DEFAULT 0,
-  allowed_all INTEGER NOT NULL DEFAULT 1,
-  enable_fixed INTEGER NOT NULL DEFAULT 0,
-  allowed_ip_fixed INTEGER NOT NULL DEFAULT 0,
-  clients INTEGER NOT NULL DEFAULT 0
+  enabled INTEGER NOT NULL,
+  allowed_all INTEGER NOT NULL,
+  enable_fixed INTEGER NOT NULL,
+  allowed_ip_fixed INTEGER NOT NULL,
+  clients INTEGER NOT NULL
 ) WITHOUT ROWID;
 
 -- Port rules of a ruleset, in order (codes as FirewallPortRule has them).
@@ -80,7 +75,6 @@ CREATE TABLE fw_allowed_ip(
   ord INTEGER NOT NULL,
   PRIMARY KEY(ruleset, kind, value)
 ) WITHOUT ROWID;
-CREATE INDEX fw_allowed_ip_by_ord ON fw_allowed_ip(ruleset, ord);
 )sql";
 
 /// A word of the description and the code it stands for.
@@ -139,8 +133,8 @@ void ImportFirewall(const ordered_json& host, Store& store) {
       .BindAll(HostCtl::System::FirewallModuleName, loaded)
       .Run();
   store
-      .Prepare("INSERT INTO fw_state(id, enabled, default_pass, filters_active) "
-               "VALUES(1, ?, ?, ?)")
+      .Prepare("INSERT INTO setting(key, value) VALUES('firewall.enabled', ?), "
+               "('firewall.defaultPass', ?), ('firewall.filtersActive', ?)")
       .BindAll(enabled, pass, filters)
       .Run();
 
@@ -189,44 +183,50 @@ void ImportFirewall(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportFirewall(ordered_json& host, Store& store) {
+void ExportFirewall(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   Statement state =
-      store.Prepare("SELECT m.loaded, s.enabled, s.default_pass, s.filters_active FROM fw_state s "
-                    "JOIN kmodule m ON m.name = ? WHERE s.id = 1");
+      store.Prepare("SELECT m.loaded, e.value AS enabled, p.value AS default_pass, "
+                    "f.value AS filters_active FROM kmodule m, setting e, "
+                    "setting p, setting f WHERE m.name = ? AND e.key = 'firewall.enabled' AND "
+                    "p.key = 'firewall.defaultPass' AND f.key = 'firewall.filtersActive'");
+  enum { kLoaded, kFirewallEnabled, kDefaultPass, kFiltersActive };
   state.Bind(1, HostCtl::System::FirewallModuleName);
   if (state.Step())
-    host["firewall"] = {{"loaded", state.Bool(0)},
-                        {"enabled", state.Bool(1)},
-                        {"defaultAction", state.Bool(2) ? "PASS" : "DROP"},
-                        {"filtersActive", state.Bool(3)}};
+    host["firewall"] = {{"loaded", state.Bool(kLoaded)},
+                        {"enabled", state.Bool(kFirewallEnabled)},
+                        {"defaultAction", state.Bool(kDefaultPass) ? "PASS" : "DROP"},
+                        {"filtersActive", state.Bool(kFiltersActive)}};
   ordered_json sets = ordered_json::array();
   Statement rows =
       store.Prepare("SELECT id, enabled, allowed_all, enable_fixed, allowed_ip_fixed, clients "
                     "FROM fw_ruleset ORDER BY ord");
+  enum { kId, kEnabled, kAllowedAll, kEnableFixed, kAllowedIpFixed, kClients };
   while (rows.Step()) {
-    std::string id = rows.Text(0);
+    std::string id = rows.Text(kId);
     ordered_json set = {{"name", id},
-                        {"enabled", rows.Bool(1)},
-                        {"allowedAll", rows.Bool(2)},
-                        {"enableFixed", rows.Bool(3)},
-                        {"allowedIpFixed", rows.Bool(4)},
-                        {"clients", rows.Int(5)}};
+                        {"enabled", rows.Bool(kEnabled)},
+                        {"allowedAll", rows.Bool(kAllowedAll)},
+                        {"enableFixed", rows.Bool(kEnableFixed)},
+                        {"allowedIpFixed", rows.Bool(kAllowedIpFixed)},
+                        {"clients", rows.Int(kClients)}};
     ordered_json ips = ordered_json::array();
     Statement ip = store.Prepare("SELECT value FROM fw_allowed_ip WHERE ruleset = ? ORDER BY ord");
+    enum { kValue };
     ip.Bind(1, id);
     while (ip.Step())
-      ips.push_back(ip.Text(0));
+      ips.push_back(ip.Text(kValue));
     set["allowedIps"] = std::move(ips);
     ordered_json rules = ordered_json::array();
     Statement rule = store.Prepare("SELECT port_type, port_begin, port_end, direction, protocol "
                                    "FROM fw_rule WHERE ruleset = ? ORDER BY ord");
+    enum { kPortType, kPortBegin, kPortEnd, kDirection, kProtocol };
     rule.Bind(1, id);
     while (rule.Step())
-      rules.push_back({{"portType", WordOf(static_cast<int>(rule.Int(0)), kPortTypes)},
-                       {"portBegin", rule.Int(1)},
-                       {"portEnd", rule.Int(2)},
-                       {"direction", WordOf(static_cast<int>(rule.Int(3)), kDirections)},
-                       {"protocol", WordOf(static_cast<int>(rule.Int(4)), kProtocols)}});
+      rules.push_back({{"portType", WordOf(static_cast<int>(rule.Int(kPortType)), kPortTypes)},
+                       {"portBegin", rule.Int(kPortBegin)},
+                       {"portEnd", rule.Int(kPortEnd)},
+                       {"direction", WordOf(static_cast<int>(rule.Int(kDirection)), kDirections)},
+                       {"protocol", WordOf(static_cast<int>(rule.Int(kProtocol)), kProtocols)}});
     set["rules"] = std::move(rules);
     sets.push_back(std::move(set));
   }
@@ -274,8 +274,9 @@ bool ParseAllowedIp(const std::string& text, AllowedIpEntry& entry) {
 
 bool IsFirewallModuleLoaded(Store& store) {
   Statement row = store.Prepare("SELECT loaded FROM kmodule WHERE name = ?");
+  enum { kLoaded };
   row.Bind(1, HostCtl::System::FirewallModuleName);
-  return row.Step() && row.Bool(0);
+  return row.Step() && row.Bool(kLoaded);
 }
 
 extern const Part kFirewallPart;

@@ -35,14 +35,6 @@ namespace {
 const char* const kRouteNetstack = "defaultTcpipStack";
 const char* const kRouteInterface = "tvk0";
 
-/// Dotted-decimal text of \p address.
-std::string Dotted(uint32_t address) {
-  char text[16];
-  std::snprintf(text, sizeof text, "%u.%u.%u.%u", address >> 24, (address >> 16) & 255,
-                (address >> 8) & 255, address & 255);
-  return text;
-}
-
 /// A unicast MAC address with prefix \p oui (three bytes) and \p serial.
 std::string Mac(uint32_t oui, uint32_t serial) {
   char text[18];
@@ -76,11 +68,10 @@ void GenerateRoutes(Store& store, int64_t count) {
   Statement insert = store.Prepare(
       "INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, interface, "
       "source) VALUES(?, 4, 0, ?, ?, ?, ?, 'user')");
-  const uint32_t base = 0x0A800000; // 10.128.0.0
-  const std::string gateways[] = {"10.20.0.251", "10.20.0.252", "10.20.0.253", "10.20.0.254"};
+  const int64_t base = 0x0A800000;     // 10.128.0.0
+  const int64_t gateways = 0x0A1400FB; // 10.20.0.251 to .254
   for (int64_t i = 0; i < count; ++i) {
-    insert.BindAll(kRouteNetstack, Dotted(base + static_cast<uint32_t>(i * step)), prefix,
-                   gateways[i % 4], kRouteInterface);
+    insert.BindAll(kRouteNetstack, base + i * step, prefix, gateways + i % 4, kRouteInterface);
     insert.Run();
     insert.Reset();
   }
@@ -100,21 +91,23 @@ struct Switch {
 std::vector<Switch> StandardSwitches(Store& store) {
   std::vector<Switch> switches;
   Statement rows = store.Prepare(
-      "SELECT id, name, num_ports, (SELECT count(*) FROM port WHERE portset_id = p.id) "
+      "SELECT id, name, num_ports, (SELECT count(*) FROM port WHERE portset_id = p.id) AS used "
       "FROM portset p WHERE kind = 'standard' AND system = 0 ORDER BY ord");
+  enum { kId, kName, kNumPorts, kUsed };
   while (rows.Step()) {
     Switch s;
-    s.id = rows.Int(0);
-    s.name = rows.Text(1);
-    s.numPorts = rows.Int(2);
-    s.usedPorts = rows.Int(3);
+    s.id = rows.Int(kId);
+    s.name = rows.Text(kName);
+    s.numPorts = rows.Int(kNumPorts);
+    s.usedPorts = rows.Int(kUsed);
     switches.push_back(std::move(s));
   }
   for (Switch& s : switches) {
     Statement uplinks = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+    enum { kNic };
     uplinks.Bind(1, s.id);
     while (uplinks.Step())
-      s.uplinks.push_back(uplinks.Text(0));
+      s.uplinks.push_back(uplinks.Text(kNic));
   }
   return switches;
 }
@@ -159,9 +152,10 @@ void GeneratePortGroups(Store& store, int64_t count, std::vector<Switch>& switch
     return;
   Require(!switches.empty(), "The host has no standard switch for the port groups");
   std::vector<PolicyVariant> variants = PolicyVariants();
-  Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM portgroup");
+  Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 AS next_ord FROM portgroup");
+  enum { kNextOrd };
   ord.Step();
-  int64_t nextOrd = ord.Int(0);
+  int64_t nextOrd = ord.Int(kNextOrd);
   Statement insert = store.Prepare(
       "INSERT INTO portgroup(name, portset_id, vlan_id, system, ord) VALUES(?, ?, ?, 0, ?)");
   Statement policy = store.Prepare(
@@ -194,9 +188,10 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     if (s.portgroups.empty()) {
       Statement groups = store.Prepare(
           "SELECT id FROM portgroup WHERE portset_id = ? AND system = 0 ORDER BY ord");
+      enum { kId };
       groups.Bind(1, s.id);
       while (groups.Step())
-        s.portgroups.push_back(groups.Int(0));
+        s.portgroups.push_back(groups.Int(kId));
     }
     Require(!s.portgroups.empty() || s.vmPorts == 0,
             "Switch " + s.name + " has no port group for the VM ports");
@@ -209,9 +204,11 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     total += needed;
   }
   Statement others = store.Prepare(
-      "SELECT coalesce(sum(num_ports), 0) FROM portset WHERE kind = 'standard' AND system = 1");
+      "SELECT coalesce(sum(num_ports), 0) AS ports FROM portset WHERE kind = 'standard' AND "
+      "system = 1");
+  enum { kPorts };
   others.Step();
-  total += others.Int(0);
+  total += others.Int(kPorts);
   Require(total <= HostCtl::Network::VirtualSwitch::MAX_HOST_PORTS,
           std::to_string(vms * portsPerVm) +
               " VM ports do not fit: the standard switches would need " + std::to_string(total) +
@@ -224,20 +221,17 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     grow.Reset();
   }
 
-  Statement firstId = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 FROM port");
+  Statement firstId = store.Prepare("SELECT coalesce(max(id), 33554431) + 1 AS next_id FROM port");
+  enum { kNextId };
   firstId.Step();
-  int64_t portId = firstId.Int(0);
+  int64_t portId = firstId.Int(kNextId);
   Statement world = store.Prepare("INSERT INTO world(id, name) VALUES(?, ?)");
   Statement port = store.Prepare(
       "INSERT INTO port(id, portset_id, portgroup_id, dvport_key, client_kind, client, world_id, "
-      "port_type) VALUES(?, ?, ?, NULL, 'vm', ?, ?, 0)");
-  Statement vmPort =
-      store.Prepare("INSERT INTO vm_port(port_id, ipv4, team_uplink) VALUES(?, ?, ?)");
-  Statement mac = store.Prepare("INSERT INTO vm_port_mac(port_id, ord, mac) VALUES(?, 0, ?)");
-  Statement counters = store.Prepare(
-      "INSERT INTO port_counter(port_id, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
+      "port_type, ipv4, team_uplink, rx_bytes, tx_bytes, rx_packets, rx_multicast, "
       "rx_broadcast, tx_packets, tx_multicast, tx_broadcast, rx_dropped, tx_dropped) "
-      "VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)");
+      "VALUES(?, ?, ?, NULL, 'vm', ?, ?, 0, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)");
+  Statement mac = store.Prepare("INSERT INTO vm_port_mac(port_id, ord, mac) VALUES(?, 0, ?)");
   std::vector<int64_t> used(switches.size(), 0);
   int64_t serial = 0;
   for (int64_t vm = 0; vm < vms; ++vm) {
@@ -250,23 +244,19 @@ void GenerateVms(Store& store, int64_t vms, int64_t portsPerVm, std::vector<Swit
     world.Reset();
     for (int64_t adapter = 0; adapter < portsPerVm; ++adapter, ++serial, ++portId) {
       int64_t group = s.portgroups[used[which]++ % s.portgroups.size()];
-      port.BindAll(portId, s.id, group, name + ".eth" + std::to_string(adapter), worldId);
-      port.Run();
-      port.Reset();
       std::string uplink =
           s.uplinks.empty() ? std::string() : s.uplinks[adapter % s.uplinks.size()];
+      int64_t packets = 1000 + serial * 37 % 100000;
       // 10.64.0.0/10 holds the VMs' addresses, one per port.
-      vmPort.BindAll(portId, Dotted(0x0A400000 + static_cast<uint32_t>(serial) + 1), uplink);
-      vmPort.Run();
-      vmPort.Reset();
+      port.BindAll(portId, s.id, group, name + ".eth" + std::to_string(adapter), worldId,
+                   int64_t{0x0A400000} + serial + 1, uplink, packets * 900, packets * 600, packets,
+                   packets / 50, packets / 100, packets * 2 / 3, packets / 200, packets / 400,
+                   serial % 7, int64_t{0});
+      port.Run();
+      port.Reset();
       mac.BindAll(portId, Mac(0x00505A, static_cast<uint32_t>(serial)));
       mac.Run();
       mac.Reset();
-      int64_t packets = 1000 + serial * 37 % 100000;
-      counters.BindAll(portId, packets * 900, packets * 600, packets, packets / 50, packets / 100,
-                       packets * 2 / 3, packets / 200, packets / 400, serial % 7, 0);
-      counters.Run();
-      counters.Reset();
     }
   }
 }
@@ -277,7 +267,7 @@ void GenerateNeighbours(Store& store, int64_t count) {
       "INSERT INTO ipsvc_neighbor(family, interface, address, mac, expiry, type, state) "
       "VALUES(4, ?, ?, ?, ?, 1, 0)");
   for (int64_t i = 0; i < count; ++i) {
-    insert.BindAll(kRouteInterface, Dotted(0x0A200000 + static_cast<uint32_t>(i) + 1),
+    insert.BindAll(kRouteInterface, int64_t{0x0A200000} + i + 1,
                    Mac(0x001C74, static_cast<uint32_t>(i)), i % 1200);
     insert.Run();
     insert.Reset();
@@ -291,8 +281,7 @@ void GenerateHostsEntries(Store& store, int64_t count) {
                     "VALUES(?, ?, ?, '', 0)");
   for (int64_t i = 0; i < count; ++i) {
     std::string alias = Numbered("node", i + 1, 6);
-    insert.BindAll(Dotted(0xAC100000 + static_cast<uint32_t>(i) + 1), alias + ".lab.example",
-                   alias);
+    insert.BindAll(int64_t{0xAC100000} + i + 1, alias + ".lab.example", alias);
     insert.Run();
     insert.Reset();
   }

@@ -96,31 +96,221 @@ void MergeDescription(ordered_json& into, const ordered_json& fragment) {
   into = fragment;
 }
 
-void ImportHost(Store& store, const ordered_json& host) {
-  CheckKeys(host, "", "", KnownKeys());
+namespace {
+
+/// The part that imports the top-level array \p key element by element.
+const StreamedKey* FindStreamed(const std::string& key) {
+  for (const Part* part : AllParts())
+    for (const StreamedKey& streamed : part->streamed)
+      if (key == streamed.key)
+        return &streamed;
+  return nullptr;
+}
+
+std::string ElementPath(const std::string& key, std::size_t index) {
+  return key + "[" + std::to_string(index) + "]";
+}
+
+/// Empties the store and runs every part's import of \p host; \p streamed
+/// then imports the arrays that parts take element by element.
+template <typename Streamed>
+void ReplaceHost(Store& store, const ordered_json& host, Streamed&& streamed) {
   store.Write([&] {
     store.Exec("PRAGMA defer_foreign_keys=ON");
     std::vector<std::string> tables;
     {
       Statement list = store.Prepare(
           "SELECT name FROM sqlite_master WHERE type='table' AND name NOT LIKE 'sqlite_%'");
+      enum { kName };
       while (list.Step())
-        tables.push_back(list.Text(0));
+        tables.push_back(list.Text(kName));
     }
     for (const std::string& table : tables)
       store.Exec(("DELETE FROM \"" + table + "\"").c_str());
     for (const Part* part : AllParts())
       part->importFn(host, store);
+    streamed();
   });
 }
 
-ordered_json ExportHost(Store& store) {
-  ordered_json host = ordered_json::object();
-  store.Read([&] {
+} // namespace
+
+void ImportHost(Store& store, const ordered_json& host) {
+  CheckKeys(host, "", "", KnownKeys());
+  ReplaceHost(store, host, [&] {
+    JsonObject root(host, "");
     for (const Part* part : AllParts())
-      part->exportFn(host, store);
+      for (const StreamedKey& streamed : part->streamed)
+        for (const JsonObject& element : root.Objects(streamed.key))
+          streamed.importElement(element, store);
   });
+}
+
+ordered_json ReadDescription(std::FILE* file) {
+  const auto known = KnownKeys();
+  ordered_json host =
+      ParseDescription(file, [&](const std::string& key, std::size_t index, ordered_json& element) {
+        if (!FindStreamed(key))
+          return true;
+        CheckKeys(element, key, ElementPath(key, index), known);
+        return false;
+      });
+  CheckKeys(host, "", "", known);
   return host;
+}
+
+void ImportHost(Store& store, const ordered_json& host, std::FILE* file) {
+  ReplaceHost(store, host, [&] {
+    std::rewind(file);
+    ParseDescription(file, [&](const std::string& key, std::size_t index, ordered_json& element) {
+      if (const StreamedKey* streamed = FindStreamed(key))
+        streamed->importElement(JsonObject(element, ElementPath(key, index)), store);
+      return false;
+    });
+  });
+}
+
+void ExportStreams::Put(ordered_json& object, const char* key, Rows rows) {
+  // A binary value never occurs in a description: it marks the placeholder,
+  // its subtype the rows function.
+  object[key] = ordered_json::binary({}, rows_.size());
+  rows_.push_back(std::move(rows));
+}
+
+const ExportStreams::Rows* ExportStreams::Find(const ordered_json& value) const {
+  if (!value.is_binary() || !value.get_binary().has_subtype() ||
+      value.get_binary().subtype() >= rows_.size())
+    return nullptr;
+  return &rows_[value.get_binary().subtype()];
+}
+
+namespace {
+
+/// The description with placeholders where the large arrays go (call inside
+/// a read transaction).
+ordered_json ExportParts(Store& store, ExportStreams& streams) {
+  ordered_json host = ordered_json::object();
+  for (const Part* part : AllParts())
+    part->exportFn(host, store, streams);
+  return host;
+}
+
+/// Writes JSON text as nlohmann's dump(2) does, replacing placeholders by
+/// their elements, and hands it on in pieces.
+class DescriptionWriter {
+public:
+  DescriptionWriter(Store& store, const ExportStreams& streams,
+                    const std::function<void(std::string_view)>& write)
+      : store_(store), streams_(streams), write_(write) {}
+
+  void Value(const ordered_json& value, int indent) {
+    if (const ExportStreams::Rows* rows = streams_.Find(value)) {
+      bool first = true;
+      (*rows)(store_, [&](const ordered_json& element) {
+        out_ += first ? "[\n" : ",\n";
+        first = false;
+        Indent(indent + 2);
+        Value(element, indent + 2);
+        Flush(false);
+      });
+      if (first) {
+        out_ += "[]";
+      } else {
+        out_ += '\n';
+        Indent(indent);
+        out_ += ']';
+      }
+      return;
+    }
+    if (value.is_object() && !value.empty()) {
+      out_ += "{\n";
+      bool first = true;
+      for (const auto& [key, member] : value.items()) {
+        if (!first)
+          out_ += ",\n";
+        first = false;
+        Indent(indent + 2);
+        out_ += ordered_json(key).dump();
+        out_ += ": ";
+        Value(member, indent + 2);
+      }
+      out_ += '\n';
+      Indent(indent);
+      out_ += '}';
+      return;
+    }
+    if (value.is_array() && !value.empty()) {
+      out_ += "[\n";
+      bool first = true;
+      for (const ordered_json& element : value) {
+        if (!first)
+          out_ += ",\n";
+        first = false;
+        Indent(indent + 2);
+        Value(element, indent + 2);
+      }
+      out_ += '\n';
+      Indent(indent);
+      out_ += ']';
+      return;
+    }
+    out_ += value.dump();
+  }
+
+  /// Hands the text on once it is large enough, or at once when \p all.
+  void Flush(bool all) {
+    if (out_.empty() || (!all && out_.size() < kPiece))
+      return;
+    write_(out_);
+    out_.clear();
+  }
+
+  std::string& Text() { return out_; }
+
+private:
+  static constexpr std::size_t kPiece = 64 << 10;
+
+  void Indent(int indent) { out_.append(static_cast<std::size_t>(indent), ' '); }
+
+  Store& store_;
+  const ExportStreams& streams_;
+  const std::function<void(std::string_view)>& write_;
+  std::string out_; ///< Text not handed on yet.
+};
+
+/// Replaces every placeholder in \p value by the array it stands for.
+void Materialise(ordered_json& value, Store& store, const ExportStreams& streams) {
+  if (const ExportStreams::Rows* rows = streams.Find(value)) {
+    ordered_json array = ordered_json::array();
+    (*rows)(store, [&](const ordered_json& element) { array.push_back(element); });
+    value = std::move(array);
+    return;
+  }
+  if (value.is_object() || value.is_array())
+    for (ordered_json& child : value)
+      Materialise(child, store, streams);
+}
+
+} // namespace
+
+ordered_json ExportHost(Store& store) {
+  return store.Read([&] {
+    ExportStreams streams;
+    ordered_json host = ExportParts(store, streams);
+    Materialise(host, store, streams);
+    return host;
+  });
+}
+
+void WriteHostDescription(Store& store, const std::function<void(std::string_view)>& write) {
+  store.Read([&] {
+    ExportStreams streams;
+    ordered_json host = ExportParts(store, streams);
+    DescriptionWriter writer(store, streams, write);
+    writer.Value(host, 0);
+    writer.Text() += '\n';
+    writer.Flush(true);
+  });
 }
 
 std::vector<std::string> ProfileNames() {

@@ -11,6 +11,8 @@
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
+#include <cstdio>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -23,8 +25,27 @@ class Store;
 /// field (nothing is changed then).
 void ImportHost(Store& store, const nlohmann::ordered_json& host);
 
+/// Reads the host description in \p file and checks it whole (JSON, repeated
+/// and unknown keys), holding in memory all but the elements of the arrays
+/// that parts import one at a time (routes, hosts entries, neighbours): those
+/// are checked and dropped. Throws ImportError naming the bad field.
+nlohmann::ordered_json ReadDescription(std::FILE* file);
+
+/// Replaces the host in \p store by the description that ReadDescription
+/// read from \p file as \p host, reading the dropped arrays again from the
+/// start of \p file as they are imported. Throws ImportError naming the bad
+/// field (nothing is changed then).
+void ImportHost(Store& store, const nlohmann::ordered_json& host, std::FILE* file);
+
 /// The whole host as a description.
 nlohmann::ordered_json ExportHost(Store& store);
+
+/// Writes the whole host as a description, as ExportHost(store).dump(2)
+/// followed by a newline would, in pieces of about 64 KiB handed to \p write.
+/// The large collections (routes, hosts entries, neighbours) are read and
+/// written element by element, so memory stays small whatever the host's
+/// size. Stops at the first exception \p write throws.
+void WriteHostDescription(Store& store, const std::function<void(std::string_view)>& write);
 
 /// Merges \p fragment into \p into: objects key by key, arrays of objects that
 /// carry "name" (or "key") element by element on that value, other values

@@ -13,6 +13,7 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Network/Address.h"
+#include "HostCtl/Network/NetstackInstance.h"
 #include "TvkCtl/Network/TvkNicImpl.h"
 #include "model/CoreModel.h"
 #include "model/JsonRead.h"
@@ -26,6 +27,7 @@ using HostCtl::Lib::HostCtlException;
 using HostCtl::Network::Ipv4Address;
 using HostCtl::Network::Ipv6Address;
 using HostCtl::Network::MacAddress;
+using HostCtl::Network::NetstackInstance;
 using nlohmann::ordered_json;
 
 namespace Ip {
@@ -156,31 +158,44 @@ Attachment AttachmentOf(Store& store, const std::string& name) {
   Attachment a;
   Statement row = store.Prepare(
       "SELECT p.portset_id, s.name, s.kind, p.portgroup_id, pg.name, p.dvport_key, "
-      "coalesce(d.connection_id, 0), e.opaque_id, e.opaque_type, e.external_id, s.mtu "
+      "coalesce(d.connection_id, 0), t.opaque_id, t.opaque_type, t.external_id, s.mtu "
       "FROM tvknic t JOIN port p ON p.id = t.port_id JOIN portset s ON s.id = p.portset_id "
       "LEFT JOIN portgroup pg ON pg.id = p.portgroup_id "
       "LEFT JOIN dvport d ON d.portset_id = p.portset_id AND d.port_key = p.dvport_key "
-      "LEFT JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
+      "WHERE t.name = ?");
+  enum {
+    kPortsetId,
+    kPortsetName,
+    kKind,
+    kPortgroupId,
+    kPortgroupName,
+    kDvportKey,
+    kConnectionId,
+    kOpaqueId,
+    kOpaqueType,
+    kExternalId,
+    kMtu
+  };
   row.Bind(1, name);
   if (!row.Step())
     return a;
-  a.portsetId = row.Int(0);
-  a.portsetName = row.Text(1);
-  std::string kind = row.Text(2);
-  a.portsetMtu = row.Int(10);
-  if (!row.IsNull(3)) {
+  a.portsetId = row.Int(kPortsetId);
+  a.portsetName = row.Text(kPortsetName);
+  std::string kind = row.Text(kKind);
+  a.portsetMtu = row.Int(kMtu);
+  if (!row.IsNull(kPortgroupId)) {
     a.kind = 1;
-    a.portgroupId = row.Int(3);
-    a.portgroupName = row.Text(4);
-  } else if (!row.IsNull(5)) {
+    a.portgroupId = row.Int(kPortgroupId);
+    a.portgroupName = row.Text(kPortgroupName);
+  } else if (!row.IsNull(kDvportKey)) {
     a.kind = 2;
-    a.dvportKey = row.Text(5);
-    a.connectionId = static_cast<uint32_t>(row.Int(6));
+    a.dvportKey = row.Text(kDvportKey);
+    a.connectionId = static_cast<uint32_t>(row.Int(kConnectionId));
   } else if (kind == "opaque") {
     a.kind = 3;
-    a.opaqueId = row.Text(7);
-    a.opaqueType = row.Text(8);
-    a.externalId = row.Text(9);
+    a.opaqueId = row.Text(kOpaqueId);
+    a.opaqueType = row.Text(kOpaqueType);
+    a.externalId = row.Text(kExternalId);
   }
   return a;
 }
@@ -189,15 +204,19 @@ std::optional<std::string> InterfaceOnPoint(Store& store, const Attachment& atta
   if (attachment.kind == 1) {
     Statement row = store.Prepare(
         "SELECT client FROM port WHERE portgroup_id = ? AND client_kind = 'tvknic' LIMIT 1");
+    enum { kClient };
     row.Bind(1, attachment.portgroupId);
     if (row.Step())
-      return row.Text(0);
+      return row.Text(kClient);
   } else if (attachment.kind == 2) {
     Statement row = store.Prepare(
         "SELECT client, client_kind FROM port WHERE portset_id = ? AND dvport_key = ? LIMIT 1");
+    enum { kRowClient, kRowClientKind };
     row.BindAll(attachment.portsetId, attachment.dvportKey);
     if (row.Step())
-      return row.Text(1) == "tvknic" ? row.Text(0) : row.Text(1) + " " + row.Text(0);
+      return row.Text(kRowClientKind) == "tvknic"
+                 ? row.Text(kRowClient)
+                 : row.Text(kRowClientKind) + " " + row.Text(kRowClient);
   }
   return std::nullopt;
 }
@@ -206,13 +225,14 @@ int64_t AttachPort(Store& store, const std::string& name, const Attachment& atta
                    std::optional<int64_t> portId) {
   Statement limits =
       store.Prepare("SELECT s.num_ports, (SELECT count(*) FROM port p WHERE p.portset_id = s.id) "
-                    "FROM portset s WHERE s.id = ?");
+                    "AS used FROM portset s WHERE s.id = ?");
+  enum { kNumPorts, kUsed };
   limits.Bind(1, attachment.portsetId);
   if (!limits.Step())
     throw HostCtlException("The switch of the connection point does not exist");
-  if (limits.Int(1) >= limits.Int(0))
+  if (limits.Int(kUsed) >= limits.Int(kNumPorts))
     throw HostCtlException("Switch " + attachment.portsetName + " has no free port (" +
-                           std::to_string(limits.Int(0)) + " ports in use)");
+                           std::to_string(limits.Int(kNumPorts)) + " ports in use)");
   if (auto user = InterfaceOnPoint(store, attachment)) {
     if (attachment.kind == 1)
       throw HostCtlException("Port group " + attachment.portgroupName +
@@ -240,14 +260,14 @@ int64_t AttachPort(Store& store, const std::string& name, const Attachment& atta
 
 void DeleteInterface(Store& store, const std::string& name) {
   Statement port = store.Prepare("SELECT port_id FROM tvknic WHERE name = ?");
+  enum { kPortId };
   port.Bind(1, name);
   std::optional<int64_t> portId;
-  if (port.Step() && !port.IsNull(0))
-    portId = port.Int(0);
+  if (port.Step() && !port.IsNull(kPortId))
+    portId = port.Int(kPortId);
   for (const char* sql :
        {"DELETE FROM tvknic_tag WHERE nic = ?", "DELETE FROM tvknic_mcast WHERE nic = ?",
-        "DELETE FROM tvknic_ipv6 WHERE nic = ?", "DELETE FROM tvknic_ext WHERE name = ?",
-        "DELETE FROM tvknic WHERE name = ?"})
+        "DELETE FROM tvknic_ipv6 WHERE nic = ?", "DELETE FROM tvknic WHERE name = ?"})
     store.Prepare(sql).Bind(1, name).Run();
   if (portId)
     store.Prepare("DELETE FROM port WHERE id = ?").Bind(1, *portId).Run();
@@ -258,24 +278,6 @@ void DeleteInterface(Store& store, const std::string& name) {
 namespace {
 
 const char* const kIpSchema = R"sql(
--- Further attributes of kernel interfaces: TSO segment size, receive queues,
--- the DHCP DNS and IPv6 switches, the IPv6 gateway ('::' for none), and the
--- opaque network of an interface attached to one.
-CREATE TABLE tvknic_ext(
-  name TEXT PRIMARY KEY REFERENCES tvknic(name) ON DELETE CASCADE,
-  tso_mss INTEGER NOT NULL DEFAULT 65535,
-  rx_queues INTEGER NOT NULL DEFAULT 1,
-  dhcp_dns INTEGER NOT NULL DEFAULT 0,
-  ipv6_enabled INTEGER NOT NULL DEFAULT 1,
-  ipv6_dhcp INTEGER NOT NULL DEFAULT 0,
-  ipv6_ra INTEGER NOT NULL DEFAULT 0,
-  ipv6_dhcp_dns INTEGER NOT NULL DEFAULT 0,
-  ipv6_gateway TEXT NOT NULL DEFAULT '::',
-  opaque_id TEXT NOT NULL DEFAULT '',
-  opaque_type TEXT NOT NULL DEFAULT '',
-  external_id TEXT NOT NULL DEFAULT ''
-) WITHOUT ROWID;
-
 -- Tags of kernel interfaces (tag types 1 to 12), in the order they were added.
 CREATE TABLE tvknic_tag(
   nic TEXT NOT NULL REFERENCES tvknic(name) ON DELETE CASCADE,
@@ -283,7 +285,6 @@ CREATE TABLE tvknic_tag(
   ord INTEGER NOT NULL,
   PRIMARY KEY(nic, tag)
 ) WITHOUT ROWID;
-CREATE INDEX tvknic_tag_by_tag ON tvknic_tag(tag);
 
 -- Multicast group memberships of kernel interfaces.
 CREATE TABLE tvknic_mcast(
@@ -326,7 +327,8 @@ void ImportNetstacks(const JsonObject& root, Store& store) {
     Statement insert = store.Prepare(
         "INSERT INTO netstack(key, ord, name, state, max_conn, cur_max_conn, ccalgo, ipv6, "
         "cur_ipv6, ecn, predefined) VALUES(?,?,?,?,?,?,?,?,?,?,?)");
-    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key), enabled ? 4660 : 0,
+    insert.BindAll(key, isDefault ? 0 : ord++, stack.String("name", key),
+                   enabled ? NetstackInstance::STATE_ENABLED : NetstackInstance::STATE_DISABLED,
                    maxConn, curMaxConn, cc, ipv6, curIpv6, ecn,
                    Contains(Ip::PredefinedNetstacks(), key));
     try {
@@ -336,8 +338,8 @@ void ImportNetstacks(const JsonObject& root, Store& store) {
     }
   }
   if (!haveDefault)
-    store.Prepare("INSERT INTO netstack(key, ord, name, predefined) VALUES(?, 0, ?, 0)")
-        .BindAll(Ip::kDefaultNetstack, Ip::kDefaultNetstack)
+    store.Prepare("INSERT INTO netstack(key, ord, name, state, predefined) VALUES(?, 0, ?, ?, 0)")
+        .BindAll(Ip::kDefaultNetstack, Ip::kDefaultNetstack, NetstackInstance::STATE_ENABLED)
         .Run();
 }
 
@@ -352,21 +354,23 @@ Ip::Attachment ReadConnectionPoint(const JsonObject& nic, Store& store) {
     Statement row = store.Prepare(
         "SELECT pg.id, pg.portset_id, s.name FROM portgroup pg JOIN portset s ON s.id = "
         "pg.portset_id WHERE pg.name = ?");
+    enum { kId, kPortsetId, kName };
     row.Bind(1, nic.String("portgroup"));
     if (!row.Step())
       nic.Fail("portgroup", "no port group of that name");
     a.kind = 1;
-    a.portgroupId = row.Int(0);
-    a.portsetId = row.Int(1);
-    a.portsetName = row.Text(2);
+    a.portgroupId = row.Int(kId);
+    a.portsetId = row.Int(kPortsetId);
+    a.portsetName = row.Text(kName);
     a.portgroupName = nic.String("portgroup");
   } else if (dvs) {
     Statement row = store.Prepare("SELECT id FROM portset WHERE name = ? AND kind = 'dvs'");
+    enum { kRowId };
     row.Bind(1, nic.String("dvs"));
     if (!row.Step())
       nic.Fail("dvs", "no distributed switch of that name");
     a.kind = 2;
-    a.portsetId = row.Int(0);
+    a.portsetId = row.Int(kRowId);
     a.portsetName = nic.String("dvs");
     a.dvportKey = nic.String("dvport");
     Statement port = store.Prepare("SELECT 1 FROM dvport WHERE portset_id = ? AND port_key = ?");
@@ -375,11 +379,12 @@ Ip::Attachment ReadConnectionPoint(const JsonObject& nic, Store& store) {
       nic.Fail("dvport", "no port of that key on the distributed switch");
   } else if (opaque) {
     Statement row = store.Prepare("SELECT id FROM portset WHERE name = ? AND kind = 'opaque'");
+    enum { kRowId };
     row.Bind(1, nic.String("opaqueSwitch"));
     if (!row.Step())
       nic.Fail("opaqueSwitch", "no opaque switch of that name");
     a.kind = 3;
-    a.portsetId = row.Int(0);
+    a.portsetId = row.Int(kRowId);
     a.portsetName = nic.String("opaqueSwitch");
     a.opaqueId = nic.String("opaqueNetworkId");
     a.opaqueType = nic.String("opaqueNetworkType", "");
@@ -453,21 +458,22 @@ void ImportInterface(const JsonObject& nic, int ord, Store& store) {
 
   Ip::Attachment point = ReadConnectionPoint(nic, store);
   store
-      .Prepare("INSERT INTO tvknic_ext(name, tso_mss, rx_queues, dhcp_dns, ipv6_enabled, "
-               "ipv6_dhcp, ipv6_ra, ipv6_dhcp_dns, ipv6_gateway, opaque_id, opaque_type, "
-               "external_id) VALUES(?,?,?,?,?,?,?,?,?,?,?,?)")
-      .BindAll(name, nic.Int("tsoMss", 536, 65535, 65535), nic.Int("rxQueues", 1, 1000, 1),
+      .Prepare("UPDATE tvknic SET tso_mss = ?, rx_queues = ?, dhcp_dns = ?, ipv6_enabled = ?, "
+               "ipv6_dhcp = ?, ipv6_ra = ?, ipv6_dhcp_dns = ?, ipv6_gateway = ?, opaque_id = ?, "
+               "opaque_type = ?, external_id = ? WHERE name = ?")
+      .BindAll(nic.Int("tsoMss", 536, 65535, 65535), nic.Int("rxQueues", 1, 1000, 1),
                nic.Bool("dhcpDns", false), nic.Bool("ipv6Enabled", true), nic.Bool("dhcpv6", false),
                nic.Bool("routerAdv", false), nic.Bool("ipv6DhcpDns", false),
                Ipv6Address(ipv6Gateway).GetStringAddress(), point.opaqueId, point.opaqueType,
-               point.externalId)
+               point.externalId, name)
       .Run();
   if (point.kind != 0) {
     if (point.portsetId != 0 && mtu > 0) {
       Statement switchMtu = store.Prepare("SELECT mtu FROM portset WHERE id = ?");
+      enum { kMtu };
       switchMtu.Bind(1, point.portsetId);
-      if (switchMtu.Step() && mtu > switchMtu.Int(0))
-        nic.Fail("mtu", "above the MTU " + std::to_string(switchMtu.Int(0)) + " of switch " +
+      if (switchMtu.Step() && mtu > switchMtu.Int(kMtu))
+        nic.Fail("mtu", "above the MTU " + std::to_string(switchMtu.Int(kMtu)) + " of switch " +
                             point.portsetName);
     }
     std::optional<int64_t> portId;
@@ -550,43 +556,65 @@ void ImportIp(const ordered_json& host, Store& store) {
     ImportInterface(nic, ord++, store);
 }
 
-void ExportIp(ordered_json& host, Store& store) {
+void ExportIp(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ordered_json stacks = ordered_json::array();
   Statement rows =
       store.Prepare("SELECT key, name, state, max_conn, cur_max_conn, ccalgo, ipv6, cur_ipv6, ecn "
                     "FROM netstack ORDER BY ord, key");
+  enum { kKey, kName, kState, kMaxConn, kCurMaxConn, kCcalgo, kIpv6, kCurIpv6, kEcn };
   while (rows.Step()) {
-    stacks.push_back({{"key", rows.Text(0)},
-                      {"name", rows.Text(1)},
-                      {"enabled", rows.Int(2) == 4660},
-                      {"maxConnections", rows.Int(3)},
-                      {"currentMaxConnections", rows.Int(4)},
-                      {"ccAlgorithm", rows.Text(5)},
-                      {"ipv6", rows.Bool(6)},
-                      {"currentIpv6", rows.Bool(7)},
-                      {"ecn", rows.Text(8)}});
+    stacks.push_back({{"key", rows.Text(kKey)},
+                      {"name", rows.Text(kName)},
+                      {"enabled", rows.Int(kState) == NetstackInstance::STATE_ENABLED},
+                      {"maxConnections", rows.Int(kMaxConn)},
+                      {"currentMaxConnections", rows.Int(kCurMaxConn)},
+                      {"ccAlgorithm", rows.Text(kCcalgo)},
+                      {"ipv6", rows.Bool(kIpv6)},
+                      {"currentIpv6", rows.Bool(kCurIpv6)},
+                      {"ecn", rows.Text(kEcn)}});
   }
   host["netstacks"] = std::move(stacks);
   host["kernel"] = {{"ipv6Running", GetSetting(store, Ip::kIpv6RunningSetting) != "0"},
                     {"ipv6Configured", GetSetting(store, Ip::kIpv6ConfiguredSetting) != "0"}};
 
   ordered_json nics = ordered_json::array();
-  Statement nic = store.Prepare(
-      "SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
-      "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, coalesce(e.tso_mss, 65535), "
-      "coalesce(e.rx_queues, 1), coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), "
-      "coalesce(e.ipv6_dhcp, 0), coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), "
-      "coalesce(e.ipv6_gateway, '::'), t.port_id "
-      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name ORDER BY t.ord");
+  Statement nic =
+      store.Prepare("SELECT t.name, t.netstack, t.mac, t.mtu, t.enabled, t.system, t.ipv4_mode, "
+                    "t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, t.tso_mss, "
+                    "t.rx_queues, t.dhcp_dns, t.ipv6_enabled, "
+                    "t.ipv6_dhcp, t.ipv6_ra, t.ipv6_dhcp_dns, "
+                    "t.ipv6_gateway, t.port_id "
+                    "FROM tvknic t ORDER BY t.ord");
+  enum {
+    kNicName,
+    kNicNetstack,
+    kNicMac,
+    kNicMtu,
+    kNicEnabled,
+    kNicSystem,
+    kNicIpv4Mode,
+    kNicIpv4Address,
+    kNicIpv4Netmask,
+    kNicIpv4Gateway,
+    kNicTsoMss,
+    kNicRxQueues,
+    kNicDhcpDns,
+    kNicIpv6Enabled,
+    kNicIpv6Dhcp,
+    kNicIpv6Ra,
+    kNicIpv6DhcpDns,
+    kNicIpv6Gateway,
+    kNicPortId
+  };
   while (nic.Step()) {
-    std::string name = nic.Text(0);
+    std::string name = nic.Text(kNicName);
     ordered_json out = ordered_json::object();
     out["name"] = name;
-    out["netstack"] = nic.Text(1);
-    out["mac"] = nic.Text(2);
-    out["mtu"] = nic.Int(3);
-    out["enabled"] = nic.Bool(4);
-    if (nic.Bool(5))
+    out["netstack"] = nic.Text(kNicNetstack);
+    out["mac"] = nic.Text(kNicMac);
+    out["mtu"] = nic.Int(kNicMtu);
+    out["enabled"] = nic.Bool(kNicEnabled);
+    if (nic.Bool(kNicSystem))
       out["system"] = true;
     Ip::Attachment a = Ip::AttachmentOf(store, name);
     if (a.kind == 1) {
@@ -600,48 +628,53 @@ void ExportIp(ordered_json& host, Store& store) {
       out["opaqueNetworkType"] = a.opaqueType;
       out["externalId"] = a.externalId;
     }
-    if (!nic.IsNull(18))
-      out["portId"] = nic.Int(18);
-    out["tsoMss"] = nic.Int(10);
-    out["rxQueues"] = nic.Int(11);
-    std::string mode = nic.Text(6);
+    if (!nic.IsNull(kNicPortId))
+      out["portId"] = nic.Int(kNicPortId);
+    out["tsoMss"] = nic.Int(kNicTsoMss);
+    out["rxQueues"] = nic.Int(kNicRxQueues);
+    std::string mode = nic.Text(kNicIpv4Mode);
     out["ipv4Type"] = mode;
     if (mode == "static") {
-      out["ipv4Address"] = nic.Text(7);
-      out["ipv4Netmask"] = nic.Text(8);
-      out["ipv4Gateway"] = nic.Text(9);
+      out["ipv4Address"] = nic.Text(kNicIpv4Address);
+      out["ipv4Netmask"] = nic.Text(kNicIpv4Netmask);
+      out["ipv4Gateway"] = nic.Text(kNicIpv4Gateway);
     }
-    out["dhcpDns"] = nic.Bool(12);
-    out["ipv6Enabled"] = nic.Bool(13);
-    out["dhcpv6"] = nic.Bool(14);
-    out["routerAdv"] = nic.Bool(15);
-    out["ipv6DhcpDns"] = nic.Bool(16);
-    if (nic.Text(17) != "::")
-      out["ipv6Gateway"] = nic.Text(17);
+    out["dhcpDns"] = nic.Bool(kNicDhcpDns);
+    out["ipv6Enabled"] = nic.Bool(kNicIpv6Enabled);
+    out["dhcpv6"] = nic.Bool(kNicIpv6Dhcp);
+    out["routerAdv"] = nic.Bool(kNicIpv6Ra);
+    out["ipv6DhcpDns"] = nic.Bool(kNicIpv6DhcpDns);
+    if (nic.Text(kNicIpv6Gateway) != "::")
+      out["ipv6Gateway"] = nic.Text(kNicIpv6Gateway);
     ordered_json addresses = ordered_json::array();
     Statement v6 = store.Prepare(
         "SELECT address, prefix, type, status FROM tvknic_ipv6 WHERE nic = ? ORDER BY ord");
+    enum { kAddress, kPrefix, kType, kStatus };
     v6.Bind(1, name);
     while (v6.Step())
-      addresses.push_back({{"address", v6.Text(0)},
-                           {"prefix", v6.Int(1)},
-                           {"type", v6.Int(2)},
-                           {"status", v6.Int(3)}});
+      addresses.push_back({{"address", v6.Text(kAddress)},
+                           {"prefix", v6.Int(kPrefix)},
+                           {"type", v6.Int(kType)},
+                           {"status", v6.Int(kStatus)}});
     if (!addresses.empty())
       out["ipv6Addresses"] = std::move(addresses);
     ordered_json tags = ordered_json::array();
     Statement tag = store.Prepare("SELECT tag FROM tvknic_tag WHERE nic = ? ORDER BY ord");
+    enum { kTag };
     tag.Bind(1, name);
     while (tag.Step())
-      tags.push_back(Ip::TagNames().at(static_cast<std::size_t>(tag.Int(0) - 1)));
+      tags.push_back(Ip::TagNames().at(static_cast<std::size_t>(tag.Int(kTag) - 1)));
     if (!tags.empty())
       out["tags"] = std::move(tags);
     ordered_json groups = ordered_json::array();
     Statement mc = store.Prepare(
         "SELECT grp, link_layer, refcount FROM tvknic_mcast WHERE nic = ? ORDER BY ord");
+    enum { kGrp, kLinkLayer, kRefcount };
     mc.Bind(1, name);
     while (mc.Step())
-      groups.push_back({{"group", mc.Text(0)}, {"linkLayer", mc.Text(1)}, {"refcount", mc.Int(2)}});
+      groups.push_back({{"group", mc.Text(kGrp)},
+                        {"linkLayer", mc.Text(kLinkLayer)},
+                        {"refcount", mc.Int(kRefcount)}});
     if (!groups.empty())
       out["multicast"] = std::move(groups);
     nics.push_back(std::move(out));

@@ -38,11 +38,13 @@ std::string Destination(const Ipv6Network& network) {
 bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv4Network& network) {
   Statement rows = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = "
                                  "? AND enabled = 1 AND ipv4_address <> '0.0.0.0'");
+  enum { kIpv4Address, kIpv4Netmask };
   rows.Bind(1, netstack);
   while (rows.Step()) {
     uint32_t address = 0;
     uint32_t mask = 0;
-    if (!Ipv4Address::Parse(rows.Text(0), address) || !Ipv4Address::Parse(rows.Text(1), mask))
+    if (!Ipv4Address::Parse(rows.Text(kIpv4Address), address) ||
+        !Ipv4Address::Parse(rows.Text(kIpv4Netmask), mask))
       continue;
     if (Ipv4Network(Ipv4Address(address & mask), Ipv4Address(mask)) == network)
       return true;
@@ -54,12 +56,13 @@ bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv6Net
   Statement rows =
       store.Prepare("SELECT a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = "
                     "a.nic WHERE t.netstack = ? AND t.enabled = 1 AND a.status <> 3");
+  enum { kAddress, kPrefix };
   rows.Bind(1, netstack);
   while (rows.Step()) {
     std::array<uint8_t, 16> bytes{};
-    if (!Ipv6Address::Parse(rows.Text(0), bytes))
+    if (!Ipv6Address::Parse(rows.Text(kAddress), bytes))
       continue;
-    int prefix = static_cast<int>(rows.Int(1));
+    int prefix = static_cast<int>(rows.Int(kPrefix));
     const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
     for (int i = 0; i < 16; ++i)
       bytes[i] &= mask[i];
@@ -72,28 +75,36 @@ bool IsConnectedNetwork(Store& store, const std::string& netstack, const Ipv6Net
 /// Refuses an interface name that is not an interface of \p netstack.
 void RequireInterfaceOf(Store& store, const std::string& netstack, const std::string& name) {
   Statement row = store.Prepare("SELECT netstack FROM tvknic WHERE name = ?");
+  enum { kNetstack };
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Interface " + name + " does not exist");
-  if (row.Text(0) != netstack)
+  if (row.Text(kNetstack) != netstack)
     throw HostCtlException("Interface " + name + " is not on netstack " + netstack);
 }
 
-void StoreRoute(Store& store, const std::string& netstack, int family, const std::string& network,
-                int prefix, const std::string& gateway, const std::string& interfaceName,
+template <typename Address>
+void StoreRoute(Store& store, const std::string& netstack, int family, const Address& network,
+                int prefix, const Address& gateway, const std::string& interfaceName,
                 const std::string& source, bool system) {
-  store
-      .Prepare("INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, "
-               "interface, source) VALUES(?, ?, ?, ?, ?, ?, ?, ?)")
-      .BindAll(netstack, family, system, network, prefix, gateway, interfaceName, source)
-      .Run();
+  Statement insert =
+      store.Prepare("INSERT INTO ipsvc_route(netstack, family, system, network, prefix, gateway, "
+                    "interface, source) VALUES(?1, ?2, ?3, ?4, ?5, ?6, ?7, ?8)");
+  insert.BindAll(netstack, family, system);
+  BindAddress(insert, 4, network);
+  insert.Bind(5, prefix);
+  BindAddress(insert, 6, gateway);
+  insert.Bind(7, interfaceName).Bind(8, source).Run();
 }
 
+template <typename Address>
 bool RouteExists(Store& store, const std::string& netstack, int family, bool system,
-                 const std::string& network, int prefix) {
-  Statement row = store.Prepare("SELECT 1 FROM ipsvc_route WHERE netstack = ? AND family = ? AND "
-                                "system = ? AND network = ? AND prefix = ?");
-  row.BindAll(netstack, family, system, network, prefix);
+                 const Address& network, int prefix) {
+  Statement row = store.Prepare("SELECT 1 FROM ipsvc_route WHERE netstack = ?1 AND family = ?2 "
+                                "AND system = ?3 AND network = ?4 AND prefix = ?5");
+  row.BindAll(netstack, family, system);
+  BindAddress(row, 4, network);
+  row.Bind(5, prefix);
   return row.Step();
 }
 
@@ -116,7 +127,7 @@ void CheckKey(const std::string& what, const std::string& algorithm, const std::
                          std::to_string(bytes * 2) + " hex digits";
   bool hex = key.size() > 2 && key[0] == '0' && (key[1] == 'x' || key[1] == 'X');
   if (hex) {
-    if (key.size() != static_cast<std::size_t>(2 + bytes * 2) || !IsHexDigits(key, 2))
+    if (key.size() != 2 + static_cast<std::size_t>(bytes) * 2 || !IsHexDigits(key, 2))
       throw HostCtlException(expected);
     return;
   }
@@ -133,6 +144,40 @@ std::string CanonicalIpv6(const std::string& text) {
 
 } // namespace
 
+void BindAddress(Statement& statement, int index, const Ipv4Address& address) {
+  statement.Bind(index, static_cast<int64_t>(address.GetValue()));
+}
+
+void BindAddress(Statement& statement, int index, const Ipv6Address& address) {
+  statement.BindBlob(index, address.GetBytes().data(), 16);
+}
+
+void BindAddress(Statement& statement, int index, const std::string& text) {
+  if (Ipv4Address::IsValidAddress(text))
+    BindAddress(statement, index, Ipv4Address(text));
+  else if (Ipv6Address::IsValidAddress(text))
+    BindAddress(statement, index, Ipv6Address(text));
+  else
+    throw HostCtlException("Invalid IP address '" + text + "'");
+}
+
+std::string AddressText(const Statement& row, int column) {
+  std::array<uint8_t, 16> bytes{};
+  if (row.Blob(column, bytes.data(), bytes.size()))
+    return Ipv6Address(bytes).GetStringAddress();
+  return Ipv4Column(row, column).GetStringAddress();
+}
+
+Ipv4Address Ipv4Column(const Statement& row, int column) {
+  return Ipv4Address(static_cast<uint32_t>(row.Int(column)));
+}
+
+Ipv6Address Ipv6Column(const Statement& row, int column) {
+  std::array<uint8_t, 16> bytes{};
+  row.Blob(column, bytes.data(), bytes.size());
+  return Ipv6Address(bytes);
+}
+
 void RequireNetstack(Store& store, const std::string& netstack) {
   Statement row = store.Prepare("SELECT 1 FROM netstack WHERE key = ?");
   row.Bind(1, netstack);
@@ -145,8 +190,9 @@ bool Ipv6Running(Store& store, const std::string& netstack) {
   if (kernel && *kernel == "0")
     return false;
   Statement row = store.Prepare("SELECT cur_ipv6 FROM netstack WHERE key = ?");
+  enum { kCurIpv6 };
   row.Bind(1, netstack);
-  return row.Step() && row.Bool(0);
+  return row.Step() && row.Bool(kCurIpv6);
 }
 
 void RequireIpv6(Store& store, const std::string& netstack) {
@@ -162,20 +208,22 @@ std::string ReachingInterface(Store& store, const std::string& netstack,
   Statement rows = store.Prepare(
       "SELECT name, ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = ? AND enabled = 1 "
       "AND ipv4_address <> '0.0.0.0' ORDER BY ord");
+  enum { kName, kIpv4Address, kIpv4Netmask };
   rows.Bind(1, netstack);
   std::string best;
   int bestLength = -1;
   while (rows.Step()) {
     uint32_t address = 0;
     uint32_t mask = 0;
-    if (!Ipv4Address::Parse(rows.Text(1), address) || !Ipv4Address::Parse(rows.Text(2), mask))
+    if (!Ipv4Address::Parse(rows.Text(kIpv4Address), address) ||
+        !Ipv4Address::Parse(rows.Text(kIpv4Netmask), mask))
       continue;
     Ipv4Address netmask(mask);
     if (!netmask.IsNetmask() || mask == 0)
       continue;
     if (Ipv4Network(Ipv4Address(address), netmask).Contains(gateway) &&
         netmask.PrefixLength() > bestLength) {
-      best = rows.Text(0);
+      best = rows.Text(kName);
       bestLength = netmask.PrefixLength();
     }
   }
@@ -190,16 +238,17 @@ std::string ReachingInterface(Store& store, const std::string& netstack,
   Statement rows = store.Prepare(
       "SELECT t.name, a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = a.nic "
       "WHERE t.netstack = ? AND t.enabled = 1 AND a.status <> 3 ORDER BY t.ord, a.ord");
+  enum { kName, kAddress, kPrefix };
   rows.Bind(1, netstack);
   std::string best;
   int bestLength = -1;
   while (rows.Step()) {
     std::array<uint8_t, 16> bytes{};
-    int prefix = static_cast<int>(rows.Int(2));
-    if (!Ipv6Address::Parse(rows.Text(1), bytes) || prefix <= 0 || prefix >= 128)
+    int prefix = static_cast<int>(rows.Int(kPrefix));
+    if (!Ipv6Address::Parse(rows.Text(kAddress), bytes) || prefix <= 0 || prefix >= 128)
       continue;
     if (Ipv6Network(Ipv6Address(bytes), prefix).Contains(gateway) && prefix > bestLength) {
-      best = rows.Text(0);
+      best = rows.Text(kName);
       bestLength = prefix;
     }
   }
@@ -224,13 +273,12 @@ void InsertRoute(Store& store, const std::string& netstack, const Ipv4Network& n
   } else {
     RequireInterfaceOf(store, netstack, interfaceName);
   }
-  std::string text = network.GetNetwork().GetStringAddress();
   int prefix = network.GetPrefixLength();
-  if (RouteExists(store, netstack, 4, system, text, prefix) ||
+  if (RouteExists(store, netstack, 4, system, network.GetNetwork(), prefix) ||
       (!system && IsConnectedNetwork(store, netstack, network)))
     throw HostCtlException("A route to " + Destination(network) + " already exists in netstack " +
                            netstack);
-  StoreRoute(store, netstack, 4, text, prefix, gateway.GetStringAddress(), interfaceName, source,
+  StoreRoute(store, netstack, 4, network.GetNetwork(), prefix, gateway, interfaceName, source,
              system);
 }
 
@@ -251,12 +299,11 @@ void InsertRoute(Store& store, const std::string& netstack, const Ipv6Network& n
   } else {
     RequireInterfaceOf(store, netstack, interfaceName);
   }
-  std::string text = network.GetAddress().GetStringAddress();
-  if (RouteExists(store, netstack, 6, system, text, prefix) ||
+  if (RouteExists(store, netstack, 6, system, network.GetAddress(), prefix) ||
       (!system && IsConnectedNetwork(store, netstack, network)))
     throw HostCtlException("A route to " + Destination(network) + " already exists in netstack " +
                            netstack);
-  StoreRoute(store, netstack, 6, text, prefix, gateway.GetStringAddress(), interfaceName, source,
+  StoreRoute(store, netstack, 6, network.GetAddress(), prefix, gateway, interfaceName, source,
              system);
 }
 
@@ -266,25 +313,22 @@ bool IsStoredRouteSource(const std::string& source) {
 }
 
 std::string ConfiguredGateway(Store& store, const std::string& netstack, int family) {
-  Statement row =
-      store.Prepare("SELECT gateway FROM ipsvc_gateway WHERE netstack = ? AND family = ?");
-  row.BindAll(netstack, family);
-  return row.Step() ? row.Text(0) : std::string();
+  Statement row = store.Prepare(family == 4 ? "SELECT gateway4 FROM netstack WHERE key = ?"
+                                            : "SELECT gateway6 FROM netstack WHERE key = ?");
+  enum { kGateway };
+  row.Bind(1, netstack);
+  return row.Step() ? row.Text(kGateway) : std::string();
 }
 
 void PutConfiguredGateway(Store& store, const std::string& netstack, int family,
                           const std::string& gateway) {
-  if (gateway.empty()) {
-    store.Prepare("DELETE FROM ipsvc_gateway WHERE netstack = ? AND family = ?")
-        .BindAll(netstack, family)
-        .Run();
-    return;
-  }
-  store
-      .Prepare("INSERT INTO ipsvc_gateway(netstack, family, gateway) VALUES(?, ?, ?) "
-               "ON CONFLICT(netstack, family) DO UPDATE SET gateway = excluded.gateway")
-      .BindAll(netstack, family, gateway)
-      .Run();
+  Statement update = store.Prepare(family == 4 ? "UPDATE netstack SET gateway4 = ? WHERE key = ?"
+                                               : "UPDATE netstack SET gateway6 = ? WHERE key = ?");
+  if (gateway.empty())
+    update.BindNull(1);
+  else
+    update.Bind(1, gateway);
+  update.Bind(2, netstack).Run();
 }
 
 void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>& servers,
@@ -294,14 +338,16 @@ void LoadDns(Store& store, const std::string& netstack, std::vector<std::string>
   domains.clear();
   Statement server =
       store.Prepare("SELECT address FROM ipsvc_dns_server WHERE netstack = ? ORDER BY ord");
+  enum { kAddress };
   server.Bind(1, netstack);
   while (server.Step())
-    servers.push_back(server.Text(0));
+    servers.push_back(server.Text(kAddress));
   Statement domain =
       store.Prepare("SELECT domain FROM ipsvc_dns_search WHERE netstack = ? ORDER BY ord");
+  enum { kDomain };
   domain.Bind(1, netstack);
   while (domain.Step())
-    domains.push_back(domain.Text(0));
+    domains.push_back(domain.Text(kDomain));
 }
 
 void SaveDns(Store& store, const std::string& netstack, const std::vector<std::string>& servers,
@@ -382,14 +428,14 @@ void InsertHostsEntry(Store& store, const std::string& ip, const std::string& ho
     throw HostCtlException("The comment must be a single line");
   Statement existing = store.Prepare(
       "SELECT system FROM ipsvc_hosts WHERE address = ? AND hostname = ? COLLATE NOCASE");
-  existing.BindAll(address, hostname);
+  BindAddress(existing, 1, address);
+  existing.Bind(2, hostname);
   if (existing.Step())
     throw HostCtlException("An entry for " + address + " " + hostname + " already exists");
-  store
-      .Prepare("INSERT INTO ipsvc_hosts(address, hostname, aliases, comment, system) "
-               "VALUES(?, ?, ?, ?, ?)")
-      .BindAll(address, hostname, joined, comment, system)
-      .Run();
+  Statement insert = store.Prepare("INSERT INTO ipsvc_hosts(address, hostname, aliases, comment, "
+                                   "system) VALUES(?, ?, ?, ?, ?)");
+  BindAddress(insert, 1, address);
+  insert.Bind(2, hostname).Bind(3, joined).Bind(4, comment).Bind(5, system).Run();
 }
 
 void InsertSa(Store& store, const IpSecSadParam& sa) {
@@ -423,10 +469,11 @@ void InsertSa(Store& store, const IpSecSadParam& sa) {
   }
   Statement same =
       store.Prepare("SELECT name FROM ipsvc_ipsec_sa WHERE destination = ? AND spi = ?");
+  enum { kName };
   same.BindAll(destination, static_cast<int64_t>(sa.spi));
   if (same.Step())
-    throw HostCtlException("The SA " + same.Text(0) + " already uses destination " + destination +
-                           " with that SPI");
+    throw HostCtlException("The SA " + same.Text(kName) + " already uses destination " +
+                           destination + " with that SPI");
   store
       .Prepare("INSERT INTO ipsvc_ipsec_sa(name, source, destination, spi, mode, encryption, "
                "integrity, encryption_key, integrity_key, state, lifetime) "
@@ -475,10 +522,11 @@ void InsertSp(Store& store, const IpSecSpdParam& sp) {
       "SELECT name FROM ipsvc_ipsec_sp WHERE source = ? AND source_prefix = ? AND source_port = "
       "? AND destination = ? AND destination_prefix = ? AND destination_port = ? AND protocol = "
       "? AND direction = ?");
+  enum { kName };
   same.BindAll(source, sp.srcPrefixLength, static_cast<int64_t>(sp.srcPort), destination,
                sp.dstPrefixLength, static_cast<int64_t>(sp.dstPort), sp.ulProto, sp.direction);
   if (same.Step())
-    throw HostCtlException("The SP " + same.Text(0) +
+    throw HostCtlException("The SP " + same.Text(kName) +
                            " already covers that traffic in that direction");
   store
       .Prepare("INSERT INTO ipsvc_ipsec_sp(name, source, source_prefix, source_port, "

@@ -18,6 +18,19 @@
 
 namespace Model::IpSvc {
 
+/// Route addresses are kept as numbers: an IPv4 address as its value, an
+/// IPv6 address as its 16 bytes in network order (a blob).
+void BindAddress(Statement& statement, int index, const HostCtl::Network::Ipv4Address& address);
+void BindAddress(Statement& statement, int index, const HostCtl::Network::Ipv6Address& address);
+/// Binds the address \p text (IPv4 or IPv6, canonical or not) in its kept
+/// form; throws HostCtlException for text that is neither.
+void BindAddress(Statement& statement, int index, const std::string& text);
+/// The canonical text of the address kept in \p column, of either family.
+std::string AddressText(const Statement& row, int column);
+/// The address kept in \p column (the unspecified address for anything else).
+HostCtl::Network::Ipv4Address Ipv4Column(const Statement& row, int column);
+HostCtl::Network::Ipv6Address Ipv6Column(const Statement& row, int column);
+
 /// The key of the default netstack instance.
 inline constexpr const char* kDefaultNetstack = "defaultTcpipStack";
 

@@ -7,7 +7,10 @@ namespace Model {
 
 using nlohmann::ordered_json;
 
-ordered_json ParseDescription(const std::string& text) {
+namespace {
+
+/// Parses \p input (a text or a file) with the checks of ParseDescription.
+template <typename Input> ordered_json Parse(Input&& input, const ElementHook* hook) {
   // The parser keeps the last of repeated keys without a word; a description
   // that says two things about one field is refused instead.
   struct Frame {
@@ -27,6 +30,13 @@ ordered_json ParseDescription(const std::string& text) {
     }
     return where;
   };
+  // An element of a top-level array is complete: the hook decides whether it
+  // stays. \p depth is the number of frames open around the element.
+  auto element = [&](std::size_t depth, ordered_json& value) {
+    if (!hook || frames.size() != depth || depth < 2 || !frames[0].object || frames[1].object)
+      return true;
+    return (*hook)(frames[0].key, frames[1].count - 1, value);
+  };
   using Event = nlohmann::ordered_json::parse_event_t;
   auto callback = [&](int, Event event, ordered_json& parsed) {
     switch (event) {
@@ -37,10 +47,12 @@ ordered_json ParseDescription(const std::string& text) {
       frames.push_back({event == Event::object_start, {}, {}, 0});
       break;
     case Event::object_end:
-    case Event::array_end:
+    case Event::array_end: {
+      bool keep = element(3, parsed);
       if (!frames.empty())
         frames.pop_back();
-      break;
+      return keep;
+    }
     case Event::key: {
       Frame& frame = frames.back();
       std::string key = parsed.get<std::string>();
@@ -55,12 +67,12 @@ ordered_json ParseDescription(const std::string& text) {
     case Event::value:
       if (!frames.empty() && !frames.back().object)
         ++frames.back().count;
-      break;
+      return element(2, parsed);
     }
     return true;
   };
   try {
-    return ordered_json::parse(text, callback);
+    return ordered_json::parse(std::forward<Input>(input), callback);
   } catch (const nlohmann::json::parse_error& e) {
     // "[json.exception.parse_error.101] parse error at line 1, ...": the
     // reader wants the part after the library's own tag.
@@ -69,6 +81,16 @@ ordered_json ParseDescription(const std::string& text) {
       message.erase(0, tag + 2);
     throw ImportError("not JSON: " + message);
   }
+}
+
+} // namespace
+
+ordered_json ParseDescription(const std::string& text) {
+  return Parse(text, nullptr);
+}
+
+ordered_json ParseDescription(std::FILE* file, const ElementHook& hook) {
+  return Parse(file, &hook);
 }
 
 JsonObject::JsonObject(const ordered_json& value, std::string path)

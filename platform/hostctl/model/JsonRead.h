@@ -10,6 +10,8 @@
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
+#include <cstdio>
+#include <functional>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -27,6 +29,16 @@ public:
 /// is not JSON (naming the line and column) and for an object that repeats a
 /// key (naming the object: "nics[0]: duplicate key \"name\"").
 nlohmann::ordered_json ParseDescription(const std::string& text);
+
+/// Called for each element of an array that is the value of a top-level key,
+/// once the element is read; returns whether the element stays in the
+/// document (false drops it, so that a large array never is in memory whole).
+using ElementHook =
+    std::function<bool(const std::string& key, std::size_t index, nlohmann::ordered_json& element)>;
+
+/// Parses a host description from \p file as ParseDescription does, handing
+/// the elements of top-level arrays to \p hook as they are read.
+nlohmann::ordered_json ParseDescription(std::FILE* file, const ElementHook& hook);
 
 /// One JSON object of the host description, with its path for messages.
 class JsonObject {

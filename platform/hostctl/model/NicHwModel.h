@@ -3,7 +3,7 @@
 // Each physical NIC may hold one record of every hardware kind: offloads,
 // coalescing, rings, NetQueue, software simulation, EEPROM, registers, self
 // test, DCB and hardware capabilities. A record is kept as JSON text in the
-// side table pnic_hw, in the same form as the NIC's key of that name in the
+// side table pnic_record, in the same form as the NIC's key of that name in the
 // host description; a NIC without a record of a kind does not have that
 // feature. The codecs below turn the JSON into host records and back, and
 // check every value on the way in.

@@ -1,7 +1,7 @@
 //===- model/NicHwPart.cpp - Hardware settings of the physical NICs -------===//
 //
 // The NIC hardware part keeps, per physical NIC, one JSON record of each
-// hardware kind in the side table pnic_hw (see NicHwModel.h). It imports the
+// hardware kind in the side table pnic_record (see NicHwModel.h). It imports the
 // keys of the same names inside each object of "nics" and exports them back.
 //
 //===----------------------------------------------------------------------===//
@@ -595,18 +595,19 @@ bool NicHwPnicExists(Store& store, const std::string& nic) {
 }
 
 bool LoadNicHwRecord(Store& store, const std::string& nic, const char* kind, std::string& text) {
-  Statement row = store.Prepare("SELECT value FROM pnic_hw WHERE nic = ? AND kind = ?");
+  Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = ?");
+  enum { kValue };
   row.BindAll(nic, kind);
   if (!row.Step())
     return false;
-  text = row.Text(0);
+  text = row.Text(kValue);
   return true;
 }
 
 void SaveNicHwRecord(Store& store, const std::string& nic, const char* kind,
                      const ordered_json& record) {
   store
-      .Prepare("INSERT INTO pnic_hw(nic, kind, value) VALUES(?, ?, ?) "
+      .Prepare("INSERT INTO pnic_record(nic, kind, value) VALUES(?, ?, ?) "
                "ON CONFLICT(nic, kind) DO UPDATE SET value = excluded.value")
       .BindAll(nic, kind, record.dump())
       .Run();
@@ -617,10 +618,12 @@ void SaveNicHwRecord(Store& store, const std::string& nic, const char* kind,
 namespace {
 
 const char* const kNicHwSchema = R"sql(
--- Hardware records of physical NICs, one JSON document per NIC and kind
--- (offload, coalesce, ring, netqueue, softwareSimulation, eeprom, registers,
--- selfTest, dcb, hwCap). A NIC without a record of a kind lacks the feature.
-CREATE TABLE pnic_hw(
+-- Records of physical NICs, one JSON document per NIC and kind: the generic
+-- information ("info") and counters ("stats") of the NIC part, and the
+-- hardware kinds (offload, coalesce, ring, netqueue, softwareSimulation,
+-- eeprom, registers, selfTest, dcb, hwCap). A NIC without a hardware record
+-- of a kind lacks the feature.
+CREATE TABLE pnic_record(
   nic TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
   kind TEXT NOT NULL,
   value TEXT NOT NULL,
@@ -687,7 +690,7 @@ void ImportNicHw(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportNicHw(ordered_json& host, Store& store) {
+void ExportNicHw(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   if (!host.contains("nics"))
     return;
   for (ordered_json& nic : host["nics"]) {

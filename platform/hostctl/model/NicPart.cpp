@@ -1,11 +1,11 @@
 //===- model/NicPart.cpp - Information, counters, SR-IOV and attachments --===//
 //
-// The NIC part keeps, in side tables keyed by pnic.name, what the host knows
-// of each physical NIC beyond its basic state: the generic information record
-// (ports, link modes, PHY, transceiver, wake-on, message level), pause
-// settings and driver versions, packet counters, SR-IOV virtual functions with
-// their counters, the branches attached to a trunk uplink, and the per-VLAN
-// counters of an uplink.
+// The NIC part keeps what the host knows of each physical NIC beyond its
+// basic state: the generic information record (ports, link modes, PHY,
+// transceiver, wake-on, message level), pause settings and driver versions
+// and the packet counters (documents of kinds "info" and "stats" in
+// pnic_record), SR-IOV virtual functions with their counters, the branches
+// attached to a trunk uplink, and the per-VLAN counters of an uplink.
 //
 // Host description keys, inside each object of "nics":
 //   "info": {"supportedPorts": [port codes 0-6], "supportsAutoNegotiation",
@@ -94,51 +94,14 @@ const std::array<CounterKey<SriovNicVFStats>, 20> kVfStatsKeys = {{
 namespace {
 
 const char* const kNicSchema = R"sql(
--- Generic information, pause settings and driver versions of a physical NIC.
--- Lists are JSON arrays: ports and wake-on modes of codes, advertised modes
--- of [speed, duplex, media] triples.
-CREATE TABLE pnic_info(
-  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE,
-  supported_ports TEXT NOT NULL DEFAULT '[]',
-  supports_autoneg INTEGER NOT NULL DEFAULT 0,
-  advertised_modes TEXT NOT NULL DEFAULT '[]',
-  advertised_autoneg INTEGER NOT NULL DEFAULT 0,
-  port INTEGER NOT NULL DEFAULT 0,
-  phy_address INTEGER NOT NULL DEFAULT 0,
-  transceiver INTEGER NOT NULL DEFAULT 0,
-  autoneg INTEGER NOT NULL DEFAULT 0,
-  supports_wakeon INTEGER NOT NULL DEFAULT 0,
-  wakeon TEXT NOT NULL DEFAULT '[]',
-  msglvl_supported INTEGER NOT NULL DEFAULT 0,
-  msglvl INTEGER NOT NULL DEFAULT 0,
-  virtual_address TEXT NOT NULL DEFAULT '',
-  driver_version TEXT NOT NULL DEFAULT '',
-  firmware_version TEXT NOT NULL DEFAULT '',
-  pause_supported INTEGER NOT NULL DEFAULT 0,
-  pause_autoneg INTEGER NOT NULL DEFAULT 0,
-  pause_rx INTEGER NOT NULL DEFAULT 0,
-  pause_tx INTEGER NOT NULL DEFAULT 0
-) WITHOUT ROWID;
-
--- Packet counters of a NIC: a JSON object of counter name to count.
-CREATE TABLE pnic_stats(
-  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE,
-  counters TEXT NOT NULL DEFAULT '{}'
-) WITHOUT ROWID;
-
--- NICs with SR-IOV enabled (physical functions).
-CREATE TABLE sriov_nic(
-  nic TEXT PRIMARY KEY REFERENCES pnic(name) ON DELETE CASCADE
-) WITHOUT ROWID;
-
 -- Virtual functions of SR-IOV NICs, with their counters as a JSON object.
 CREATE TABLE sriov_vf(
-  nic TEXT NOT NULL REFERENCES sriov_nic(nic) ON DELETE CASCADE,
+  nic TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
   vf_id INTEGER NOT NULL,
-  active INTEGER NOT NULL DEFAULT 0,
-  pci_address TEXT NOT NULL DEFAULT '',
-  owner_world TEXT NOT NULL DEFAULT '',
-  counters TEXT NOT NULL DEFAULT '{}',
+  active INTEGER NOT NULL,
+  pci_address TEXT NOT NULL,
+  owner_world TEXT NOT NULL,
+  counters TEXT NOT NULL,
   PRIMARY KEY(nic, vf_id)
 ) WITHOUT ROWID;
 
@@ -151,29 +114,16 @@ CREATE TABLE pnic_attachment(
   ord INTEGER NOT NULL,
   UNIQUE(trunk, vlan_id)
 ) WITHOUT ROWID;
-CREATE INDEX pnic_attachment_by_trunk ON pnic_attachment(trunk, ord);
 
 -- Per-VLAN packet counters of an uplink NIC; they are shown while VLAN
 -- statistics are enabled on the uplink (uplink.vlan_stats).
 CREATE TABLE pnic_vlan_counter(
   nic TEXT NOT NULL REFERENCES pnic(name) ON DELETE CASCADE,
   vlan_id INTEGER NOT NULL,
-  rx_packets INTEGER NOT NULL DEFAULT 0,
-  tx_packets INTEGER NOT NULL DEFAULT 0,
+  rx_packets INTEGER NOT NULL,
+  tx_packets INTEGER NOT NULL,
   PRIMARY KEY(nic, vlan_id)
 ) WITHOUT ROWID;
-
--- NICs whose description turns VLAN statistics on. The switching part adds
--- uplinks after this part has imported; the trigger below turns counting on
--- as the NIC becomes an uplink and consumes the row, so the table is empty
--- once an import is complete (import checks that each such NIC is an uplink).
-CREATE TABLE pnic_vlan_stats_import(nic TEXT PRIMARY KEY) WITHOUT ROWID;
-CREATE TRIGGER uplink_vlan_stats_import AFTER INSERT ON uplink
-WHEN EXISTS(SELECT 1 FROM pnic_vlan_stats_import WHERE nic = NEW.nic)
-BEGIN
-  UPDATE uplink SET vlan_stats = 1 WHERE portset_id = NEW.portset_id AND nic = NEW.nic;
-  DELETE FROM pnic_vlan_stats_import WHERE nic = NEW.nic;
-END;
 )sql";
 
 /// Whether the description names \p nic as an uplink of any switch.
@@ -198,13 +148,6 @@ ordered_json CodesToJson(const std::vector<uint32_t>& codes) {
   for (uint32_t code : codes)
     array.push_back(code);
   return array;
-}
-
-std::vector<uint32_t> CodesFromJson(const std::string& text) {
-  std::vector<uint32_t> codes;
-  for (const auto& code : ordered_json::parse(text))
-    codes.push_back(code.get<uint32_t>());
-  return codes;
 }
 
 /// Refuses keys of a nested object that are not in \p allowed.
@@ -243,15 +186,79 @@ std::string CountersToText(const std::array<CounterKey<Record>, N>& keys, const 
   return object.dump();
 }
 
+/// The settings of a NIC as its description writes them: "info",
+/// "driverInfo" and "pause".
+ordered_json SettingsToJson(const NicSettings& settings) {
+  const HostCtl::Network::PnicInfo& record = settings.info;
+  ordered_json info = ordered_json::object();
+  info["supportedPorts"] = CodesToJson(record.supportedPorts);
+  info["supportsAutoNegotiation"] = record.supportsAutoNegotiation;
+  ordered_json modes = ordered_json::array();
+  for (const HostCtl::Network::PnicLinkMode& mode : record.advertisedModes)
+    modes.push_back({{"speed", mode.speed}, {"duplex", mode.duplex}, {"media", mode.media}});
+  info["advertisedModes"] = std::move(modes);
+  info["advertisedAutoNegotiation"] = record.advertisedAutoNegotiation;
+  info["port"] = record.port;
+  info["phyAddress"] = record.phyAddress;
+  info["transceiver"] = record.transceiver;
+  info["autoNegotiation"] = record.autoNegotiation;
+  info["supportsWakeOn"] = record.supportsWakeOn;
+  info["wakeOn"] = CodesToJson(record.wakeOn);
+  info["messageLevelSupported"] = record.messageLevelSupported;
+  info["messageLevel"] = record.messageLevel;
+  info["virtualAddress"] = record.virtualAddress;
+  return {{"info", std::move(info)},
+          {"driverInfo",
+           {{"version", settings.driverVersion}, {"firmwareVersion", settings.firmwareVersion}}},
+          {"pause",
+           {{"supported", settings.pause.supported},
+            {"autoNegotiation", settings.pause.autoNegotiation},
+            {"rx", settings.pause.rx},
+            {"tx", settings.pause.tx}}}};
+}
+
+/// Reads what SettingsToJson wrote.
+NicSettings SettingsFromJson(const ordered_json& json) {
+  NicSettings settings;
+  const ordered_json& info = json.at("info");
+  HostCtl::Network::PnicInfo& record = settings.info;
+  record.supportedPorts = info.at("supportedPorts").get<std::vector<uint32_t>>();
+  record.supportsAutoNegotiation = info.at("supportsAutoNegotiation").get<bool>();
+  for (const ordered_json& mode : info.at("advertisedModes"))
+    record.advertisedModes.push_back({mode.at("speed").get<uint32_t>(),
+                                      mode.at("duplex").get<uint32_t>(),
+                                      mode.at("media").get<uint32_t>()});
+  record.advertisedAutoNegotiation = info.at("advertisedAutoNegotiation").get<bool>();
+  record.port = info.at("port").get<uint32_t>();
+  record.phyAddress = info.at("phyAddress").get<uint32_t>();
+  record.transceiver = info.at("transceiver").get<uint32_t>();
+  record.autoNegotiation = info.at("autoNegotiation").get<bool>();
+  record.supportsWakeOn = info.at("supportsWakeOn").get<bool>();
+  record.wakeOn = info.at("wakeOn").get<std::vector<uint32_t>>();
+  record.messageLevelSupported = info.at("messageLevelSupported").get<bool>();
+  record.messageLevel = info.at("messageLevel").get<uint32_t>();
+  record.virtualAddress = info.at("virtualAddress").get<std::string>();
+  const ordered_json& driver = json.at("driverInfo");
+  settings.driverVersion = driver.at("version").get<std::string>();
+  settings.firmwareVersion = driver.at("firmwareVersion").get<std::string>();
+  const ordered_json& pause = json.at("pause");
+  settings.pause.supported = pause.at("supported").get<bool>();
+  settings.pause.autoNegotiation = pause.at("autoNegotiation").get<bool>();
+  settings.pause.rx = pause.at("rx").get<bool>();
+  settings.pause.tx = pause.at("tx").get<bool>();
+  return settings;
+}
+
 /// The settings a NIC has when its description gives none: its current link
 /// mode advertised, and nothing else supported.
 NicSettings DefaultSettings(Store& store, const std::string& nic) {
   NicSettings settings;
   Statement row = store.Prepare("SELECT speed, duplex FROM pnic WHERE name = ?");
+  enum { kSpeed, kDuplex };
   row.Bind(1, nic);
-  if (row.Step() && row.Int(0) > 0)
+  if (row.Step() && row.Int(kSpeed) > 0)
     settings.info.advertisedModes.push_back(
-        {static_cast<uint32_t>(row.Int(0)), static_cast<uint32_t>(row.Int(1)), 1});
+        {static_cast<uint32_t>(row.Int(kSpeed)), static_cast<uint32_t>(row.Int(kDuplex)), 1});
   return settings;
 }
 
@@ -323,7 +330,7 @@ void ImportNic(const ordered_json& host, Store& store) {
 
     PnicStats stats;
     ReadCounters(nic.Object("stats"), kPnicStatsKeys, stats);
-    store.Prepare("INSERT INTO pnic_stats(nic, counters) VALUES(?, ?)")
+    store.Prepare("INSERT INTO pnic_record(nic, kind, value) VALUES(?, 'stats', ?)")
         .BindAll(name, CountersToText(kPnicStatsKeys, stats))
         .Run();
 
@@ -332,7 +339,7 @@ void ImportNic(const ordered_json& host, Store& store) {
     if (!sriov && !vfs.empty())
       nic.Fail("vfs", "requires \"sriov\": true");
     if (sriov)
-      store.Prepare("INSERT INTO sriov_nic(nic) VALUES(?)").BindAll(name).Run();
+      store.Prepare("UPDATE pnic SET sriov = 1 WHERE name = ?").BindAll(name).Run();
     for (const JsonObject& vf : vfs) {
       int64_t id = vf.Int("id", 0, 255);
       if (!vf.Bool("active", false) && !vf.String("ownerWorldId", "").empty())
@@ -350,11 +357,9 @@ void ImportNic(const ordered_json& host, Store& store) {
         vf.Fail("id", "VF " + std::to_string(id) + " is listed twice");
     }
 
-    if (nic.Bool("vlanStats", false)) {
-      if (!IsDescribedUplink(host, name))
-        nic.Fail("vlanStats", "VLAN statistics need the NIC to be an uplink of a switch");
-      store.Prepare("INSERT INTO pnic_vlan_stats_import(nic) VALUES(?)").BindAll(name).Run();
-    }
+    // The switching part turns counting on as it adds the uplinks.
+    if (nic.Bool("vlanStats", false) && !IsDescribedUplink(host, name))
+      nic.Fail("vlanStats", "VLAN statistics need the NIC to be an uplink of a switch");
     for (const JsonObject& counter : nic.Objects("vlanCounters")) {
       int64_t vlan = counter.Int("vlanId", 0, 4094);
       store
@@ -382,57 +387,37 @@ void ImportNic(const ordered_json& host, Store& store) {
   }
 }
 
-void ExportNic(ordered_json& host, Store& store) {
+void ExportNic(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   if (!host.contains("nics"))
     return;
   for (ordered_json& nic : host["nics"]) {
     std::string name = nic["name"].get<std::string>();
-    NicSettings settings = LoadNicSettings(store, name);
-    const HostCtl::Network::PnicInfo& record = settings.info;
-    ordered_json info = ordered_json::object();
-    info["supportedPorts"] = CodesToJson(record.supportedPorts);
-    info["supportsAutoNegotiation"] = record.supportsAutoNegotiation;
-    ordered_json modes = ordered_json::array();
-    for (const HostCtl::Network::PnicLinkMode& mode : record.advertisedModes)
-      modes.push_back({{"speed", mode.speed}, {"duplex", mode.duplex}, {"media", mode.media}});
-    info["advertisedModes"] = std::move(modes);
-    info["advertisedAutoNegotiation"] = record.advertisedAutoNegotiation;
-    info["port"] = record.port;
-    info["phyAddress"] = record.phyAddress;
-    info["transceiver"] = record.transceiver;
-    info["autoNegotiation"] = record.autoNegotiation;
-    info["supportsWakeOn"] = record.supportsWakeOn;
-    info["wakeOn"] = CodesToJson(record.wakeOn);
-    info["messageLevelSupported"] = record.messageLevelSupported;
-    info["messageLevel"] = record.messageLevel;
-    info["virtualAddress"] = record.virtualAddress;
-    nic["info"] = std::move(info);
-    nic["driverInfo"] = {{"version", settings.driverVersion},
-                         {"firmwareVersion", settings.firmwareVersion}};
-    nic["pause"] = {{"supported", settings.pause.supported},
-                    {"autoNegotiation", settings.pause.autoNegotiation},
-                    {"rx", settings.pause.rx},
-                    {"tx", settings.pause.tx}};
+    ordered_json settings = SettingsToJson(LoadNicSettings(store, name));
+    for (auto& [key, value] : settings.items())
+      nic[key] = std::move(value);
 
-    Statement stats = store.Prepare("SELECT counters FROM pnic_stats WHERE nic = ?");
+    Statement stats =
+        store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'stats'");
+    enum { kValue };
     stats.Bind(1, name);
     if (stats.Step())
-      nic["stats"] = ordered_json::parse(stats.Text(0));
+      nic["stats"] = ordered_json::parse(stats.Text(kValue));
 
-    Statement sriov = store.Prepare("SELECT 1 FROM sriov_nic WHERE nic = ?");
+    Statement sriov = store.Prepare("SELECT 1 FROM pnic WHERE name = ? AND sriov = 1");
     sriov.Bind(1, name);
     if (sriov.Step()) {
       nic["sriov"] = true;
       ordered_json vfs = ordered_json::array();
       Statement rows = store.Prepare("SELECT vf_id, active, pci_address, owner_world, counters "
                                      "FROM sriov_vf WHERE nic = ? ORDER BY vf_id");
+      enum { kVfId, kActive, kPciAddress, kOwnerWorld, kCounters };
       rows.Bind(1, name);
       while (rows.Step())
-        vfs.push_back({{"id", rows.Int(0)},
-                       {"active", rows.Bool(1)},
-                       {"pciAddress", rows.Text(2)},
-                       {"ownerWorldId", rows.Text(3)},
-                       {"stats", ordered_json::parse(rows.Text(4))}});
+        vfs.push_back({{"id", rows.Int(kVfId)},
+                       {"active", rows.Bool(kActive)},
+                       {"pciAddress", rows.Text(kPciAddress)},
+                       {"ownerWorldId", rows.Text(kOwnerWorld)},
+                       {"stats", ordered_json::parse(rows.Text(kCounters))}});
       if (!vfs.empty())
         nic["vfs"] = std::move(vfs);
     }
@@ -440,9 +425,11 @@ void ExportNic(ordered_json& host, Store& store) {
     ordered_json attachments = ordered_json::array();
     Statement branches =
         store.Prepare("SELECT branch, vlan_id FROM pnic_attachment WHERE trunk = ? ORDER BY ord");
+    enum { kBranch, kVlanId };
     branches.Bind(1, name);
     while (branches.Step())
-      attachments.push_back({{"branch", branches.Text(0)}, {"vlanId", branches.Int(1)}});
+      attachments.push_back(
+          {{"branch", branches.Text(kBranch)}, {"vlanId", branches.Int(kVlanId)}});
     if (!attachments.empty())
       nic["attachments"] = std::move(attachments);
 
@@ -455,10 +442,12 @@ void ExportNic(ordered_json& host, Store& store) {
     ordered_json counters = ordered_json::array();
     Statement vlans = store.Prepare("SELECT vlan_id, rx_packets, tx_packets FROM "
                                     "pnic_vlan_counter WHERE nic = ? ORDER BY vlan_id");
+    enum { kVlansVlanId, kVlansRxPackets, kVlansTxPackets };
     vlans.Bind(1, name);
     while (vlans.Step())
-      counters.push_back(
-          {{"vlanId", vlans.Int(0)}, {"rxPackets", vlans.Int(1)}, {"txPackets", vlans.Int(2)}});
+      counters.push_back({{"vlanId", vlans.Int(kVlansVlanId)},
+                          {"rxPackets", vlans.Int(kVlansRxPackets)},
+                          {"txPackets", vlans.Int(kVlansTxPackets)}});
     if (!counters.empty())
       nic["vlanCounters"] = std::move(counters);
   }
@@ -467,58 +456,19 @@ void ExportNic(ordered_json& host, Store& store) {
 } // namespace
 
 NicSettings LoadNicSettings(Store& store, const std::string& nic) {
-  Statement row = store.Prepare(
-      "SELECT supported_ports, supports_autoneg, advertised_modes, advertised_autoneg, port, "
-      "phy_address, transceiver, autoneg, supports_wakeon, wakeon, msglvl_supported, msglvl, "
-      "virtual_address, driver_version, firmware_version, pause_supported, pause_autoneg, "
-      "pause_rx, pause_tx FROM pnic_info WHERE nic = ?");
+  Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'info'");
+  enum { kValue };
   row.Bind(1, nic);
   if (!row.Step())
     return DefaultSettings(store, nic);
-  NicSettings settings;
-  HostCtl::Network::PnicInfo& info = settings.info;
-  info.supportedPorts = CodesFromJson(row.Text(0));
-  info.supportsAutoNegotiation = row.Bool(1);
-  for (const auto& mode : ordered_json::parse(row.Text(2)))
-    info.advertisedModes.push_back(
-        {mode.at(0).get<uint32_t>(), mode.at(1).get<uint32_t>(), mode.at(2).get<uint32_t>()});
-  info.advertisedAutoNegotiation = row.Bool(3);
-  info.port = static_cast<uint32_t>(row.Int(4));
-  info.phyAddress = static_cast<uint32_t>(row.Int(5));
-  info.transceiver = static_cast<uint32_t>(row.Int(6));
-  info.autoNegotiation = row.Bool(7);
-  info.supportsWakeOn = row.Bool(8);
-  info.wakeOn = CodesFromJson(row.Text(9));
-  info.messageLevelSupported = row.Bool(10);
-  info.messageLevel = static_cast<uint32_t>(row.Int(11));
-  info.virtualAddress = row.Text(12);
-  settings.driverVersion = row.Text(13);
-  settings.firmwareVersion = row.Text(14);
-  settings.pause.supported = row.Bool(15);
-  settings.pause.autoNegotiation = row.Bool(16);
-  settings.pause.rx = row.Bool(17);
-  settings.pause.tx = row.Bool(18);
-  return settings;
+  return SettingsFromJson(ordered_json::parse(row.Text(kValue)));
 }
 
 void SaveNicSettings(Store& store, const std::string& nic, const NicSettings& settings) {
-  const HostCtl::Network::PnicInfo& info = settings.info;
-  ordered_json modes = ordered_json::array();
-  for (const HostCtl::Network::PnicLinkMode& mode : info.advertisedModes)
-    modes.push_back({mode.speed, mode.duplex, mode.media});
-  Statement save = store.Prepare(
-      "INSERT OR REPLACE INTO pnic_info(nic, supported_ports, supports_autoneg, "
-      "advertised_modes, advertised_autoneg, port, phy_address, transceiver, autoneg, "
-      "supports_wakeon, wakeon, msglvl_supported, msglvl, virtual_address, driver_version, "
-      "firmware_version, pause_supported, pause_autoneg, pause_rx, pause_tx) "
-      "VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
-  save.BindAll(nic, CodesToJson(info.supportedPorts).dump(), info.supportsAutoNegotiation,
-               modes.dump(), info.advertisedAutoNegotiation, info.port, info.phyAddress,
-               info.transceiver, info.autoNegotiation, info.supportsWakeOn,
-               CodesToJson(info.wakeOn).dump(), info.messageLevelSupported, info.messageLevel,
-               info.virtualAddress, settings.driverVersion, settings.firmwareVersion,
-               settings.pause.supported, settings.pause.autoNegotiation, settings.pause.rx,
-               settings.pause.tx)
+  store
+      .Prepare("INSERT INTO pnic_record(nic, kind, value) VALUES(?, 'info', ?) "
+               "ON CONFLICT(nic, kind) DO UPDATE SET value = excluded.value")
+      .BindAll(nic, SettingsToJson(settings).dump())
       .Run();
 }
 
@@ -542,8 +492,9 @@ void AddAttachment(Store& store, const std::string& trunk, const std::string& br
   // The cached statement is reset when each look-up's Statement goes away.
   auto trunkOf = [&](const std::string& nic) -> std::optional<std::string> {
     Statement row = store.Prepare("SELECT trunk FROM pnic_attachment WHERE branch = ?");
+    enum { kTrunk };
     row.Bind(1, nic);
-    return row.Step() ? std::optional<std::string>(row.Text(0)) : std::nullopt;
+    return row.Step() ? std::optional<std::string>(row.Text(kTrunk)) : std::nullopt;
   };
   if (std::optional<std::string> current = trunkOf(branch))
     throw HostCtlException("Uplink " + branch + " is already attached to " + *current);
@@ -559,18 +510,21 @@ void AddAttachment(Store& store, const std::string& trunk, const std::string& br
   {
     Statement sameVlan =
         store.Prepare("SELECT branch FROM pnic_attachment WHERE trunk = ? AND vlan_id = ?");
+    enum { kBranch };
     sameVlan.BindAll(trunk, vlanId);
     if (sameVlan.Step())
       throw HostCtlException("VLAN " + std::to_string(vlanId) + " of trunk " + trunk +
-                             " is already used by branch " + sameVlan.Text(0));
+                             " is already used by branch " + sameVlan.Text(kBranch));
   }
   int64_t ord = 0;
   {
     Statement next =
-        store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM pnic_attachment WHERE trunk = ?");
+        store.Prepare("SELECT coalesce(max(ord), -1) + 1 AS next_ord FROM pnic_attachment WHERE "
+                      "trunk = ?");
+    enum { kNextOrd };
     next.Bind(1, trunk);
     next.Step();
-    ord = next.Int(0);
+    ord = next.Int(kNextOrd);
   }
   store.Prepare("INSERT INTO pnic_attachment(branch, trunk, vlan_id, ord) VALUES(?, ?, ?, ?)")
       .BindAll(branch, trunk, vlanId, ord)

@@ -3,9 +3,12 @@
 
 #include "HostCtl/Lib.h"
 #include "HostCtl/Session.h"
+#include "model/CoreModel.h"
 #include "model/HostDescription.h"
+#include "model/Migration.h"
 #include "model/Part.h"
 
+#include <nlohmann/json.hpp>
 #include <sqlite3.h>
 
 #include <cerrno>
@@ -23,9 +26,9 @@ using HostCtl::Lib::HostCtlException;
 
 namespace {
 
-/// Identifies our files ("OSTR") and the layout of their tables.
+/// Identifies our files ("OSTR"); model/Migration.h has the layout version.
 constexpr int kApplicationId = 0x4f535452;
-constexpr int kSchemaVersion = 2;
+constexpr int64_t kSchemaVersion = kLayoutVersion;
 
 std::unique_ptr<Store>& HostSlot() {
   static std::unique_ptr<Store> store;
@@ -100,6 +103,13 @@ Statement& Statement::BindNull(int index) {
   return *this;
 }
 
+Statement& Statement::BindBlob(int index, const void* data, std::size_t size) {
+  int rc = sqlite3_bind_blob(stmt_, index, data, static_cast<int>(size), SQLITE_TRANSIENT);
+  if (rc != SQLITE_OK)
+    store_->Fail(rc, "binding a value");
+  return *this;
+}
+
 bool Statement::Step() {
   int rc = sqlite3_step(stmt_);
   if (rc == SQLITE_ROW)
@@ -132,6 +142,16 @@ std::string Statement::Text(int column) const {
 
 bool Statement::IsNull(int column) const {
   return sqlite3_column_type(stmt_, column) == SQLITE_NULL;
+}
+
+bool Statement::Blob(int column, void* out, std::size_t size) const {
+  if (sqlite3_column_type(stmt_, column) != SQLITE_BLOB)
+    return false;
+  const void* bytes = sqlite3_column_blob(stmt_, column);
+  if (static_cast<std::size_t>(sqlite3_column_bytes(stmt_, column)) != size)
+    return false;
+  std::memcpy(out, bytes, size);
+  return true;
 }
 
 std::optional<std::string> Statement::OptText(int column) const {
@@ -187,13 +207,15 @@ Store::Store(const std::string& path) : path_(path), cache_(std::make_unique<Cac
   sqlite3_busy_timeout(db_, LockTimeoutSlot());
   try {
     Exec("PRAGMA synchronous=FULL; PRAGMA foreign_keys=ON");
+    // Each pragma below returns one row of one column.
+    enum { kValue };
     Statement check = Prepare("PRAGMA application_id");
     check.Step();
-    int64_t app = check.Int(0);
+    int64_t app = check.Int(kValue);
     check.Reset();
     Statement version = Prepare("PRAGMA user_version");
     version.Step();
-    int64_t schema = version.Int(0);
+    int64_t schema = version.Int(kValue);
     version.Reset();
     if (app != kApplicationId)
       throw HostCtlException("The file " + path + " is not a host state database");
@@ -217,35 +239,43 @@ void Store::Upgrade(int64_t from) {
   // Layout 1 kept changes in a write-ahead log beside the file; the rollback
   // journal keeps every committed change in the file itself. Leaving the log
   // needs the file to ourselves, which may take a moment.
+  // Each pragma below returns one row of one column.
+  enum { kValue };
   Statement mode = Prepare("PRAGMA journal_mode");
-  std::string journal = mode.Step() ? mode.Text(0) : std::string();
+  std::string journal = mode.Step() ? mode.Text(kValue) : std::string();
   mode.Reset();
   if (journal == "wal") {
     Statement change = Prepare("PRAGMA journal_mode=DELETE");
-    journal = change.Step() ? change.Text(0) : std::string();
+    journal = change.Step() ? change.Text(kValue) : std::string();
     change.Reset();
     if (journal == "wal")
       throw HostCtlException("The host state at " + path_ +
                              " is locked by another process; try again");
   }
-  Exec("BEGIN IMMEDIATE");
+  // The migration renames and drops tables that others refer to: foreign
+  // keys are checked once at its end instead, and renaming a table leaves
+  // the references to it alone (the old tables all go).
+  Exec("PRAGMA foreign_keys=OFF; PRAGMA legacy_alter_table=ON");
   try {
+    Exec("BEGIN IMMEDIATE");
     Statement version = Prepare("PRAGMA user_version");
     version.Step();
-    int64_t current = version.Int(0);
+    int64_t current = version.Int(kValue);
     version.Reset();
+    // Another process may have migrated the file while this one waited.
     if (current == from) {
-      for (const Part* part : AllParts())
-        if (part->upgrade)
-          part->upgrade(*this, from);
+      MigrateLayout(*this, from);
       Exec(("PRAGMA user_version=" + std::to_string(kSchemaVersion)).c_str());
     }
     Exec("COMMIT");
   } catch (...) {
     if (!sqlite3_get_autocommit(db_))
       sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+    sqlite3_exec(db_, "PRAGMA foreign_keys=ON; PRAGMA legacy_alter_table=OFF", nullptr, nullptr,
+                 nullptr);
     throw;
   }
+  Exec("PRAGMA foreign_keys=ON; PRAGMA legacy_alter_table=OFF");
 }
 
 Store::~Store() {
@@ -352,9 +382,11 @@ void Store::Fail(int rc, std::string_view doing) const {
 
 void Store::LoadFaults() {
   cache_->faults.clear();
-  Statement stmt = Prepare("SELECT operation, object, message FROM fault");
-  while (stmt.Step())
-    cache_->faults.push_back({stmt.Text(0), stmt.Text(1), stmt.Text(2)});
+  if (std::optional<std::string> text = GetSetting(*this, kFaultsSetting))
+    for (const nlohmann::json& fault : nlohmann::json::parse(*text))
+      cache_->faults.push_back({fault.at("operation").get<std::string>(),
+                                fault.at("object").get<std::string>(),
+                                fault.at("message").get<std::string>()});
   cache_->faultsLoaded = true;
 }
 

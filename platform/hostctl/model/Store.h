@@ -12,6 +12,7 @@
 //===----------------------------------------------------------------------===//
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -49,6 +50,8 @@ public:
   }
   Statement& Bind(int index, const char* value) { return Bind(index, std::string_view(value)); }
   Statement& BindNull(int index);
+  /// Binds \p size bytes at \p data as a blob (copied).
+  Statement& BindBlob(int index, const void* data, std::size_t size);
   /// Binds all arguments to parameters 1, 2, ...
   template <typename... Args> Statement& BindAll(const Args&... args) {
     int index = 0;
@@ -70,6 +73,9 @@ public:
   bool IsNull(int column) const;
   /// The column as text, or nothing for NULL.
   std::optional<std::string> OptText(int column) const;
+  /// Copies the column's bytes to \p out when it is a blob of exactly
+  /// \p size bytes; false (and \p out untouched) otherwise.
+  bool Blob(int column, void* out, std::size_t size) const;
 
 private:
   Store* store_;       ///< Owner of the connection, for error texts.

@@ -17,6 +17,7 @@
 #include "model/SwitchingModel.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <set>
 
 namespace Model {
@@ -34,9 +35,9 @@ const char* const kSwitchingSchema = R"sql(
 -- the form of the host description (a field is present when it is set).
 CREATE TABLE vswitch(
   portset_id INTEGER PRIMARY KEY REFERENCES portset(id) ON DELETE CASCADE,
-  cdp INTEGER NOT NULL DEFAULT 1,
-  beacon_interval INTEGER NOT NULL DEFAULT 1,
-  beacon_threshold INTEGER NOT NULL DEFAULT 3,
+  cdp INTEGER NOT NULL,
+  beacon_interval INTEGER NOT NULL,
+  beacon_threshold INTEGER NOT NULL,
   teaming TEXT NOT NULL,
   security TEXT NOT NULL,
   shaping TEXT NOT NULL,
@@ -64,19 +65,9 @@ CREATE TABLE dvswitch(
   lacp_on_dpu INTEGER NOT NULL
 );
 
--- Names and LACP settings of distributed ports.
-CREATE TABLE dvport_lacp(
-  portset_id INTEGER NOT NULL,
-  port_key TEXT NOT NULL,
-  name TEXT NOT NULL DEFAULT '',
-  lacp_enabled INTEGER NOT NULL DEFAULT 0,
-  lacp_mode INTEGER NOT NULL DEFAULT 0,
-  uplink_pg_key TEXT NOT NULL DEFAULT '',
-  PRIMARY KEY(portset_id, port_key),
-  FOREIGN KEY(portset_id, port_key) REFERENCES dvport(portset_id, port_key) ON DELETE CASCADE
-) WITHOUT ROWID;
-
--- Link aggregation groups of distributed switches.
+-- Link aggregation groups of distributed switches. `nics` holds the LACP
+-- runtime state of each NIC of the LAG, a JSON array of objects in the form
+-- of the host description (bit 1 of actorState is the short timeout).
 CREATE TABLE lag(
   portset_id INTEGER NOT NULL REFERENCES portset(id) ON DELETE CASCADE,
   lag_id INTEGER NOT NULL,
@@ -85,35 +76,10 @@ CREATE TABLE lag(
   load_balancing INTEGER NOT NULL,
   uplink_count INTEGER NOT NULL,
   ord INTEGER NOT NULL,
+  nics TEXT NOT NULL,
   PRIMARY KEY(portset_id, lag_id)
 ) WITHOUT ROWID;
 
--- LACP runtime state of each NIC of a LAG. Bit 1 of actor_state is the
--- short timeout.
-CREATE TABLE lacp_nic(
-  portset_id INTEGER NOT NULL,
-  lag_id INTEGER NOT NULL,
-  nic TEXT NOT NULL,
-  ord INTEGER NOT NULL,
-  state TEXT NOT NULL,
-  actor_port_number INTEGER NOT NULL,
-  actor_port_priority INTEGER NOT NULL,
-  actor_admin_key INTEGER NOT NULL,
-  actor_oper_key INTEGER NOT NULL,
-  actor_state INTEGER NOT NULL,
-  partner_age INTEGER NOT NULL,
-  partner_port_number INTEGER NOT NULL,
-  partner_port_priority INTEGER NOT NULL,
-  partner_oper_key INTEGER NOT NULL,
-  partner_state INTEGER NOT NULL,
-  partner_device_id TEXT NOT NULL,
-  rx_lacpdus INTEGER NOT NULL,
-  tx_lacpdus INTEGER NOT NULL,
-  rx_errors INTEGER NOT NULL,
-  tx_errors INTEGER NOT NULL,
-  PRIMARY KEY(portset_id, lag_id, nic),
-  FOREIGN KEY(portset_id, lag_id) REFERENCES lag(portset_id, lag_id) ON DELETE CASCADE
-) WITHOUT ROWID;
 )sql";
 
 /// CDP status names of standard switches, by index.
@@ -324,13 +290,8 @@ void ImportLags(Store& store, const JsonObject& dvs, int64_t id) {
     std::string name = lag.String("name");
     if (name.empty() || name.size() >= sizeof(HostCtl::Network::LagConfig::lagName))
       lag.Fail("name", "expected 1 to 63 bytes");
-    store
-        .Prepare("INSERT INTO lag(portset_id, lag_id, name, mode, load_balancing, uplink_count, "
-                 "ord) VALUES(?, ?, ?, ?, ?, ?, ?)")
-        .BindAll(id, lagId, name, mode == "active" ? 1 : 2, lag.Int("loadBalancing", 0, 20, 0),
-                 lag.Int("uplinkCount", 0, 32, 0), ord++)
-        .Run();
-    int nicOrd = 0;
+    ordered_json nics = ordered_json::array();
+    std::set<std::string> names;
     for (const JsonObject& nic : lag.Objects("nics")) {
       std::string nicName = nic.String("name");
       if (nicName.empty() || nicName.size() >= 32)
@@ -341,25 +302,22 @@ void ImportLags(Store& store, const JsonObject& dvs, int64_t id) {
       std::string device = nic.String("partnerDeviceId", "");
       if (device.size() >= 32)
         nic.Fail("partnerDeviceId", "expected at most 31 bytes");
-      Statement insert = store.Prepare(
-          "INSERT INTO lacp_nic(portset_id, lag_id, nic, ord, state, actor_port_number, "
-          "actor_port_priority, actor_admin_key, actor_oper_key, actor_state, partner_age, "
-          "partner_port_number, partner_port_priority, partner_oper_key, partner_state, "
-          "partner_device_id, rx_lacpdus, tx_lacpdus, rx_errors, tx_errors) "
-          "VALUES(?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
-      insert.BindAll(id, lagId, nicName, nicOrd++, state);
-      int column = 6;
-      for (const LacpField& field : kLacpFields)
-        insert.Bind(column++, nic.Int(field.key, 0, field.max, 0));
-      insert.Bind(column++, device);
-      for (const char* counter : kLacpCounters)
-        insert.Bind(column++, static_cast<int64_t>(nic.Counter(counter)));
-      try {
-        insert.Run();
-      } catch (const HostCtl::Lib::HostCtlException&) {
+      if (!names.insert(nicName).second)
         nic.Fail("name", "\"" + nicName + "\" is listed twice in the LAG");
-      }
+      ordered_json entry = {{"name", nicName}, {"state", state}};
+      for (const LacpField& field : kLacpFields)
+        entry[field.key] = nic.Int(field.key, 0, field.max, 0);
+      entry["partnerDeviceId"] = device;
+      for (const char* counter : kLacpCounters)
+        entry[counter] = nic.Counter(counter);
+      nics.push_back(std::move(entry));
     }
+    store
+        .Prepare("INSERT INTO lag(portset_id, lag_id, name, mode, load_balancing, uplink_count, "
+                 "ord, nics) VALUES(?, ?, ?, ?, ?, ?, ?, ?)")
+        .BindAll(id, lagId, name, mode == "active" ? 1 : 2, lag.Int("loadBalancing", 0, 20, 0),
+                 lag.Int("uplinkCount", 0, 32, 0), ord++, nics.dump())
+        .Run();
   }
 }
 
@@ -411,14 +369,11 @@ void ImportDistributed(const JsonObject& root, Store& store, const char* key, co
       bool isUplink = port.Bool("uplink", false) || port.Has("nic");
       store
           .Prepare("INSERT INTO dvport(portset_id, port_key, portgroup_key, connection_id, "
-                   "is_uplink, ord) VALUES(?, ?, ?, ?, ?, ?)")
+                   "is_uplink, ord, name, lacp_enabled, lacp_mode, uplink_pg_key) "
+                   "VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")
           .BindAll(id, portKey, port.String("portgroupKey", ""),
-                   port.Int("connectionId", 0, 4294967295, 0), isUplink, portOrd++)
-          .Run();
-      store
-          .Prepare("INSERT INTO dvport_lacp(portset_id, port_key, name, lacp_enabled, lacp_mode, "
-                   "uplink_pg_key) VALUES(?, ?, ?, ?, ?, ?)")
-          .BindAll(id, portKey, port.String("name", ""), port.Bool("lacpEnabled", false),
+                   port.Int("connectionId", 0, 4294967295, 0), isUplink, portOrd++,
+                   port.String("name", ""), port.Bool("lacpEnabled", false),
                    port.Int("lacpMode", 0, 2, 0), port.String("uplinkPortgroupKey", ""))
           .Run();
       if (port.Has("nic")) {
@@ -440,14 +395,22 @@ void ImportSwitching(const ordered_json& host, Store& store) {
   int ord = 0;
   ImportDistributed(root, store, "dvswitches", "dvs", ord);
   ImportDistributed(root, store, "opaqueSwitches", "opaque", ord);
+  // The NIC part checked that a NIC that turns VLAN statistics on is an
+  // uplink of a switch of the description; its uplink row exists now.
+  for (const JsonObject& nic : root.Objects("nics"))
+    if (nic.Bool("vlanStats", false))
+      store.Prepare("UPDATE uplink SET vlan_stats = 1 WHERE nic = ?")
+          .Bind(1, nic.String("name"))
+          .Run();
 }
 
 std::vector<std::string> UplinksOf(Store& store, int64_t id) {
   std::vector<std::string> names;
   Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+  enum { kNic };
   rows.Bind(1, id);
   while (rows.Step())
-    names.push_back(rows.Text(0));
+    names.push_back(rows.Text(kNic));
   return names;
 }
 
@@ -456,16 +419,17 @@ ordered_json ExportPortGroups(Store& store, int64_t id) {
   Statement rows = store.Prepare(
       "SELECT g.name, g.vlan_id, g.system, p.teaming, p.security, p.shaping FROM portgroup g "
       "JOIN portgroup_policy p ON p.portgroup_id = g.id WHERE g.portset_id = ? ORDER BY g.ord");
+  enum { kName, kVlanId, kSystem, kTeaming, kSecurity, kShaping };
   rows.Bind(1, id);
   while (rows.Step()) {
     ordered_json pg = ordered_json::object();
-    pg["name"] = rows.Text(0);
-    pg["vlanId"] = rows.Int(1);
-    if (rows.Bool(2))
+    pg["name"] = rows.Text(kName);
+    pg["vlanId"] = rows.Int(kVlanId);
+    if (rows.Bool(kSystem))
       pg["system"] = true;
     const char* keys[] = {"teaming", "security", "shaping"};
     for (int i = 0; i < 3; ++i) {
-      ordered_json policy = ordered_json::parse(rows.Text(3 + i));
+      ordered_json policy = ordered_json::parse(rows.Text(kTeaming + i));
       if (!policy.empty())
         pg[keys[i]] = std::move(policy);
     }
@@ -480,22 +444,36 @@ void ExportStandard(ordered_json& host, Store& store) {
       "SELECT p.id, p.name, p.system, p.num_ports, p.mtu, v.cdp, v.beacon_interval, "
       "v.beacon_threshold, v.teaming, v.security, v.shaping, v.capabilities FROM portset p "
       "JOIN vswitch v ON v.portset_id = p.id WHERE p.kind = 'standard' ORDER BY p.ord");
+  enum {
+    kId,
+    kName,
+    kSystem,
+    kNumPorts,
+    kMtu,
+    kCdp,
+    kBeaconInterval,
+    kBeaconThreshold,
+    kTeaming,
+    kSecurity,
+    kShaping,
+    kCapabilities
+  };
   while (rows.Step()) {
-    int64_t id = rows.Int(0);
+    int64_t id = rows.Int(kId);
     ordered_json vs = ordered_json::object();
-    vs["name"] = rows.Text(1);
-    if (rows.Bool(2))
+    vs["name"] = rows.Text(kName);
+    if (rows.Bool(kSystem))
       vs["system"] = true;
-    vs["ports"] = rows.Int(3);
-    vs["mtu"] = rows.Int(4);
-    vs["cdp"] = kCdpNames[rows.Int(5) & 3];
-    vs["beaconInterval"] = rows.Int(6);
-    vs["beaconThreshold"] = rows.Int(7);
+    vs["ports"] = rows.Int(kNumPorts);
+    vs["mtu"] = rows.Int(kMtu);
+    vs["cdp"] = kCdpNames[rows.Int(kCdp) & 3];
+    vs["beaconInterval"] = rows.Int(kBeaconInterval);
+    vs["beaconThreshold"] = rows.Int(kBeaconThreshold);
     vs["uplinks"] = UplinksOf(store, id);
-    vs["teaming"] = ordered_json::parse(rows.Text(8));
-    vs["security"] = ordered_json::parse(rows.Text(9));
-    vs["shaping"] = ordered_json::parse(rows.Text(10));
-    vs["capabilities"] = ordered_json::parse(rows.Text(11));
+    vs["teaming"] = ordered_json::parse(rows.Text(kTeaming));
+    vs["security"] = ordered_json::parse(rows.Text(kSecurity));
+    vs["shaping"] = ordered_json::parse(rows.Text(kShaping));
+    vs["capabilities"] = ordered_json::parse(rows.Text(kCapabilities));
     vs["portgroups"] = ExportPortGroups(store, id);
     list.push_back(std::move(vs));
   }
@@ -505,35 +483,18 @@ void ExportStandard(ordered_json& host, Store& store) {
 
 ordered_json ExportLags(Store& store, int64_t id) {
   ordered_json lags = ordered_json::array();
-  Statement rows = store.Prepare("SELECT lag_id, name, mode, load_balancing, uplink_count FROM "
-                                 "lag WHERE portset_id = ? ORDER BY ord");
+  Statement rows = store.Prepare("SELECT lag_id, name, mode, load_balancing, uplink_count, nics "
+                                 "FROM lag WHERE portset_id = ? ORDER BY ord");
+  enum { kLagId, kName, kMode, kLoadBalancing, kUplinkCount, kNics };
   rows.Bind(1, id);
   while (rows.Step()) {
     ordered_json lag = ordered_json::object();
-    lag["id"] = rows.Int(0);
-    lag["name"] = rows.Text(1);
-    lag["mode"] = rows.Int(2) == 2 ? "passive" : "active";
-    lag["loadBalancing"] = rows.Int(3);
-    lag["uplinkCount"] = rows.Int(4);
-    ordered_json nics = ordered_json::array();
-    Statement nic = store.Prepare(
-        "SELECT nic, state, actor_port_number, actor_port_priority, actor_admin_key, "
-        "actor_oper_key, actor_state, partner_age, partner_port_number, partner_port_priority, "
-        "partner_oper_key, partner_state, partner_device_id, rx_lacpdus, tx_lacpdus, rx_errors, "
-        "tx_errors FROM lacp_nic WHERE portset_id = ? AND lag_id = ? ORDER BY ord");
-    nic.BindAll(id, rows.Int(0));
-    while (nic.Step()) {
-      ordered_json entry = ordered_json::object();
-      entry["name"] = nic.Text(0);
-      entry["state"] = nic.Text(1);
-      int column = 2;
-      for (const LacpField& field : kLacpFields)
-        entry[field.key] = nic.Int(column++);
-      entry["partnerDeviceId"] = nic.Text(column++);
-      for (const char* counter : kLacpCounters)
-        entry[counter] = static_cast<uint64_t>(nic.Int(column++));
-      nics.push_back(std::move(entry));
-    }
+    lag["id"] = rows.Int(kLagId);
+    lag["name"] = rows.Text(kName);
+    lag["mode"] = rows.Int(kMode) == 2 ? "passive" : "active";
+    lag["loadBalancing"] = rows.Int(kLoadBalancing);
+    lag["uplinkCount"] = rows.Int(kUplinkCount);
+    ordered_json nics = ordered_json::parse(rows.Text(kNics));
     lag["nics"] = std::move(nics);
     lags.push_back(std::move(lag));
   }
@@ -546,45 +507,70 @@ void ExportDistributed(ordered_json& host, Store& store, const char* key, const 
       "SELECT p.id, p.name, p.system, p.num_ports, p.mtu, d.uuid, d.display_name, d.class_name, "
       "d.configured_ports, d.cdp, d.beacon_timeout, d.branded, d.lacp_on_dpu FROM portset p "
       "JOIN dvswitch d ON d.portset_id = p.id WHERE p.kind = ? ORDER BY p.ord");
+  enum {
+    kId,
+    kName,
+    kSystem,
+    kNumPorts,
+    kMtu,
+    kUuid,
+    kDisplayName,
+    kClassName,
+    kConfiguredPorts,
+    kCdp,
+    kBeaconTimeout,
+    kBranded,
+    kLacpOnDpu
+  };
   rows.Bind(1, kind);
   while (rows.Step()) {
-    int64_t id = rows.Int(0);
+    int64_t id = rows.Int(kId);
     ordered_json dvs = ordered_json::object();
-    dvs["name"] = rows.Text(1);
-    if (rows.Bool(2))
+    dvs["name"] = rows.Text(kName);
+    if (rows.Bool(kSystem))
       dvs["system"] = true;
-    dvs["numPorts"] = rows.Int(3);
-    dvs["mtu"] = rows.Int(4);
-    dvs["uuid"] = rows.Text(5);
-    dvs["displayName"] = rows.Text(6);
-    dvs["class"] = rows.Text(7);
-    dvs["configuredPorts"] = rows.Int(8);
-    dvs["cdp"] = rows.Text(9);
-    dvs["beaconTimeout"] = rows.Int(10);
-    dvs["branded"] = rows.Bool(11);
-    dvs["lacpOnDpu"] = rows.Bool(12);
+    dvs["numPorts"] = rows.Int(kNumPorts);
+    dvs["mtu"] = rows.Int(kMtu);
+    dvs["uuid"] = rows.Text(kUuid);
+    dvs["displayName"] = rows.Text(kDisplayName);
+    dvs["class"] = rows.Text(kClassName);
+    dvs["configuredPorts"] = rows.Int(kConfiguredPorts);
+    dvs["cdp"] = rows.Text(kCdp);
+    dvs["beaconTimeout"] = rows.Int(kBeaconTimeout);
+    dvs["branded"] = rows.Bool(kBranded);
+    dvs["lacpOnDpu"] = rows.Bool(kLacpOnDpu);
     dvs["uplinks"] = UplinksOf(store, id);
     ordered_json ports = ordered_json::array();
     Statement port = store.Prepare(
-        "SELECT d.port_key, d.portgroup_key, d.connection_id, d.is_uplink, l.name, "
-        "l.lacp_enabled, l.lacp_mode, l.uplink_pg_key, "
+        "SELECT d.port_key, d.portgroup_key, d.connection_id, d.is_uplink, d.name, "
+        "d.lacp_enabled, d.lacp_mode, d.uplink_pg_key, "
         "(SELECT client FROM port WHERE portset_id = d.portset_id AND dvport_key = d.port_key "
-        " AND client_kind = 'uplink') FROM dvport d LEFT JOIN dvport_lacp l "
-        "ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
+        " AND client_kind = 'uplink') AS nic FROM dvport d "
         "WHERE d.portset_id = ? ORDER BY d.ord");
+    enum {
+      kPortKey,
+      kPortgroupKey,
+      kConnectionId,
+      kIsUplink,
+      kPortName,
+      kLacpEnabled,
+      kLacpMode,
+      kUplinkPgKey,
+      kNic
+    };
     port.Bind(1, id);
     while (port.Step()) {
       ordered_json entry = ordered_json::object();
-      entry["key"] = port.Text(0);
-      entry["name"] = port.Text(4);
-      entry["portgroupKey"] = port.Text(1);
-      entry["connectionId"] = port.Int(2);
-      entry["uplink"] = port.Bool(3);
-      if (!port.IsNull(8))
-        entry["nic"] = port.Text(8);
-      entry["lacpEnabled"] = port.Bool(5);
-      entry["lacpMode"] = port.Int(6);
-      entry["uplinkPortgroupKey"] = port.Text(7);
+      entry["key"] = port.Text(kPortKey);
+      entry["name"] = port.Text(kPortName);
+      entry["portgroupKey"] = port.Text(kPortgroupKey);
+      entry["connectionId"] = port.Int(kConnectionId);
+      entry["uplink"] = port.Bool(kIsUplink);
+      if (!port.IsNull(kNic))
+        entry["nic"] = port.Text(kNic);
+      entry["lacpEnabled"] = port.Bool(kLacpEnabled);
+      entry["lacpMode"] = port.Int(kLacpMode);
+      entry["uplinkPortgroupKey"] = port.Text(kUplinkPgKey);
       ports.push_back(std::move(entry));
     }
     dvs["dvports"] = std::move(ports);
@@ -595,7 +581,7 @@ void ExportDistributed(ordered_json& host, Store& store, const char* key, const 
     host[key] = std::move(list);
 }
 
-void ExportSwitching(ordered_json& host, Store& store) {
+void ExportSwitching(ordered_json& host, Store& store, ExportStreams& /*streams*/) {
   ExportStandard(host, store);
   ExportDistributed(host, store, "dvswitches", "dvs");
   ExportDistributed(host, store, "opaqueSwitches", "opaque");
@@ -672,8 +658,9 @@ ordered_json TeamingToJson(const NicTeamingPolicy& policy) {
     const std::vector<std::string>& order = policy.GetUplinkOrder();
     std::size_t active = static_cast<std::size_t>(std::max(0, policy.GetMaxActiveUplinks()));
     active = std::min(active, order.size());
-    out["activeUplinks"] = std::vector<std::string>(order.begin(), order.begin() + active);
-    out["standbyUplinks"] = std::vector<std::string>(order.begin() + active, order.end());
+    auto split = order.begin() + static_cast<std::ptrdiff_t>(active);
+    out["activeUplinks"] = std::vector<std::string>(order.begin(), split);
+    out["standbyUplinks"] = std::vector<std::string>(split, order.end());
   }
   return out;
 }

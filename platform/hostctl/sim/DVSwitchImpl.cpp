@@ -2,6 +2,8 @@
 #include "HostCtl/Lib.h"
 #include "sim/SwitchingStore.h"
 
+#include <nlohmann/json.hpp>
+
 #include <cstring>
 #include <map>
 
@@ -29,16 +31,17 @@ DvsRow ReadDvs(Store& store, const PortsetData& data) {
   Statement row = store.Prepare("SELECT uuid, display_name, configured_ports, cdp, "
                                 "beacon_timeout, branded, lacp_on_dpu FROM dvswitch "
                                 "WHERE portset_id = ?");
+  enum { kUuid, kDisplayName, kConfiguredPorts, kCdp, kBeaconTimeout, kBranded, kLacpOnDpu };
   row.Bind(1, data.id);
   if (!row.Step())
     throw HostCtlException("The distributed switch " + data.name + " no longer exists");
-  return DvsRow{row.Text(0),
-                row.Text(1),
-                static_cast<uint32_t>(row.Int(2)),
-                row.Text(3),
-                static_cast<int32_t>(row.Int(4)),
-                row.Bool(5),
-                row.Bool(6)};
+  return DvsRow{row.Text(kUuid),
+                row.Text(kDisplayName),
+                static_cast<uint32_t>(row.Int(kConfiguredPorts)),
+                row.Text(kCdp),
+                static_cast<int32_t>(row.Int(kBeaconTimeout)),
+                row.Bool(kBranded),
+                row.Bool(kLacpOnDpu)};
 }
 
 DvsRow LoadDvs(const char* operation, const PortsetData& data) {
@@ -99,8 +102,9 @@ uint32_t DVSwitchImpl::GetMTU() const {
   store.CheckFault("GetMTU", data_.name);
   return store.Read([&] {
     Statement row = store.Prepare("SELECT mtu FROM portset WHERE id = ?");
+    enum { kMtu };
     row.Bind(1, data_.id);
-    return row.Step() ? static_cast<uint32_t>(row.Int(0)) : 0u;
+    return row.Step() ? static_cast<uint32_t>(row.Int(kMtu)) : 0u;
   });
 }
 
@@ -112,23 +116,25 @@ std::vector<std::unique_ptr<DVPort>> DVSwitchImpl::GetDVPorts() const {
     std::map<std::string, std::vector<std::string>> clients;
     Statement users = store.Prepare("SELECT dvport_key, client FROM port WHERE portset_id = ? "
                                     "AND dvport_key IS NOT NULL ORDER BY id");
+    enum { kDvportKey, kClient };
     users.Bind(1, data_.id);
     while (users.Step())
-      clients[users.Text(0)].push_back(users.Text(1));
+      clients[users.Text(kDvportKey)].push_back(users.Text(kClient));
     std::vector<std::unique_ptr<DVPort>> ports;
-    Statement rows = store.Prepare(
-        "SELECT d.port_key, d.connection_id, coalesce(l.name, ''), d.portgroup_key FROM dvport d "
-        "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
-        "WHERE d.portset_id = ? ORDER BY d.ord");
+    Statement rows =
+        store.Prepare("SELECT d.port_key, d.connection_id, d.name, d.portgroup_key FROM dvport d "
+                      "WHERE d.portset_id = ? ORDER BY d.ord");
+    enum { kPortKey, kConnectionId, kName, kPortgroupKey };
     rows.Bind(1, data_.id);
     while (rows.Step()) {
-      std::string key = rows.Text(0);
+      std::string key = rows.Text(kPortKey);
       auto used = clients.find(key);
-      DVPortData port{rows.Text(2), rows.Text(3),
+      DVPortData port{rows.Text(kName), rows.Text(kPortgroupKey),
                       used == clients.end() ? std::vector<std::string>() : used->second};
       // Callers use a listed port as TvkCtl::Network::DVPortImpl.
       ports.push_back(std::make_unique<TvkCtl::Network::DVPortImpl>(std::make_unique<DVPortImpl>(
-          DVPortParam{uuid, key, static_cast<uint32_t>(rows.Int(1))}, std::move(port))));
+          DVPortParam{uuid, key, static_cast<uint32_t>(rows.Int(kConnectionId))},
+          std::move(port))));
     }
     return ports;
   });
@@ -143,14 +149,15 @@ std::vector<LagConfig> DVSwitchImpl::GetLagConfigs() const {
     std::vector<LagConfig> configs;
     Statement rows = store.Prepare("SELECT lag_id, name, load_balancing, mode, uplink_count "
                                    "FROM lag WHERE portset_id = ? ORDER BY ord");
+    enum { kLagId, kName, kLoadBalancing, kMode, kUplinkCount };
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       LagConfig config;
-      CopyText(config.lagId, std::to_string(rows.Int(0)));
-      CopyText(config.lagName, rows.Text(1));
-      config.loadBalancing = static_cast<uint32_t>(rows.Int(2));
-      config.mode = static_cast<uint32_t>(rows.Int(3));
-      config.uplinkCount = static_cast<uint32_t>(rows.Int(4));
+      CopyText(config.lagId, std::to_string(rows.Int(kLagId)));
+      CopyText(config.lagName, rows.Text(kName));
+      config.loadBalancing = static_cast<uint32_t>(rows.Int(kLoadBalancing));
+      config.mode = static_cast<uint32_t>(rows.Int(kMode));
+      config.uplinkCount = static_cast<uint32_t>(rows.Int(kUplinkCount));
       configs.push_back(config);
     }
     return configs;
@@ -167,9 +174,11 @@ std::map<std::string, DVPortParam> DVSwitchImpl::GetUplinkPortMap() const {
         "SELECT p.client, d.port_key, d.connection_id FROM port p JOIN dvport d ON "
         "d.portset_id = p.portset_id AND d.port_key = p.dvport_key WHERE p.portset_id = ? AND "
         "p.client_kind = 'uplink'");
+    enum { kClient, kPortKey, kConnectionId };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      map[rows.Text(0)] = DVPortParam{uuid, rows.Text(1), static_cast<uint32_t>(rows.Int(2))};
+      map[rows.Text(kClient)] =
+          DVPortParam{uuid, rows.Text(kPortKey), static_cast<uint32_t>(rows.Int(kConnectionId))};
     return map;
   });
 }
@@ -179,15 +188,16 @@ std::vector<DVUplinkPortLacp> DVSwitchImpl::GetUplinkPortLacp() const {
   store.CheckFault("GetUplinkPortLacp", data_.name);
   return store.Read([&] {
     std::vector<DVUplinkPortLacp> ports;
-    Statement rows = store.Prepare(
-        "SELECT d.port_key, coalesce(l.lacp_enabled, 0), coalesce(l.lacp_mode, 0), "
-        "coalesce(l.uplink_pg_key, '') FROM dvport d LEFT JOIN dvport_lacp l ON l.portset_id = "
-        "d.portset_id AND l.port_key = d.port_key WHERE d.portset_id = ? AND d.is_uplink = 1 "
-        "ORDER BY d.ord");
+    Statement rows =
+        store.Prepare("SELECT d.port_key, d.lacp_enabled, d.lacp_mode, "
+                      "d.uplink_pg_key FROM dvport d WHERE d.portset_id = ? AND d.is_uplink = 1 "
+                      "ORDER BY d.ord");
+    enum { kPortKey, kLacpEnabled, kLacpMode, kUplinkPgKey };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      ports.push_back(DVUplinkPortLacp{rows.Text(0), rows.Bool(1),
-                                       static_cast<uint32_t>(rows.Int(2)), rows.Text(3)});
+      ports.push_back(DVUplinkPortLacp{rows.Text(kPortKey), rows.Bool(kLacpEnabled),
+                                       static_cast<uint32_t>(rows.Int(kLacpMode)),
+                                       rows.Text(kUplinkPgKey)});
     return ports;
   });
 }
@@ -197,42 +207,36 @@ void DVSwitchImpl::GetLacpInfo(std::vector<LacpLagInfo>& lags) const {
   store.CheckFault("GetLacpInfo", data_.name);
   store.Read([&] {
     Statement rows =
-        store.Prepare("SELECT lag_id, name, mode FROM lag WHERE portset_id = ? ORDER BY ord");
+        store.Prepare("SELECT lag_id, name, mode, nics FROM lag WHERE portset_id = ? ORDER BY ord");
+    enum { kLagId, kName, kMode, kNics };
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       LacpLagInfo& lag = lags.emplace_back();
-      lag.lagId = static_cast<uint32_t>(rows.Int(0));
-      lag.mode = static_cast<uint32_t>(rows.Int(2));
-      CopyText(lag.lagName, rows.Text(1));
-      Statement nics = store.Prepare(
-          "SELECT nic, state, actor_port_number, actor_port_priority, actor_admin_key, "
-          "actor_oper_key, actor_state, partner_age, partner_port_number, "
-          "partner_port_priority, partner_oper_key, partner_state, partner_device_id, "
-          "rx_lacpdus, tx_lacpdus, rx_errors, tx_errors FROM lacp_nic "
-          "WHERE portset_id = ? AND lag_id = ? ORDER BY ord");
-      nics.BindAll(data_.id, rows.Int(0));
-      while (nics.Step()) {
+      lag.lagId = static_cast<uint32_t>(rows.Int(kLagId));
+      lag.mode = static_cast<uint32_t>(rows.Int(kMode));
+      CopyText(lag.lagName, rows.Text(kName));
+      for (const nlohmann::json& entry : nlohmann::json::parse(rows.Text(kNics))) {
         auto nic = std::make_unique<LacpNicInfo>();
         std::memset(nic.get(), 0, sizeof(LacpNicInfo));
-        CopyText(nic->nicName, nics.Text(0));
-        CopyText(nic->state, nics.Text(1));
-        nic->actorPortNumber = static_cast<uint16_t>(nics.Int(2));
-        nic->actorPortPriority = static_cast<uint16_t>(nics.Int(3));
-        nic->actorAdminKey = static_cast<uint16_t>(nics.Int(4));
-        nic->actorOperKey = static_cast<uint16_t>(nics.Int(5));
-        nic->actorState = static_cast<uint8_t>(nics.Int(6));
+        CopyText(nic->nicName, entry.at("name").get<std::string>());
+        CopyText(nic->state, entry.at("state").get<std::string>());
+        nic->actorPortNumber = entry.at("actorPortNumber").get<uint16_t>();
+        nic->actorPortPriority = entry.at("actorPortPriority").get<uint16_t>();
+        nic->actorAdminKey = entry.at("actorAdminKey").get<uint16_t>();
+        nic->actorOperKey = entry.at("actorOperKey").get<uint16_t>();
+        nic->actorState = entry.at("actorState").get<uint8_t>();
         CopyText(nic->actorFlags, FlagLetters(nic->actorState));
-        nic->partnerAge = static_cast<uint32_t>(nics.Int(7));
-        nic->partnerPortNumber = static_cast<uint16_t>(nics.Int(8));
-        nic->partnerPortPriority = static_cast<uint16_t>(nics.Int(9));
-        nic->partnerOperKey = static_cast<uint16_t>(nics.Int(10));
-        nic->partnerState = static_cast<uint8_t>(nics.Int(11));
-        CopyText(nic->partnerDeviceId, nics.Text(12));
+        nic->partnerAge = entry.at("partnerAge").get<uint32_t>();
+        nic->partnerPortNumber = entry.at("partnerPortNumber").get<uint16_t>();
+        nic->partnerPortPriority = entry.at("partnerPortPriority").get<uint16_t>();
+        nic->partnerOperKey = entry.at("partnerOperKey").get<uint16_t>();
+        nic->partnerState = entry.at("partnerState").get<uint8_t>();
+        CopyText(nic->partnerDeviceId, entry.at("partnerDeviceId").get<std::string>());
         CopyText(nic->partnerFlags, FlagLetters(nic->partnerState));
-        nic->rxLacpdus = static_cast<uint64_t>(nics.Int(13));
-        nic->txLacpdus = static_cast<uint64_t>(nics.Int(14));
-        nic->rxErrors = static_cast<uint64_t>(nics.Int(15));
-        nic->txErrors = static_cast<uint64_t>(nics.Int(16));
+        nic->rxLacpdus = entry.at("rxLacpdus").get<uint64_t>();
+        nic->txLacpdus = entry.at("txLacpdus").get<uint64_t>();
+        nic->rxErrors = entry.at("rxErrors").get<uint64_t>();
+        nic->txErrors = entry.at("txErrors").get<uint64_t>();
         lag.nics.push_back(std::move(nic));
       }
     }
@@ -244,27 +248,29 @@ void DVSwitchImpl::SetLacpTimeout(uint32_t lagId, bool shortTimeout, const std::
   store.CheckFault("SetLacpTimeout", data_.name);
   store.Write([&] {
     std::string displayName = ReadDvs(store, data_).displayName;
-    Statement lag = store.Prepare("SELECT 1 FROM lag WHERE portset_id = ? AND lag_id = ?");
+    Statement lag = store.Prepare("SELECT nics FROM lag WHERE portset_id = ? AND lag_id = ?");
+    enum { kNics };
     lag.BindAll(data_.id, static_cast<int64_t>(lagId));
     if (!lag.Step())
       throw HostCtlException("Unable to set the LACP timeout: " + displayName +
                              " has no LAG with ID " + std::to_string(lagId));
-    if (shortTimeout)
-      store
-          .Prepare("UPDATE lacp_nic SET actor_state = actor_state | 2 WHERE portset_id = ? AND "
-                   "lag_id = ? AND (? = '' OR nic = ?)")
-          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
-          .Run();
-    else
-      store
-          .Prepare("UPDATE lacp_nic SET actor_state = actor_state & ~2 WHERE portset_id = ? AND "
-                   "lag_id = ? AND (? = '' OR nic = ?)")
-          .BindAll(data_.id, static_cast<int64_t>(lagId), nicName, nicName)
-          .Run();
-    if (!nicName.empty() && store.Changes() == 0)
+    // Bit 1 of the actor state is the short timeout.
+    nlohmann::ordered_json nics = nlohmann::ordered_json::parse(lag.Text(kNics));
+    bool found = false;
+    for (nlohmann::ordered_json& nic : nics) {
+      if (!nicName.empty() && nic.at("name") != nicName)
+        continue;
+      found = true;
+      uint64_t state = nic.at("actorState").get<uint64_t>();
+      nic["actorState"] = shortTimeout ? (state | 2u) : (state & ~uint64_t{2});
+    }
+    if (!nicName.empty() && !found)
       throw HostCtlException("Unable to set the LACP timeout: " + nicName +
                              " is not a NIC of LAG " + std::to_string(lagId) + " on " +
                              displayName);
+    store.Prepare("UPDATE lag SET nics = ? WHERE portset_id = ? AND lag_id = ?")
+        .BindAll(nics.dump(), data_.id, static_cast<int64_t>(lagId))
+        .Run();
   });
 }
 
@@ -296,14 +302,14 @@ std::optional<DVPortRow> FindDVPort(Store& store, const DVPortParam& param) {
   auto portset = FindPortsetByIdentifier(store, param.switchUuid);
   if (!portset)
     return std::nullopt;
-  Statement row = store.Prepare(
-      "SELECT d.portgroup_key, d.connection_id, coalesce(l.name, '') FROM dvport d "
-      "LEFT JOIN dvport_lacp l ON l.portset_id = d.portset_id AND l.port_key = d.port_key "
-      "WHERE d.portset_id = ? AND d.port_key = ?");
+  Statement row = store.Prepare("SELECT d.portgroup_key, d.connection_id, d.name FROM dvport d "
+                                "WHERE d.portset_id = ? AND d.port_key = ?");
+  enum { kPortgroupKey, kConnectionId, kName };
   row.BindAll(portset->id, param.portId);
   if (!row.Step())
     return std::nullopt;
-  return DVPortRow{*portset, row.Text(0), static_cast<uint32_t>(row.Int(1)), row.Text(2)};
+  return DVPortRow{*portset, row.Text(kPortgroupKey), static_cast<uint32_t>(row.Int(kConnectionId)),
+                   row.Text(kName)};
 }
 
 DVPortRow RequireDVPort(const char* operation, const DVPortParam& param) {
@@ -371,10 +377,11 @@ bool DVPortImpl::IsInUse(std::vector<std::string>& clients) const {
   return store.Read([&] {
     Statement rows = store.Prepare(
         "SELECT client FROM port WHERE portset_id = ? AND dvport_key = ? ORDER BY id");
+    enum { kClient };
     rows.BindAll(port.portset.id, param_.portId);
     bool used = false;
     while (rows.Step()) {
-      clients.push_back(rows.Text(0));
+      clients.push_back(rows.Text(kClient));
       used = true;
     }
     return used;

@@ -56,8 +56,9 @@ void RequireContext(Store& store, int64_t id) {
 
 int64_t CountContexts(Store& store) {
   Statement count = store.Prepare("SELECT count(*) FROM ens_lcore");
+  enum { kCount };
   count.Step();
-  return count.Int(0);
+  return count.Int(kCount);
 }
 
 std::string Object(int64_t id) {
@@ -94,8 +95,9 @@ std::vector<int64_t> NetworkInfoImpl::GetEnsLcores() {
   return store.Read([&] {
     std::vector<int64_t> ids;
     Statement rows = store.Prepare("SELECT id FROM ens_lcore ORDER BY id");
+    enum { kId };
     while (rows.Step())
-      ids.push_back(rows.Int(0));
+      ids.push_back(rows.Int(kId));
     return ids;
   });
 }
@@ -130,8 +132,9 @@ std::string NetworkInfoImpl::GetEnsLcoreSwitch(int64_t id) {
     RequireContext(store, id);
     Statement row = store.Prepare(
         "SELECT p.name FROM ens_lcore l JOIN portset p ON p.id = l.portset_id WHERE l.id = ?");
+    enum { kName };
     row.Bind(1, id);
-    return row.Step() ? row.Text(0) : std::string();
+    return row.Step() ? row.Text(kName) : std::string();
   });
 }
 
@@ -141,9 +144,10 @@ int32_t NetworkInfoImpl::GetEnsLcoreAffinity(int64_t id) {
   return store.Read([&] {
     RequireContext(store, id);
     Statement row = store.Prepare("SELECT affinity FROM ens_lcore WHERE id = ?");
+    enum { kAffinity };
     row.Bind(1, id);
     row.Step();
-    return static_cast<int32_t>(row.Int(0));
+    return static_cast<int32_t>(row.Int(kAffinity));
   });
 }
 
@@ -157,10 +161,11 @@ bool NetworkInfoImpl::SetEnsLcoreSwitch(const std::string& name, int64_t id) {
       return true;
     }
     Statement portset = store.Prepare("SELECT id FROM portset WHERE name = ?");
+    enum { kId };
     portset.Bind(1, name);
     if (!portset.Step())
       throw HostCtlException("There is no virtual switch named " + name);
-    int64_t portsetId = portset.Int(0);
+    int64_t portsetId = portset.Int(kId);
     store.Prepare("UPDATE ens_lcore SET portset_id = ? WHERE id = ?").BindAll(portsetId, id).Run();
     return true;
   });

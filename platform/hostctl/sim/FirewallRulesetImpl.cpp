@@ -27,10 +27,12 @@ struct RulesetRow {
 RulesetRow ReadRow(Store& store, const std::string& id) {
   Statement row = store.Prepare("SELECT enabled, allowed_all, enable_fixed, allowed_ip_fixed, "
                                 "clients FROM fw_ruleset WHERE id = ?");
+  enum { kEnabled, kAllowedAll, kEnableFixed, kAllowedIpFixed, kClients };
   row.Bind(1, id);
   if (!row.Step())
     throw HostCtlException("There is no firewall ruleset with id " + id);
-  return {row.Bool(0), row.Bool(1), row.Bool(2), row.Bool(3), row.Int(4)};
+  return {row.Bool(kEnabled), row.Bool(kAllowedAll), row.Bool(kEnableFixed),
+          row.Bool(kAllowedIpFixed), row.Int(kClients)};
 }
 
 /// Reads the ruleset in a read transaction, after the operation's fault.
@@ -172,14 +174,15 @@ std::vector<std::unique_ptr<FirewallPortRule>> FirewallRulesetImpl::GetRules() c
     ReadRow(store, id_);
     Statement rows = store.Prepare("SELECT port_type, port_begin, port_end, direction, protocol "
                                    "FROM fw_rule WHERE ruleset = ? ORDER BY ord");
+    enum { kPortType, kPortBegin, kPortEnd, kDirection, kProtocol };
     rows.Bind(1, id_);
     while (rows.Step()) {
       auto rule = std::make_unique<FirewallPortRule>();
-      rule->portType = static_cast<int32_t>(rows.Int(0));
-      rule->portBegin = static_cast<int32_t>(rows.Int(1));
-      rule->portEnd = static_cast<int32_t>(rows.Int(2));
-      rule->direction = static_cast<int32_t>(rows.Int(3));
-      rule->protocol = static_cast<int32_t>(rows.Int(4));
+      rule->portType = static_cast<int32_t>(rows.Int(kPortType));
+      rule->portBegin = static_cast<int32_t>(rows.Int(kPortBegin));
+      rule->portEnd = static_cast<int32_t>(rows.Int(kPortEnd));
+      rule->direction = static_cast<int32_t>(rows.Int(kDirection));
+      rule->protocol = static_cast<int32_t>(rows.Int(kProtocol));
       rules.push_back(std::move(rule));
     }
   });
@@ -195,10 +198,11 @@ std::unique_ptr<FirewallAllowedIps> FirewallRulesetImpl::GetAllowedIps() const {
     ReadRow(store, id_);
     Statement rows =
         store.Prepare("SELECT kind, value FROM fw_allowed_ip WHERE ruleset = ? ORDER BY ord");
+    enum { kKind, kValue };
     rows.Bind(1, id_);
     while (rows.Step()) {
-      std::string value = rows.Text(1);
-      switch (rows.Int(0)) {
+      std::string value = rows.Text(kValue);
+      switch (rows.Int(kKind)) {
       case Model::AllowedIpv4Address:
         ips->ipv4Addresses.emplace_back(value);
         break;

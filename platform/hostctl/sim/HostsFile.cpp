@@ -40,13 +40,15 @@ void HostsFile::RemoveEntryFromUser(const std::string& ip, const std::string& ho
   store.Write([&] {
     Statement row = store.Prepare(
         "SELECT id, system FROM ipsvc_hosts WHERE address = ? AND hostname = ? COLLATE NOCASE");
-    row.BindAll(address, hostname);
+    enum { kId, kSystem };
+    Model::IpSvc::BindAddress(row, 1, address);
+    row.Bind(2, hostname);
     if (!row.Step())
       throw HostCtlException("No entry for " + address + " " + hostname + " exists");
-    if (row.Bool(1))
+    if (row.Bool(kSystem))
       throw HostCtlException("The entry for " + address + " " + hostname +
                              " is a system entry and cannot be removed");
-    int64_t id = row.Int(0);
+    int64_t id = row.Int(kId);
     store.Prepare("DELETE FROM ipsvc_hosts WHERE id = ?").Bind(1, id).Run();
   });
 }
@@ -58,10 +60,11 @@ std::vector<std::shared_ptr<HostsFileEntry>> HostsFile::GetEntriesFromConfig() {
   store.Read([&] {
     Statement rows = store.Prepare("SELECT address, hostname, aliases, comment FROM ipsvc_hosts "
                                    "WHERE system = 0 ORDER BY id");
+    enum { kAddress, kHostname, kAliases, kComment };
     while (rows.Step())
       entries.push_back(std::make_shared<HostsFileEntry>(
-          rows.Text(0), rows.Text(1), HostCtl::Misc::StringTokenize(rows.Text(2), " "),
-          rows.Text(3)));
+          Model::IpSvc::AddressText(rows, kAddress), rows.Text(kHostname),
+          HostCtl::Misc::StringTokenize(rows.Text(kAliases), " "), rows.Text(kComment)));
   });
   return entries;
 }

@@ -85,19 +85,32 @@ void IpSecConfigImpl::GetSADConfigList(std::vector<IpSecSadParam>& list) {
     Statement rows = store.Prepare(
         "SELECT name, source, destination, spi, mode, encryption, integrity, encryption_key, "
         "integrity_key, state, lifetime FROM ipsvc_ipsec_sa ORDER BY id");
+    enum {
+      kName,
+      kSource,
+      kDestination,
+      kSpi,
+      kMode,
+      kEncryption,
+      kIntegrity,
+      kEncryptionKey,
+      kIntegrityKey,
+      kState,
+      kLifetime
+    };
     while (rows.Step()) {
       IpSecSadParam sa;
-      sa.name = rows.Text(0);
-      sa.srcAddress = rows.Text(1);
-      sa.dstAddress = rows.Text(2);
-      sa.spi = static_cast<uint32_t>(rows.Int(3));
-      sa.mode = static_cast<int>(rows.Int(4));
-      sa.encryptionAlgorithm = static_cast<int>(rows.Int(5));
-      sa.integrityAlgorithm = static_cast<int>(rows.Int(6));
-      sa.encryptionKey = rows.Text(7);
-      sa.integrityKey = rows.Text(8);
-      sa.state = static_cast<int>(rows.Int(9));
-      sa.lifetime = static_cast<uint64_t>(rows.Int(10));
+      sa.name = rows.Text(kName);
+      sa.srcAddress = rows.Text(kSource);
+      sa.dstAddress = rows.Text(kDestination);
+      sa.spi = static_cast<uint32_t>(rows.Int(kSpi));
+      sa.mode = static_cast<int>(rows.Int(kMode));
+      sa.encryptionAlgorithm = static_cast<int>(rows.Int(kEncryption));
+      sa.integrityAlgorithm = static_cast<int>(rows.Int(kIntegrity));
+      sa.encryptionKey = rows.Text(kEncryptionKey);
+      sa.integrityKey = rows.Text(kIntegrityKey);
+      sa.state = static_cast<int>(rows.Int(kState));
+      sa.lifetime = static_cast<uint64_t>(rows.Int(kLifetime));
       list.push_back(std::move(sa));
     }
   });
@@ -135,20 +148,35 @@ void IpSecConfigImpl::GetSPDConfigList(std::vector<IpSecSpdParam>& list) {
         "SELECT name, source, source_prefix, source_port, destination, destination_prefix, "
         "destination_port, protocol, direction, action, mode, sa_name, sa_lost FROM "
         "ipsvc_ipsec_sp ORDER BY id");
+    enum {
+      kName,
+      kSource,
+      kSourcePrefix,
+      kSourcePort,
+      kDestination,
+      kDestinationPrefix,
+      kDestinationPort,
+      kProtocol,
+      kDirection,
+      kAction,
+      kMode,
+      kSaName,
+      kSaLost
+    };
     while (rows.Step()) {
       IpSecSpdParam sp;
-      sp.name = rows.Text(0);
-      sp.srcAddress = rows.Text(1);
-      sp.srcPrefixLength = static_cast<int>(rows.Int(2));
-      sp.srcPort = static_cast<uint32_t>(rows.Int(3));
-      sp.dstAddress = rows.Text(4);
-      sp.dstPrefixLength = static_cast<int>(rows.Int(5));
-      sp.dstPort = static_cast<uint32_t>(rows.Int(6));
-      sp.ulProto = static_cast<int>(rows.Int(7));
-      sp.direction = static_cast<int>(rows.Int(8));
-      sp.action = static_cast<int>(rows.Int(9));
-      sp.mode = static_cast<int>(rows.Int(10));
-      sp.saName = rows.Bool(12) ? std::string("UNKNOWN") : rows.Text(11);
+      sp.name = rows.Text(kName);
+      sp.srcAddress = rows.Text(kSource);
+      sp.srcPrefixLength = static_cast<int>(rows.Int(kSourcePrefix));
+      sp.srcPort = static_cast<uint32_t>(rows.Int(kSourcePort));
+      sp.dstAddress = rows.Text(kDestination);
+      sp.dstPrefixLength = static_cast<int>(rows.Int(kDestinationPrefix));
+      sp.dstPort = static_cast<uint32_t>(rows.Int(kDestinationPort));
+      sp.ulProto = static_cast<int>(rows.Int(kProtocol));
+      sp.direction = static_cast<int>(rows.Int(kDirection));
+      sp.action = static_cast<int>(rows.Int(kAction));
+      sp.mode = static_cast<int>(rows.Int(kMode));
+      sp.saName = rows.Bool(kSaLost) ? std::string("UNKNOWN") : rows.Text(kSaName);
       list.push_back(std::move(sp));
     }
   });

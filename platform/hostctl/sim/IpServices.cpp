@@ -25,18 +25,29 @@ void LoadConnections(const char* operation, int protocol, std::vector<TcpIpConne
         "SELECT recv_queue, send_queue, local_address, local_port, foreign_address, "
         "foreign_port, world_id, state, ccalgo FROM ipsvc_connection WHERE netstack = ? AND "
         "protocol = ? ORDER BY id");
+    enum {
+      kRecvQueue,
+      kSendQueue,
+      kLocalAddress,
+      kLocalPort,
+      kForeignAddress,
+      kForeignPort,
+      kWorldId,
+      kState,
+      kCcalgo
+    };
     rows.BindAll(netstack, protocol);
     while (rows.Step()) {
       TcpIpConnection connection;
-      connection.recvQueue = rows.Int(0);
-      connection.sendQueue = rows.Int(1);
-      connection.localAddress = rows.Text(2);
-      connection.localPort = static_cast<uint16_t>(rows.Int(3));
-      connection.foreignAddress = rows.Text(4);
-      connection.foreignPort = static_cast<uint16_t>(rows.Int(5));
-      connection.worldId = rows.Int(6);
-      connection.state = static_cast<uint32_t>(rows.Int(7));
-      connection.ccAlgorithm = rows.Text(8);
+      connection.recvQueue = rows.Int(kRecvQueue);
+      connection.sendQueue = rows.Int(kSendQueue);
+      connection.localAddress = rows.Text(kLocalAddress);
+      connection.localPort = static_cast<uint16_t>(rows.Int(kLocalPort));
+      connection.foreignAddress = rows.Text(kForeignAddress);
+      connection.foreignPort = static_cast<uint16_t>(rows.Int(kForeignPort));
+      connection.worldId = rows.Int(kWorldId);
+      connection.state = static_cast<uint32_t>(rows.Int(kState));
+      connection.ccAlgorithm = rows.Text(kCcalgo);
       list.push_back(std::move(connection));
     }
   });
@@ -72,11 +83,13 @@ std::string ResourceInfoImpl::GetWorldName(int64_t worldId) {
   if (!loaded_) {
     store.Read([&] {
       Model::Statement services = store.Prepare("SELECT id, name FROM ipsvc_world");
+      enum { kId, kName };
       while (services.Step())
-        names_[services.Int(0)] = services.Text(1);
+        names_[services.Int(kId)] = services.Text(kName);
       Model::Statement vms = store.Prepare("SELECT id, name FROM world");
+      enum { kVmsId, kVmsName };
       while (vms.Step())
-        names_[vms.Int(0)] = vms.Text(1);
+        names_[vms.Int(kVmsId)] = vms.Text(kVmsName);
     });
     loaded_ = true;
   }

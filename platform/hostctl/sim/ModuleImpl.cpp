@@ -17,10 +17,11 @@ namespace {
 /// module.
 bool ReadLoaded(Store& store, const std::string& name) {
   Statement row = store.Prepare("SELECT loaded FROM kmodule WHERE name = ?");
+  enum { kLoaded };
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("There is no kernel module named " + name);
-  return row.Bool(0);
+  return row.Bool(kLoaded);
 }
 
 } // namespace
@@ -47,11 +48,12 @@ void ModuleImpl::Load(const std::string& options, bool force) {
   store.CheckFault("Load", name_);
   store.Write([&] {
     Statement row = store.Prepare("SELECT loaded, options FROM kmodule WHERE name = ?");
+    enum { kLoaded, kOptions };
     row.Bind(1, name_);
     if (!row.Step())
       throw HostCtlException("There is no kernel module named " + name_);
-    bool loaded = row.Bool(0);
-    std::string current = row.Text(1);
+    bool loaded = row.Bool(kLoaded);
+    std::string current = row.Text(kOptions);
     if (loaded && current != options && !force)
       throw HostCtlException("Module " + name_ + " is loaded already with other options");
     store.Prepare("UPDATE kmodule SET loaded = 1, options = ? WHERE name = ?")
@@ -72,7 +74,7 @@ void ModuleImpl::Unload() {
         .Run();
     // Unloading the firewall module takes its filters with it.
     if (name_ == HostCtl::System::FirewallModuleName)
-      store.Prepare("UPDATE fw_state SET filters_active = 0 WHERE id = 1").Run();
+      store.Prepare("UPDATE setting SET value = 0 WHERE key = 'firewall.filtersActive'").Run();
   });
   stale_ = true;
 }

@@ -38,18 +38,30 @@ bool KernelIpv6Running(Store& store) {
 
 #define NETSTACK_COLUMNS                                                                           \
   "key, name, state, max_conn, cur_max_conn, ccalgo, ipv6, cur_ipv6, ecn FROM netstack "
+enum NetstackColumn {
+  kNetstackKey,
+  kNetstackName,
+  kNetstackState,
+  kNetstackMaxConn,
+  kNetstackCurMaxConn,
+  kNetstackCcalgo,
+  kNetstackIpv6,
+  kNetstackCurIpv6,
+  kNetstackEcn
+};
 
+/// One row of NETSTACK_COLUMNS.
 NetstackData ReadNetstack(const Statement& row, bool kernelIpv6) {
   NetstackData data;
-  data.key = row.Text(0);
-  data.name = row.Text(1);
-  data.state = static_cast<uint32_t>(row.Int(2));
-  data.maxConnections = static_cast<uint32_t>(row.Int(3));
-  data.curMaxConnections = static_cast<uint32_t>(row.Int(4));
-  data.ccAlgorithm = row.Text(5);
-  data.ipv6 = row.Bool(6);
-  data.curIpv6 = row.Bool(7) && kernelIpv6;
-  data.ecn = row.Text(8);
+  data.key = row.Text(kNetstackKey);
+  data.name = row.Text(kNetstackName);
+  data.state = static_cast<uint32_t>(row.Int(kNetstackState));
+  data.maxConnections = static_cast<uint32_t>(row.Int(kNetstackMaxConn));
+  data.curMaxConnections = static_cast<uint32_t>(row.Int(kNetstackCurMaxConn));
+  data.ccAlgorithm = row.Text(kNetstackCcalgo);
+  data.ipv6 = row.Bool(kNetstackIpv6);
+  data.curIpv6 = row.Bool(kNetstackCurIpv6) && kernelIpv6;
+  data.ecn = row.Text(kNetstackEcn);
   return data;
 }
 
@@ -74,10 +86,11 @@ void RequireNetstack(Store& store, const std::string& key) {
 /// action.
 void RequireNoInterfaces(Store& store, const std::string& key, const std::string& doing) {
   Statement rows = store.Prepare("SELECT name FROM tvknic WHERE netstack = ? ORDER BY ord, name");
+  enum { kName };
   rows.Bind(1, key);
   std::string names;
   while (rows.Step())
-    names += (names.empty() ? "" : ", ") + rows.Text(0);
+    names += (names.empty() ? "" : ", ") + rows.Text(kName);
   if (!names.empty())
     throw HostCtlException("Netstack instance " + key + " cannot be " + doing +
                            " while it has Tarvik network interfaces (" + names + ")");
@@ -300,14 +313,16 @@ void NetworkInfoImpl::AddNetstackInstance(NetstackInstance& instance, bool disab
     exists.Bind(1, key);
     if (exists.Step())
       throw HostCtlException("Netstack instance " + key + " already exists");
-    Statement count = store.Prepare("SELECT count(*), coalesce(max(ord), 0) + 1 FROM netstack");
+    Statement count = store.Prepare(
+        "SELECT count(*) AS instances, coalesce(max(ord), 0) + 1 AS next_ord FROM netstack");
+    enum { kInstances, kNextOrd };
     count.Step();
-    if (count.Int(0) >= 32)
+    if (count.Int(kInstances) >= 32)
       throw HostCtlException("The host has the largest number of netstack instances (32)");
     store
         .Prepare("INSERT INTO netstack(key, ord, name, state, max_conn, cur_max_conn, ccalgo, "
                  "ipv6, cur_ipv6, ecn, predefined) VALUES(?,?,?,?,?,?,?,?,?,?,?)")
-        .BindAll(key, count.Int(1), instance.GetInstanceName(),
+        .BindAll(key, count.Int(kNextOrd), instance.GetInstanceName(),
                  disabled ? NetstackInstance::STATE_DISABLED : NetstackInstance::STATE_ENABLED,
                  maxConn, maxConn, cc, ipv6, ipv6, ecn, Contains(Ip::PredefinedNetstacks(), key))
         .Run();
@@ -331,8 +346,9 @@ uint32_t NetworkInfoImpl::GetNetstackInstanceState(const std::string& key) {
   store.CheckFault("GetNetstackInstanceState", key);
   return store.Read([&] {
     Statement row = store.Prepare("SELECT state FROM netstack WHERE key = ?");
+    enum { kState };
     row.Bind(1, key);
-    return row.Step() ? static_cast<uint32_t>(row.Int(0)) : NetstackInstance::STATE_DISABLED;
+    return row.Step() ? static_cast<uint32_t>(row.Int(kState)) : NetstackInstance::STATE_DISABLED;
   });
 }
 

@@ -7,8 +7,6 @@
 
 namespace Sim {
 
-bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
-
 using Model::Statement;
 using Model::Store;
 
@@ -21,26 +19,8 @@ NetworkInfoImpl::GetPnics(HostCtl::Network::PnicGetType type) {
   store.CheckFault("GetPnics", "*");
   std::vector<std::unique_ptr<HostCtl::Network::Pnic>> nics;
   store.Read([&] {
-    Statement rows = store.Prepare(
-        "SELECT name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, "
-        "speed, duplex, mac, mtu FROM pnic ORDER BY ord");
-    while (rows.Step()) {
-      PnicData data;
-      data.name = rows.Text(0);
-      data.hasPci = !rows.IsNull(1);
-      data.pciAddress = rows.Text(1);
-      data.vendor = rows.Text(2);
-      data.device = rows.Text(3);
-      data.pseudoDevice = rows.Text(4);
-      data.driver = rows.Text(5);
-      data.adminUp = rows.Bool(6);
-      data.carrier = rows.Bool(7);
-      data.speed = static_cast<uint32_t>(rows.Int(8));
-      data.duplex = static_cast<uint32_t>(rows.Int(9));
-      data.mac = rows.Text(10);
-      data.mtu = static_cast<uint32_t>(rows.Int(11));
+    for (PnicData& data : ListPnicData(store))
       nics.push_back(std::make_unique<PnicImpl>(std::move(data)));
-    }
   });
   return nics;
 }
@@ -78,10 +58,11 @@ std::unique_ptr<SmartNic> GetSmartNicByPnic(const std::string& pnicName) {
   return store.Read([&]() -> std::unique_ptr<SmartNic> {
     Model::Statement row =
         store.Prepare("SELECT dpu_id FROM pnic WHERE name = ? AND dpu_id IS NOT NULL");
+    enum { kDpuId };
     row.Bind(1, pnicName);
     if (!row.Step())
       return nullptr;
-    return std::make_unique<SmartNicImpl>(row.Text(0));
+    return std::make_unique<SmartNicImpl>(row.Text(kDpuId));
   });
 }
 

@@ -225,9 +225,10 @@ std::vector<PnicAttachment> PnicImpl::GetAttachments() const {
     std::vector<PnicAttachment> attachments;
     Statement rows =
         store.Prepare("SELECT branch, vlan_id FROM pnic_attachment WHERE trunk = ? ORDER BY ord");
+    enum { kBranch, kVlanId };
     rows.Bind(1, data_.name);
     while (rows.Step())
-      attachments.push_back({rows.Text(0), static_cast<uint16_t>(rows.Int(1))});
+      attachments.push_back({rows.Text(kBranch), static_cast<uint16_t>(rows.Int(kVlanId))});
     return attachments;
   });
 }
@@ -237,9 +238,10 @@ void PnicImpl::GetPnicStats(PnicStats& stats) const {
   store.CheckFault("GetPnicStats", data_.name);
   Data();
   std::string text = store.Read([&] {
-    Statement row = store.Prepare("SELECT counters FROM pnic_stats WHERE nic = ?");
+    Statement row = store.Prepare("SELECT value FROM pnic_record WHERE nic = ? AND kind = 'stats'");
+    enum { kValue };
     row.Bind(1, data_.name);
-    return row.Step() ? row.Text(0) : std::string("{}");
+    return row.Step() ? row.Text(kValue) : std::string("{}");
   });
   nlohmann::json counters = nlohmann::json::parse(text);
   for (const auto& key : Model::kPnicStatsKeys)

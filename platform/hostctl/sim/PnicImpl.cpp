@@ -28,28 +28,63 @@ private:
 
 } // namespace
 
-/// Reads the basic state of NIC \p name; false when the host has no such NIC.
+namespace {
+
+/// The columns of a NIC's basic state, as ReadPnicRow reads them.
+#define PNIC_COLUMNS                                                                               \
+  "name, pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, speed, duplex, "     \
+  "mac, mtu FROM pnic "
+enum PnicColumn {
+  kName,
+  kPciAddress,
+  kVendor,
+  kDevice,
+  kPseudoDesc,
+  kDriver,
+  kAdminUp,
+  kLinkUp,
+  kSpeed,
+  kDuplex,
+  kMac,
+  kMtu
+};
+
+/// One row of PNIC_COLUMNS.
+PnicData ReadPnicRow(const Statement& row) {
+  PnicData data;
+  data.name = row.Text(kName);
+  data.hasPci = !row.IsNull(kPciAddress);
+  data.pciAddress = row.Text(kPciAddress);
+  data.vendor = row.Text(kVendor);
+  data.device = row.Text(kDevice);
+  data.pseudoDevice = row.Text(kPseudoDesc);
+  data.driver = row.Text(kDriver);
+  data.adminUp = row.Bool(kAdminUp);
+  data.carrier = row.Bool(kLinkUp);
+  data.speed = static_cast<uint32_t>(row.Int(kSpeed));
+  data.duplex = static_cast<uint32_t>(row.Int(kDuplex));
+  data.mac = row.Text(kMac);
+  data.mtu = static_cast<uint32_t>(row.Int(kMtu));
+  return data;
+}
+
+} // namespace
+
 bool LoadPnicData(Store& store, const std::string& name, PnicData& data) {
-  Statement row = store.Prepare(
-      "SELECT pci_address, vendor, device, pseudo_desc, driver, admin_up, link_up, speed, "
-      "duplex, mac, mtu FROM pnic WHERE name = ?");
+  Statement row = store.Prepare("SELECT " PNIC_COLUMNS "WHERE name = ?");
   row.Bind(1, name);
   if (!row.Step())
     return false;
-  data.name = name;
-  data.hasPci = !row.IsNull(0);
-  data.pciAddress = row.Text(0);
-  data.vendor = row.Text(1);
-  data.device = row.Text(2);
-  data.pseudoDevice = row.Text(3);
-  data.driver = row.Text(4);
-  data.adminUp = row.Bool(5);
-  data.carrier = row.Bool(6);
-  data.speed = static_cast<uint32_t>(row.Int(7));
-  data.duplex = static_cast<uint32_t>(row.Int(8));
-  data.mac = row.Text(9);
-  data.mtu = static_cast<uint32_t>(row.Int(10));
+  data = ReadPnicRow(row);
   return true;
+}
+
+std::vector<PnicData> ListPnicData(Store& store) {
+  std::vector<PnicData> nics;
+  Statement rows = store.Prepare("SELECT " PNIC_COLUMNS "ORDER BY ord");
+  while (rows.Step())
+    nics.push_back(ReadPnicRow(rows));
+  return nics;
 }
 
 PnicImpl::PnicImpl(std::string name) : stale_(true) {

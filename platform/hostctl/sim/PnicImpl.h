@@ -16,6 +16,10 @@
 #include <string>
 #include <vector>
 
+namespace Model {
+class Store;
+} // namespace Model
+
 namespace Sim {
 
 /// The basic state of a physical NIC.
@@ -34,6 +38,13 @@ struct PnicData {
   std::string mac;          ///< MAC address text.
   uint32_t mtu = 0;         ///< MTU.
 };
+
+/// Reads the basic state of NIC \p name into \p data; false when the host has
+/// no such NIC (inside a transaction).
+bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
+/// The basic state of every NIC of the host, in the host's order (inside a
+/// transaction).
+std::vector<PnicData> ListPnicData(Model::Store& store);
 
 class PnicImpl : public HostCtl::Backend::Pnic {
 public:

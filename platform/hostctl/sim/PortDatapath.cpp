@@ -12,6 +12,7 @@
 #include "sim/PnicImpl.h"
 #include "sim/Switching.h"
 #include "sim/WorldImpl.h"
+#include <nlohmann/json.hpp>
 
 namespace Sim {
 
@@ -48,9 +49,10 @@ std::vector<MacAddress> PortImpl::GetMacAddresses() const {
     else
       sql = "SELECT mac FROM pnic WHERE name = (SELECT client FROM port WHERE id = ?1)";
     Statement rows = store.Prepare(sql);
+    enum { kMac };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      macs.emplace_back(rows.Text(0));
+      macs.emplace_back(rows.Text(kMac));
     return macs;
   });
 }
@@ -59,18 +61,20 @@ Ipv4Address PortImpl::GetPortClientIpv4Address() const {
   Store& store = Store::Host();
   store.CheckFault("GetPortClientIpv4Address", PortObject(data_.id));
   return store.Read([&] {
-    const char* sql = nullptr;
-    if (data_.clientKind == "vm")
-      sql = "SELECT ipv4 FROM vm_port WHERE port_id = ?";
-    else if (data_.clientKind == "tvknic")
-      sql = "SELECT ipv4_address FROM tvknic WHERE port_id = ?";
-    else
+    if (data_.clientKind == "vm") {
+      Statement row = store.Prepare("SELECT ipv4 FROM port WHERE id = ? AND ipv4 IS NOT NULL");
+      enum { kIpv4 };
+      row.Bind(1, data_.id);
+      return row.Step() ? Ipv4Address(static_cast<uint32_t>(row.Int(kIpv4))) : Ipv4Address();
+    }
+    if (data_.clientKind != "tvknic")
       return Ipv4Address();
-    Statement row = store.Prepare(sql);
+    Statement row = store.Prepare("SELECT ipv4_address FROM tvknic WHERE port_id = ?");
+    enum { kIpv4Address };
     row.Bind(1, data_.id);
-    if (!row.Step() || !Ipv4Address::IsValidAddress(row.Text(0)))
+    if (!row.Step() || !Ipv4Address::IsValidAddress(row.Text(kIpv4Address)))
       return Ipv4Address();
-    return Ipv4Address(row.Text(0));
+    return Ipv4Address(row.Text(kIpv4Address));
   });
 }
 
@@ -78,9 +82,10 @@ std::string PortImpl::GetSchedTeamUplink() const {
   Store& store = Store::Host();
   store.CheckFault("GetSchedTeamUplink", PortObject(data_.id));
   return store.Read([&] {
-    Statement row = store.Prepare("SELECT team_uplink FROM vm_port WHERE port_id = ?");
+    Statement row = store.Prepare("SELECT coalesce(team_uplink, '') FROM port WHERE id = ?");
+    enum { kTeamUplink };
     row.Bind(1, data_.id);
-    return row.Step() ? row.Text(0) : std::string();
+    return row.Step() ? row.Text(kTeamUplink) : std::string();
   });
 }
 
@@ -89,26 +94,26 @@ std::vector<std::unique_ptr<FilterStats>> PortImpl::GetFilterStats() const {
   store.CheckFault("GetFilterStats", PortObject(data_.id));
   return store.Read([&] {
     std::vector<std::unique_ptr<FilterStats>> filters;
-    Statement rows = store.Prepare(
-        "SELECT name, sort_key, active, direction, extended, packets_in, packets_out, "
-        "packets_dropped, packets_filtered, packets_faulted, packets_queued, packets_injected, "
-        "packet_errors FROM port_filter WHERE port_id = ? ORDER BY ord");
-    rows.Bind(1, data_.id);
-    while (rows.Step()) {
+    Statement row = store.Prepare("SELECT filters FROM port WHERE id = ? AND filters IS NOT NULL");
+    enum { kFilters };
+    row.Bind(1, data_.id);
+    if (!row.Step())
+      return filters;
+    for (const nlohmann::json& entry : nlohmann::json::parse(row.Text(kFilters))) {
       auto filter = std::make_unique<FilterStats>();
-      filter->name = rows.Text(0);
-      filter->sortKey = rows.Text(1);
-      filter->active = rows.Bool(2);
-      filter->direction = rows.Bool(3);
-      filter->extended = rows.Bool(4);
-      filter->packetsIn = Counter(rows, 5);
-      filter->packetsOut = Counter(rows, 6);
-      filter->packetsDropped = Counter(rows, 7);
-      filter->packetsFiltered = Counter(rows, 8);
-      filter->packetsFaulted = Counter(rows, 9);
-      filter->packetsQueued = Counter(rows, 10);
-      filter->packetsInjected = Counter(rows, 11);
-      filter->packetErrors = Counter(rows, 12);
+      filter->name = entry.at("name").get<std::string>();
+      filter->sortKey = entry.at("sortKey").get<std::string>();
+      filter->active = entry.at("active").get<bool>();
+      filter->direction = entry.at("outbound").get<bool>();
+      filter->extended = entry.at("extended").get<bool>();
+      filter->packetsIn = entry.at("packetsIn").get<uint64_t>();
+      filter->packetsOut = entry.at("packetsOut").get<uint64_t>();
+      filter->packetsDropped = entry.at("packetsDropped").get<uint64_t>();
+      filter->packetsFiltered = entry.at("packetsFiltered").get<uint64_t>();
+      filter->packetsFaulted = entry.at("packetsFaulted").get<uint64_t>();
+      filter->packetsQueued = entry.at("packetsQueued").get<uint64_t>();
+      filter->packetsInjected = entry.at("packetsInjected").get<uint64_t>();
+      filter->packetErrors = entry.at("packetErrors").get<uint64_t>();
       filters.push_back(std::move(filter));
     }
     return filters;
@@ -119,12 +124,13 @@ void PortImpl::GetPortStats(HostCtl::Network::PortStats& stats) const {
   Store& store = Store::Host();
   store.CheckFault("GetPortStats", PortObject(data_.id));
   store.Read([&] {
-    Statement row = store.Prepare("SELECT rx_bytes, tx_bytes FROM port_counter WHERE port_id = ?");
+    Statement row = store.Prepare("SELECT rx_bytes, tx_bytes FROM port WHERE id = ?");
+    enum { kRxBytes, kTxBytes };
     row.Bind(1, data_.id);
     stats = {};
     if (row.Step()) {
-      stats.bytesReceived = Counter(row, 0);
-      stats.bytesSent = Counter(row, 1);
+      stats.bytesReceived = Counter(row, kRxBytes);
+      stats.bytesSent = Counter(row, kTxBytes);
     }
   });
 }
@@ -135,18 +141,28 @@ void PortImpl::GetPacketStats(HostCtl::Network::PacketStats& stats) const {
   store.Read([&] {
     Statement row = store.Prepare(
         "SELECT tx_packets, tx_multicast, tx_broadcast, rx_packets, rx_multicast, rx_broadcast, "
-        "tx_dropped, rx_dropped FROM port_counter WHERE port_id = ?");
+        "tx_dropped, rx_dropped FROM port WHERE id = ?");
+    enum {
+      kTxPackets,
+      kTxMulticast,
+      kTxBroadcast,
+      kRxPackets,
+      kRxMulticast,
+      kRxBroadcast,
+      kTxDropped,
+      kRxDropped
+    };
     row.Bind(1, data_.id);
     stats = {};
     if (row.Step()) {
-      stats.packetsSent = Counter(row, 0);
-      stats.multicastPacketsSent = Counter(row, 1);
-      stats.broadcastPacketsSent = Counter(row, 2);
-      stats.packetsReceived = Counter(row, 3);
-      stats.multicastPacketsReceived = Counter(row, 4);
-      stats.broadcastPacketsReceived = Counter(row, 5);
-      stats.transmitDropped = Counter(row, 6);
-      stats.receiveDropped = Counter(row, 7);
+      stats.packetsSent = Counter(row, kTxPackets);
+      stats.multicastPacketsSent = Counter(row, kTxMulticast);
+      stats.broadcastPacketsSent = Counter(row, kTxBroadcast);
+      stats.packetsReceived = Counter(row, kRxPackets);
+      stats.multicastPacketsReceived = Counter(row, kRxMulticast);
+      stats.broadcastPacketsReceived = Counter(row, kRxBroadcast);
+      stats.transmitDropped = Counter(row, kTxDropped);
+      stats.receiveDropped = Counter(row, kRxDropped);
     }
   });
 }
@@ -159,17 +175,18 @@ std::unique_ptr<HostCtl::Network::Port> PnicImpl::GetPort() const {
     Statement row = store.Prepare(
         "SELECT id, portset_id, coalesce(dvport_key, ''), world_id, port_type FROM port "
         "WHERE client_kind = 'uplink' AND client = ? ORDER BY id LIMIT 1");
+    enum { kId, kPortsetId, kDvportKey, kWorldId, kPortType };
     row.Bind(1, name);
     if (!row.Step())
       return nullptr;
     PortData data;
-    data.id = row.Int(0);
-    data.portsetId = row.Int(1);
-    data.dvPortId = row.Text(2);
+    data.id = row.Int(kId);
+    data.portsetId = row.Int(kPortsetId);
+    data.dvPortId = row.Text(kDvportKey);
     data.clientKind = "uplink";
     data.client = name;
-    data.worldId = row.Int(3);
-    data.type = static_cast<int>(row.Int(4));
+    data.worldId = row.Int(kWorldId);
+    data.type = static_cast<int>(row.Int(kPortType));
     return std::make_unique<PortImpl>(std::move(data));
   });
 }
@@ -179,17 +196,17 @@ std::unique_ptr<HostCtl::Network::Port> PnicImpl::GetPort() const {
 namespace Sim {
 
 WorldImpl::WorldImpl(int64_t worldId) : worldId_(worldId) {}
-WorldImpl::~WorldImpl() = default;
 
 std::string WorldImpl::GetWorldName() const {
   Model::Store& store = Model::Store::Host();
   store.CheckFault("GetWorldName", std::to_string(worldId_));
   return store.Read([&] {
     Model::Statement row = store.Prepare("SELECT name FROM world WHERE id = ?");
+    enum { kName };
     row.Bind(1, worldId_);
     if (!row.Step())
       throw HostCtl::Lib::HostCtlException("There is no world with id " + std::to_string(worldId_));
-    return row.Text(0);
+    return row.Text(kName);
   });
 }
 

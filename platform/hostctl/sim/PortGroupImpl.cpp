@@ -40,11 +40,12 @@ std::optional<GroupRow> FindGroup(Store& store, const std::string& name) {
   Statement row = store.Prepare("SELECT g.id, g.portset_id, p.name, p.system, g.vlan_id FROM "
                                 "portgroup g JOIN portset p ON p.id = g.portset_id "
                                 "WHERE g.name = ?");
+  enum { kId, kPortsetId, kName, kSystem, kVlanId };
   row.Bind(1, name);
   if (!row.Step())
     return std::nullopt;
-  return GroupRow{row.Int(0), row.Int(1), row.Text(2), row.Bool(3),
-                  static_cast<uint16_t>(row.Int(4))};
+  return GroupRow{row.Int(kId), row.Int(kPortsetId), row.Text(kName), row.Bool(kSystem),
+                  static_cast<uint16_t>(row.Int(kVlanId))};
 }
 
 GroupRow RequireGroup(Store& store, const std::string& name) {
@@ -56,8 +57,9 @@ GroupRow RequireGroup(Store& store, const std::string& name) {
 
 std::string PolicyText(Store& store, int64_t id, const char* sql) {
   Statement row = store.Prepare(sql);
+  enum { kPolicy };
   row.Bind(1, id);
-  return row.Step() ? row.Text(0) : std::string("{}");
+  return row.Step() ? row.Text(kPolicy) : std::string("{}");
 }
 
 NicTeamingPolicy ConfiguredTeaming(Store& store, int64_t id) {
@@ -162,9 +164,10 @@ uint32_t PortGroupImpl::GetActiveClients() const {
     GroupRow group = RequireGroup(store, name_);
     Statement row = store.Prepare("SELECT count(*) FROM port WHERE portgroup_id = ? AND "
                                   "client_kind IN ('tvknic', 'vm')");
+    enum { kCount };
     row.Bind(1, group.id);
     row.Step();
-    return static_cast<uint32_t>(row.Int(0));
+    return static_cast<uint32_t>(row.Int(kCount));
   });
 }
 
@@ -218,9 +221,10 @@ void PortGroupImpl::SetNicTeamingPolicy(const NicTeamingPolicy& policy) {
     if (policy.IsSet(NicTeamingPolicy::MASK_UPLINK_ORDER)) {
       std::vector<std::string> uplinks;
       Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ?");
+      enum { kNic };
       rows.Bind(1, group.portsetId);
       while (rows.Step())
-        uplinks.push_back(rows.Text(0));
+        uplinks.push_back(rows.Text(kNic));
       std::set<std::string> seen;
       for (const std::string& name : policy.GetUplinkOrder()) {
         if (std::find(uplinks.begin(), uplinks.end(), name) == uplinks.end())

@@ -22,14 +22,18 @@ PortsetKind KindOf(const std::string& text) {
   return PortsetKind::Standard;
 }
 
+/// The columns ReadPortset reads: "SELECT id, name, kind, system FROM portset".
+enum PortsetColumn { kRowPortsetId, kRowPortsetName, kRowPortsetKind, kRowPortsetSystem };
+
+/// The next row of a statement that selects the PortsetColumn columns.
 std::optional<PortsetData> ReadPortset(Statement& row) {
   if (!row.Step())
     return std::nullopt;
   PortsetData data;
-  data.id = row.Int(0);
-  data.name = row.Text(1);
-  data.kind = KindOf(row.Text(2));
-  data.system = row.Bool(3);
+  data.id = row.Int(kRowPortsetId);
+  data.name = row.Text(kRowPortsetName);
+  data.kind = KindOf(row.Text(kRowPortsetKind));
+  data.system = row.Bool(kRowPortsetSystem);
   return data;
 }
 
@@ -100,8 +104,9 @@ std::string PortsetImpl::GetIdentifier() const {
   Store& store = Store::Host();
   return store.Read([&] {
     Statement row = store.Prepare("SELECT uuid FROM dvswitch WHERE portset_id = ?");
+    enum { kUuid };
     row.Bind(1, data_.id);
-    return row.Step() ? row.Text(0) : data_.name;
+    return row.Step() ? row.Text(kUuid) : data_.name;
   });
 }
 
@@ -115,8 +120,9 @@ std::string PortsetImpl::GetClassName() const {
   Store& store = Store::Host();
   return store.Read([&] {
     Statement row = store.Prepare("SELECT class_name FROM dvswitch WHERE portset_id = ?");
+    enum { kClassName };
     row.Bind(1, data_.id);
-    return row.Step() ? row.Text(0) : std::string("corvex-dvs");
+    return row.Step() ? row.Text(kClassName) : std::string("corvex-dvs");
   });
 }
 
@@ -125,8 +131,9 @@ uint32_t PortsetImpl::GetNumPorts() const {
   store.CheckFault("GetNumPorts", data_.name);
   return store.Read([&] {
     Statement row = store.Prepare("SELECT num_ports FROM portset WHERE id = ?");
+    enum { kNumPorts };
     row.Bind(1, data_.id);
-    return row.Step() ? static_cast<uint32_t>(row.Int(0)) : 0u;
+    return row.Step() ? static_cast<uint32_t>(row.Int(kNumPorts)) : 0u;
   });
 }
 
@@ -141,9 +148,10 @@ uint32_t PortsetImpl::GetUsedPorts() const {
   store.CheckFault("GetUsedPorts", data_.name);
   return store.Read([&] {
     Statement row = store.Prepare("SELECT count(*) FROM port WHERE portset_id = ?");
+    enum { kCount };
     row.Bind(1, data_.id);
     row.Step();
-    return static_cast<uint32_t>(row.Int(0));
+    return static_cast<uint32_t>(row.Int(kCount));
   });
 }
 
@@ -153,9 +161,10 @@ std::vector<std::string> PortsetImpl::GetUplinks() const {
   return store.Read([&] {
     std::vector<std::string> names;
     Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+    enum { kNic };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      names.push_back(rows.Text(0));
+      names.push_back(rows.Text(kNic));
     return names;
   });
 }
@@ -169,17 +178,18 @@ std::vector<std::unique_ptr<Port>> PortsetImpl::GetPorts() const {
         "SELECT p.id, p.portset_id, coalesce(g.name, ''), coalesce(p.dvport_key, ''), "
         "p.client_kind, p.client, p.world_id, p.port_type FROM port p "
         "LEFT JOIN portgroup g ON g.id = p.portgroup_id WHERE p.portset_id = ? ORDER BY p.id");
+    enum { kId, kPortsetId, kName, kDvportKey, kClientKind, kClient, kWorldId, kPortType };
     rows.Bind(1, data_.id);
     while (rows.Step()) {
       PortData port;
-      port.id = rows.Int(0);
-      port.portsetId = rows.Int(1);
-      port.portGroup = rows.Text(2);
-      port.dvPortId = rows.Text(3);
-      port.clientKind = rows.Text(4);
-      port.client = rows.Text(5);
-      port.worldId = rows.Int(6);
-      port.type = static_cast<int>(rows.Int(7));
+      port.id = rows.Int(kId);
+      port.portsetId = rows.Int(kPortsetId);
+      port.portGroup = rows.Text(kName);
+      port.dvPortId = rows.Text(kDvportKey);
+      port.clientKind = rows.Text(kClientKind);
+      port.client = rows.Text(kClient);
+      port.worldId = rows.Int(kWorldId);
+      port.type = static_cast<int>(rows.Int(kPortType));
       ports.push_back(std::make_unique<PortImpl>(std::move(port)));
     }
     return ports;
@@ -317,13 +327,14 @@ std::vector<std::unique_ptr<PortGroup>> NetworkInfoImpl::GetAllPortGroups(Portse
   store.Read([&] {
     Statement rows = store.Prepare(
         "SELECT g.name, p.name, g.vlan_id, (SELECT count(*) FROM port WHERE portgroup_id = g.id "
-        "AND client_kind IN ('tvknic', 'vm')) FROM portgroup g JOIN portset p ON p.id = "
-        "g.portset_id WHERE g.system = ? ORDER BY p.ord, g.ord");
+        "AND client_kind IN ('tvknic', 'vm')) AS clients FROM portgroup g JOIN portset p ON p.id "
+        "= g.portset_id WHERE g.system = ? ORDER BY p.ord, g.ord");
+    enum { kGroupName, kSwitchName, kVlanId, kClients };
     rows.Bind(1, type == PortsetGetSystem ? 1 : 0);
     while (rows.Step())
-      groups.push_back(std::make_unique<PortGroupImpl>(
-          PortGroupData{rows.Text(0), rows.Text(1), static_cast<uint16_t>(rows.Int(2)),
-                        static_cast<uint32_t>(rows.Int(3))}));
+      groups.push_back(std::make_unique<PortGroupImpl>(PortGroupData{
+          rows.Text(kGroupName), rows.Text(kSwitchName), static_cast<uint16_t>(rows.Int(kVlanId)),
+          static_cast<uint32_t>(rows.Int(kClients))}));
   });
   return groups;
 }

@@ -27,10 +27,11 @@ namespace {
 bool VlanStatsEnabled(Store& store, int64_t portsetId, const std::string& switchName,
                       const std::string& nic) {
   Statement row = store.Prepare("SELECT vlan_stats FROM uplink WHERE portset_id = ? AND nic = ?");
+  enum { kVlanStats };
   row.BindAll(portsetId, nic);
   if (!row.Step())
     throw HostCtlException(nic + " is not an uplink of virtual switch " + switchName);
-  return row.Bool(0);
+  return row.Bool(kVlanStats);
 }
 
 } // namespace
@@ -46,19 +47,21 @@ std::vector<VlanStats> PortsetImpl::GetVlanStats(const std::string& nicName) con
     {
       Statement groups = store.Prepare("SELECT DISTINCT vlan_id FROM portgroup WHERE portset_id = "
                                        "? AND vlan_id BETWEEN 1 AND 4094");
+      enum { kVlanId };
       groups.Bind(1, data_.id);
       while (groups.Step()) {
-        auto vlan = static_cast<uint16_t>(groups.Int(0));
+        auto vlan = static_cast<uint16_t>(groups.Int(kVlanId));
         byVlan[vlan] = {vlan, 0, 0};
       }
     }
     Statement counters = store.Prepare(
         "SELECT vlan_id, rx_packets, tx_packets FROM pnic_vlan_counter WHERE nic = ?");
+    enum { kCountersVlanId, kCountersRxPackets, kCountersTxPackets };
     counters.Bind(1, nicName);
     while (counters.Step()) {
-      auto vlan = static_cast<uint16_t>(counters.Int(0));
-      byVlan[vlan] = {vlan, static_cast<uint64_t>(counters.Int(1)),
-                      static_cast<uint64_t>(counters.Int(2))};
+      auto vlan = static_cast<uint16_t>(counters.Int(kCountersVlanId));
+      byVlan[vlan] = {vlan, static_cast<uint64_t>(counters.Int(kCountersRxPackets)),
+                      static_cast<uint64_t>(counters.Int(kCountersTxPackets))};
     }
     for (const auto& [vlan, entry] : byVlan)
       stats.push_back(entry);

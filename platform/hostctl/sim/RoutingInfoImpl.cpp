@@ -7,6 +7,9 @@
 #include "model/IpServicesModel.h"
 #include "model/Store.h"
 
+#include <optional>
+#include <type_traits>
+
 namespace Sim {
 
 using HostCtl::Lib::HostCtlException;
@@ -52,16 +55,26 @@ std::string NeighborText(const char* family, const Neighbor& neighbor,
 template <typename Neighbor>
 bool DeleteNeighbors(Store& store, int family, const Neighbor& neighbor,
                      const std::string& netstack) {
-  store
-      .Prepare("DELETE FROM ipsvc_neighbor WHERE family = ?1 AND address = ?2 AND interface IN "
-               "(SELECT name FROM tvknic WHERE netstack = ?3) AND (?4 = '' OR interface = ?4)")
-      .BindAll(family, neighbor.GetAddress().GetStringAddress(), netstack,
-               neighbor.GetInterfaceName())
-      .Run();
+  Statement remove = store.Prepare(
+      "DELETE FROM ipsvc_neighbor WHERE family = ?1 AND address = ?2 AND interface IN "
+      "(SELECT name FROM tvknic WHERE netstack = ?3) AND (?4 = '' OR interface = ?4)");
+  remove.Bind(1, family);
+  IpSvc::BindAddress(remove, 2, neighbor.GetAddress());
+  remove.Bind(3, netstack).Bind(4, neighbor.GetInterfaceName()).Run();
   return store.Changes() > 0;
 }
 
-/// The neighbour rows of a netstack.
+/// The columns of NeighborRows.
+enum NeighborColumn {
+  kNeighborAddress,
+  kNeighborMac,
+  kNeighborInterface,
+  kNeighborExpiry,
+  kNeighborType,
+  kNeighborState
+};
+
+/// The neighbour rows of a netstack (NeighborColumn).
 Statement NeighborRows(Store& store, int family, const std::string& netstack,
                        const std::string& interfaceName, PortsetGetType selector) {
   Statement rows = store.Prepare(
@@ -103,26 +116,29 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
     Statement nics = store.Prepare(
         "SELECT name, ipv4_address, ipv4_netmask FROM tvknic WHERE netstack = ? AND system = ? "
         "AND enabled = 1 AND ipv4_address <> '0.0.0.0' ORDER BY ord");
+    enum { kName, kIpv4Address, kIpv4Netmask };
     nics.BindAll(netstack_, system);
     while (nics.Step()) {
       uint32_t address = 0;
       uint32_t mask = 0;
-      if (!Ipv4Address::Parse(nics.Text(1), address) || !Ipv4Address::Parse(nics.Text(2), mask) ||
-          mask == 0 || !Ipv4Address(mask).IsNetmask())
+      if (!Ipv4Address::Parse(nics.Text(kIpv4Address), address) ||
+          !Ipv4Address::Parse(nics.Text(kIpv4Netmask), mask) || mask == 0 ||
+          !Ipv4Address(mask).IsNetmask())
         continue;
       Ipv4Network network(Ipv4Address(address & mask), Ipv4Address(mask));
       sources_.emplace(SourceKey(network), SOURCE_CONNECTED);
-      routes.emplace_back(network, Ipv4Address(), nics.Text(0));
+      routes.emplace_back(network, Ipv4Address(), nics.Text(kName));
     }
     Statement rows = store.Prepare(
         "SELECT network, prefix, gateway, interface, source FROM ipsvc_route WHERE netstack = ? "
         "AND family = 4 AND system = ? ORDER BY id");
+    enum { kNetwork, kPrefix, kGateway, kInterface, kSource };
     rows.BindAll(netstack_, system);
     while (rows.Step()) {
-      Ipv4Network network(Ipv4Address(rows.Text(0)),
-                          Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(1))));
-      sources_.emplace(SourceKey(network), rows.Text(4));
-      routes.emplace_back(network, Ipv4Address(rows.Text(2)), rows.Text(3));
+      Ipv4Network network(IpSvc::Ipv4Column(rows, kNetwork),
+                          Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(kPrefix))));
+      sources_.emplace(SourceKey(network), rows.Text(kSource));
+      routes.emplace_back(network, IpSvc::Ipv4Column(rows, kGateway), rows.Text(kInterface));
     }
   });
   return routes;
@@ -140,12 +156,14 @@ void RoutingInfoImpl::RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Ad
   store.CheckFault("RemoveTarvikRoute", netstack_);
   store.Write([&] {
     IpSvc::RequireNetstack(store, netstack_);
-    store
-        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
-                 "network = ? AND prefix = ? AND gateway = ?")
-        .BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength(),
-                 gateway.GetStringAddress())
-        .Run();
+    Statement remove =
+        store.Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 "
+                      "AND network = ? AND prefix = ? AND gateway = ?");
+    remove.Bind(1, netstack_);
+    IpSvc::BindAddress(remove, 2, network.GetNetwork());
+    remove.Bind(3, network.GetPrefixLength());
+    IpSvc::BindAddress(remove, 4, gateway);
+    remove.Run();
     if (store.Changes() == 0)
       throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV4_ROUTE) +
                              " through " + gateway.GetStringAddress() + " in netstack " +
@@ -155,13 +173,20 @@ void RoutingInfoImpl::RemoveTarvikRoute(const Ipv4Network& network, const Ipv4Ad
 
 namespace {
 
-/// The gateway of the ordinary default route of one family, or "".
-std::string RunningGateway(Store& store, const std::string& netstack, int family) {
-  Statement row = store.Prepare(
-      "SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? AND system = 0 AND "
-      "prefix = 0 AND network IN ('0.0.0.0', '::')");
+/// The gateway of the ordinary default route of one family, if any (a route
+/// of prefix length 0 has network 0.0.0.0 or ::, since host bits are refused).
+template <typename Address>
+std::optional<Address> RunningGateway(Store& store, const std::string& netstack, int family) {
+  Statement row = store.Prepare("SELECT gateway FROM ipsvc_route WHERE netstack = ? AND family = ? "
+                                "AND system = 0 AND prefix = 0");
+  enum { kGateway };
   row.BindAll(netstack, family);
-  return row.Step() ? row.Text(0) : std::string();
+  if (!row.Step())
+    return std::nullopt;
+  if constexpr (std::is_same_v<Address, Ipv4Address>)
+    return IpSvc::Ipv4Column(row, kGateway);
+  else
+    return IpSvc::Ipv6Column(row, kGateway);
 }
 
 } // namespace
@@ -169,11 +194,10 @@ std::string RunningGateway(Store& store, const std::string& netstack, int family
 Ipv4Address RoutingInfoImpl::GetTvKernelDefaultGateway() {
   Store& store = Store::Host();
   store.CheckFault("GetTvKernelDefaultGateway", netstack_);
-  std::string gateway = store.Read([&] {
+  return store.Read([&] {
     IpSvc::RequireNetstack(store, netstack_);
-    return RunningGateway(store, netstack_, 4);
+    return RunningGateway<Ipv4Address>(store, netstack_, 4).value_or(Ipv4Address());
   });
-  return gateway.empty() ? Ipv4Address() : Ipv4Address(gateway);
 }
 
 Ipv4Address RoutingInfoImpl::GetTvKernelConfigDefaultGateway() {
@@ -193,7 +217,7 @@ void RoutingInfoImpl::SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool
     IpSvc::RequireNetstack(store, netstack_);
     store
         .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 4 AND system = 0 AND "
-                 "network = '0.0.0.0' AND prefix = 0")
+                 "prefix = 0")
         .Bind(1, netstack_)
         .Run();
     bool clear = gateway.GetValue() == 0;
@@ -214,16 +238,21 @@ std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network)
     Statement row = store.Prepare(
         "SELECT source FROM ipsvc_route WHERE netstack = ? AND family = 4 AND network = ? AND "
         "prefix = ? ORDER BY system");
-    row.BindAll(netstack_, network.GetNetwork().GetStringAddress(), network.GetPrefixLength());
+    enum { kSource };
+    row.Bind(1, netstack_);
+    IpSvc::BindAddress(row, 2, network.GetNetwork());
+    row.Bind(3, network.GetPrefixLength());
     if (row.Step())
-      return row.Text(0);
+      return row.Text(kSource);
     Statement nics = store.Prepare("SELECT ipv4_address, ipv4_netmask FROM tvknic WHERE netstack "
                                    "= ? AND enabled = 1 AND ipv4_address <> '0.0.0.0'");
+    enum { kIpv4Address, kIpv4Netmask };
     nics.Bind(1, netstack_);
     while (nics.Step()) {
       uint32_t address = 0;
       uint32_t mask = 0;
-      if (Ipv4Address::Parse(nics.Text(0), address) && Ipv4Address::Parse(nics.Text(1), mask) &&
+      if (Ipv4Address::Parse(nics.Text(kIpv4Address), address) &&
+          Ipv4Address::Parse(nics.Text(kIpv4Netmask), mask) &&
           Ipv4Network(Ipv4Address(address & mask), Ipv4Address(mask)) == network)
         return std::string(SOURCE_CONNECTED);
     }
@@ -246,24 +275,27 @@ std::vector<Ipv6Route> RoutingInfoImpl::GetCurrentIpv6TarvikRoutes(PortsetGetTyp
         "SELECT t.name, a.address, a.prefix FROM tvknic_ipv6 a JOIN tvknic t ON t.name = a.nic "
         "WHERE t.netstack = ? AND t.system = ? AND t.enabled = 1 AND a.status <> 3 AND "
         "a.prefix > 0 AND a.prefix < 128 ORDER BY t.ord, a.ord");
+    enum { kName, kAddress, kPrefix };
     nics.BindAll(netstack_, system);
     while (nics.Step()) {
       std::array<uint8_t, 16> bytes{};
-      if (!Ipv6Address::Parse(nics.Text(1), bytes))
+      if (!Ipv6Address::Parse(nics.Text(kAddress), bytes))
         continue;
-      int prefix = static_cast<int>(nics.Int(2));
+      int prefix = static_cast<int>(nics.Int(kPrefix));
       const auto mask = Ipv6Network::NetmaskFromNumber(prefix).GetBytes();
       for (int i = 0; i < 16; ++i)
         bytes[i] &= mask[i];
-      routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(0));
+      routes.emplace_back(Ipv6Network(Ipv6Address(bytes), prefix), Ipv6Address(), nics.Text(kName));
     }
     Statement rows = store.Prepare(
         "SELECT network, prefix, gateway, interface FROM ipsvc_route WHERE netstack = ? AND "
         "family = 6 AND system = ? ORDER BY id");
+    enum { kRowsNetwork, kRowsPrefix, kRowsGateway, kRowsInterface };
     rows.BindAll(netstack_, system);
     while (rows.Step())
-      routes.emplace_back(Ipv6Network(Ipv6Address(rows.Text(0)), static_cast<int>(rows.Int(1))),
-                          Ipv6Address(rows.Text(2)), rows.Text(3));
+      routes.emplace_back(Ipv6Network(IpSvc::Ipv6Column(rows, kRowsNetwork),
+                                      static_cast<int>(rows.Int(kRowsPrefix))),
+                          IpSvc::Ipv6Column(rows, kRowsGateway), rows.Text(kRowsInterface));
   });
   return routes;
 }
@@ -285,12 +317,14 @@ void RoutingInfoImpl::RemoveIpv6TarvikRoute(const Ipv6Network& network,
   store.Write([&] {
     IpSvc::RequireNetstack(store, netstack_);
     IpSvc::RequireIpv6(store, netstack_);
-    store
-        .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
-                 "network = ? AND prefix = ? AND gateway = ?")
-        .BindAll(netstack_, network.GetAddress().GetStringAddress(), network.GetNetmask(),
-                 gateway.GetStringAddress())
-        .Run();
+    Statement remove =
+        store.Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 "
+                      "AND network = ? AND prefix = ? AND gateway = ?");
+    remove.Bind(1, netstack_);
+    IpSvc::BindAddress(remove, 2, network.GetAddress());
+    remove.Bind(3, network.GetNetmask());
+    IpSvc::BindAddress(remove, 4, gateway);
+    remove.Run();
     if (store.Changes() == 0)
       throw HostCtlException("No route to " + Destination(network, DEFAULT_IPV6_ROUTE) +
                              " through " + gateway.GetStringAddress() + " in netstack " +
@@ -301,13 +335,12 @@ void RoutingInfoImpl::RemoveIpv6TarvikRoute(const Ipv6Network& network,
 Ipv6Address RoutingInfoImpl::GetIpv6TvKernelDefaultGateway() {
   Store& store = Store::Host();
   store.CheckFault("GetIpv6TvKernelDefaultGateway", netstack_);
-  std::string gateway = store.Read([&] {
+  return store.Read([&] {
     IpSvc::RequireNetstack(store, netstack_);
     if (!IpSvc::Ipv6Running(store, netstack_))
-      return std::string();
-    return RunningGateway(store, netstack_, 6);
+      return Ipv6Address();
+    return RunningGateway<Ipv6Address>(store, netstack_, 6).value_or(Ipv6Address());
   });
-  return gateway.empty() ? Ipv6Address() : Ipv6Address(gateway);
 }
 
 Ipv6Address RoutingInfoImpl::GetIpv6TvKernelConfigDefaultGateway() {
@@ -330,7 +363,7 @@ void RoutingInfoImpl::SetIpv6TvKernelDefaultGateway(const Ipv6Address& gateway) 
       IpSvc::RequireIpv6(store, netstack_);
     store
         .Prepare("DELETE FROM ipsvc_route WHERE netstack = ? AND family = 6 AND system = 0 AND "
-                 "network = '::' AND prefix = 0")
+                 "prefix = 0")
         .Bind(1, netstack_)
         .Run();
     if (!clear)
@@ -350,8 +383,10 @@ void RoutingInfoImpl::GetCurrentIpv4TarvikNeighbors(std::vector<Ipv4Neighbor>& l
     IpSvc::RequireNetstack(store, netstack_);
     Statement rows = NeighborRows(store, 4, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(Ipv4Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
-                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+      list.emplace_back(IpSvc::Ipv4Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
+                        rows.Text(kNeighborInterface), rows.Int(kNeighborExpiry),
+                        static_cast<int>(rows.Int(kNeighborType)),
+                        static_cast<int>(rows.Int(kNeighborState)));
   });
 }
 
@@ -366,8 +401,10 @@ void RoutingInfoImpl::GetCurrentIpv6TarvikNeighbors(std::vector<Ipv6Neighbor>& l
       return;
     Statement rows = NeighborRows(store, 6, netstack_, interfaceName, selector);
     while (rows.Step())
-      list.emplace_back(Ipv6Address(rows.Text(0)), rows.Text(1), rows.Text(2), rows.Int(3),
-                        static_cast<int>(rows.Int(4)), static_cast<int>(rows.Int(5)));
+      list.emplace_back(IpSvc::Ipv6Column(rows, kNeighborAddress), rows.Text(kNeighborMac),
+                        rows.Text(kNeighborInterface), rows.Int(kNeighborExpiry),
+                        static_cast<int>(rows.Int(kNeighborType)),
+                        static_cast<int>(rows.Int(kNeighborState)));
   });
 }
 

@@ -2,7 +2,7 @@
 //
 // The SR-IOV operations of the network root: the NICs with SR-IOV enabled,
 // their virtual functions and the counters of one virtual function, over the
-// sriov_nic and sriov_vf tables of model/NicPart.cpp.
+// sriov column of pnic and the sriov_vf table of model/NicPart.cpp.
 //
 //===----------------------------------------------------------------------===//
 #include "sim/NetworkInfoImpl.h"
@@ -16,8 +16,6 @@
 
 namespace Sim {
 
-bool LoadPnicData(Model::Store& store, const std::string& name, PnicData& data);
-
 using HostCtl::Lib::HostCtlException;
 using Model::Statement;
 using Model::Store;
@@ -26,7 +24,7 @@ using namespace HostCtl::Network;
 namespace {
 
 bool IsSriovNic(Store& store, const std::string& name) {
-  Statement row = store.Prepare("SELECT 1 FROM sriov_nic WHERE nic = ?");
+  Statement row = store.Prepare("SELECT 1 FROM pnic WHERE name = ? AND sriov = 1");
   row.Bind(1, name);
   return row.Step();
 }
@@ -47,10 +45,10 @@ std::vector<std::unique_ptr<Pnic>> NetworkInfoImpl::GetSriovNics() {
   store.CheckFault("GetSriovNics", "*");
   return store.Read([&] {
     std::vector<std::string> names;
-    Statement rows = store.Prepare(
-        "SELECT pnic.name FROM pnic JOIN sriov_nic ON sriov_nic.nic = pnic.name ORDER BY ord");
+    Statement rows = store.Prepare("SELECT name FROM pnic WHERE sriov = 1 ORDER BY ord");
+    enum { kName };
     while (rows.Step())
-      names.push_back(rows.Text(0));
+      names.push_back(rows.Text(kName));
     std::vector<std::unique_ptr<Pnic>> nics;
     for (const std::string& name : names) {
       PnicData data;
@@ -80,9 +78,11 @@ std::vector<SriovNicVFInfo> NetworkInfoImpl::GetSriovNicVFInfo(const std::string
     std::vector<SriovNicVFInfo> vfs;
     Statement rows = store.Prepare("SELECT vf_id, active, pci_address, owner_world FROM sriov_vf "
                                    "WHERE nic = ? ORDER BY vf_id");
+    enum { kVfId, kActive, kPciAddress, kOwnerWorld };
     rows.Bind(1, name);
     while (rows.Step())
-      vfs.push_back({static_cast<uint8_t>(rows.Int(0)), rows.Bool(1), rows.Text(2), rows.Text(3)});
+      vfs.push_back({static_cast<uint8_t>(rows.Int(kVfId)), rows.Bool(kActive),
+                     rows.Text(kPciAddress), rows.Text(kOwnerWorld)});
     return vfs;
   });
 }
@@ -94,10 +94,11 @@ void NetworkInfoImpl::GetSriovNicVFStats(SriovNicVFStats& stats, const std::stri
   std::string text = store.Read([&] {
     RequireSriovNic(store, name);
     Statement row = store.Prepare("SELECT counters FROM sriov_vf WHERE nic = ? AND vf_id = ?");
+    enum { kCounters };
     row.BindAll(name, vfId);
     if (!row.Step())
       throw HostCtlException("NIC " + name + " has no VF with ID " + std::to_string(vfId));
-    return row.Text(0);
+    return row.Text(kCounters);
   });
   nlohmann::json counters = nlohmann::json::parse(text);
   for (const auto& key : Model::kVfStatsKeys)

@@ -29,9 +29,10 @@ bool ReadState(const char* operation, const char* sql) {
   store.CheckFault(operation, FirewallModuleName);
   return store.Read([&] {
     Statement row = store.Prepare(sql);
+    enum { kState };
     if (!row.Step())
       throw HostCtlException("The host has no firewall state");
-    return row.Bool(0);
+    return row.Bool(kState);
   });
 }
 
@@ -51,23 +52,27 @@ SystemInfoImpl::SystemInfoImpl() = default;
 SystemInfoImpl::~SystemInfoImpl() = default;
 
 bool SystemInfoImpl::IsFirewallEnabled() {
-  return ReadState("IsFirewallEnabled", "SELECT enabled FROM fw_state WHERE id = 1");
+  return ReadState("IsFirewallEnabled", "SELECT value FROM setting WHERE key = 'firewall.enabled'");
 }
 
 bool SystemInfoImpl::GetFirewallDefaultAction() {
-  return ReadState("GetFirewallDefaultAction", "SELECT default_pass FROM fw_state WHERE id = 1");
+  return ReadState("GetFirewallDefaultAction",
+                   "SELECT value FROM setting WHERE key = 'firewall.defaultPass'");
 }
 
 bool SystemInfoImpl::AreFirewallFiltersActive() {
-  return ReadState("AreFirewallFiltersActive", "SELECT filters_active FROM fw_state WHERE id = 1");
+  return ReadState("AreFirewallFiltersActive",
+                   "SELECT value FROM setting WHERE key = 'firewall.filtersActive'");
 }
 
 void SystemInfoImpl::SetFirewallEnabled(bool enabled) {
-  WriteState("SetFirewallEnabled", "UPDATE fw_state SET enabled = ? WHERE id = 1", enabled);
+  WriteState("SetFirewallEnabled", "UPDATE setting SET value = ? WHERE key = 'firewall.enabled'",
+             enabled);
 }
 
 void SystemInfoImpl::SetFirewallDefaultAction(bool pass) {
-  WriteState("SetFirewallDefaultAction", "UPDATE fw_state SET default_pass = ? WHERE id = 1", pass);
+  WriteState("SetFirewallDefaultAction",
+             "UPDATE setting SET value = ? WHERE key = 'firewall.defaultPass'", pass);
 }
 
 void SystemInfoImpl::LoadFirewallRulesets() {
@@ -79,13 +84,13 @@ void SystemInfoImpl::LoadFirewallRulesets() {
   store.CheckFault("LoadFirewallRulesets", FirewallModuleName);
   store.Write([&] {
     if (Model::IsFirewallModuleLoaded(store))
-      store.Prepare("UPDATE fw_state SET filters_active = 1 WHERE id = 1").Run();
+      store.Prepare("UPDATE setting SET value = 1 WHERE key = 'firewall.filtersActive'").Run();
   });
 }
 
 void SystemInfoImpl::DestroyFirewallFilters() {
-  WriteState("DestroyFirewallFilters", "UPDATE fw_state SET filters_active = ? WHERE id = 1",
-             false);
+  WriteState("DestroyFirewallFilters",
+             "UPDATE setting SET value = ? WHERE key = 'firewall.filtersActive'", false);
 }
 
 std::vector<std::unique_ptr<FirewallRuleset>> SystemInfoImpl::GetFirewallRulesets() {
@@ -94,8 +99,9 @@ std::vector<std::unique_ptr<FirewallRuleset>> SystemInfoImpl::GetFirewallRuleset
   std::vector<std::unique_ptr<FirewallRuleset>> sets;
   store.Read([&] {
     Statement rows = store.Prepare("SELECT id FROM fw_ruleset ORDER BY ord");
+    enum { kId };
     while (rows.Step())
-      sets.push_back(std::make_unique<FirewallRulesetImpl>(rows.Text(0)));
+      sets.push_back(std::make_unique<FirewallRulesetImpl>(rows.Text(kId)));
   });
   return sets;
 }

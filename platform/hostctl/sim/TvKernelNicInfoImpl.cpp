@@ -21,19 +21,29 @@ namespace {
 
 /// Columns read for each listed interface, in the order ReadRow expects.
 #define TVKNIC_COLUMNS                                                                             \
-  "t.name, t.netstack, t.mac, t.mtu, coalesce(e.tso_mss, 65535), coalesce(e.rx_queues, 1), "       \
-  "t.enabled, coalesce(t.port_id, 0) FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name "
+  "t.name, t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "                                     \
+  "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
+enum TvknicColumn {
+  kNicName,
+  kNicNetstack,
+  kNicMac,
+  kNicMtu,
+  kNicTsoMss,
+  kNicRxQueues,
+  kNicEnabled,
+  kNicPortId
+};
 
 std::unique_ptr<TvkNic> ReadRow(const Statement& row) {
   TvkNicData data;
-  data.name = row.Text(0);
-  data.netstack = row.Text(1);
-  data.mac = row.Text(2);
-  data.mtu = static_cast<uint32_t>(row.Int(3));
-  data.tsoMss = static_cast<uint32_t>(row.Int(4));
-  data.rxQueues = static_cast<uint32_t>(row.Int(5));
-  data.enabled = row.Bool(6);
-  data.portId = row.Int(7);
+  data.name = row.Text(kNicName);
+  data.netstack = row.Text(kNicNetstack);
+  data.mac = row.Text(kNicMac);
+  data.mtu = static_cast<uint32_t>(row.Int(kNicMtu));
+  data.tsoMss = static_cast<uint32_t>(row.Int(kNicTsoMss));
+  data.rxQueues = static_cast<uint32_t>(row.Int(kNicRxQueues));
+  data.enabled = row.Bool(kNicEnabled);
+  data.portId = row.Int(kNicPortId);
   return std::make_unique<TvkNicImpl>(std::move(data));
 }
 
@@ -108,9 +118,10 @@ void TvKernelNicInfoImpl::GetTvkernelNicNamesByInstanceKey(std::vector<std::stri
   store.Read([&] {
     Statement rows = store.Prepare(
         "SELECT name FROM tvknic WHERE netstack = ? AND system = ? ORDER BY ord, name");
+    enum { kName };
     rows.BindAll(netstack, selector == 1);
     while (rows.Step())
-      names.push_back(rows.Text(0));
+      names.push_back(rows.Text(kName));
   });
 }
 

@@ -93,23 +93,25 @@ Ip::Attachment Resolve(Store& store, const PointRequest& request) {
   if (request.kind == ConnectionPoint::CONNECTION_PORTGROUP) {
     Statement row = store.Prepare("SELECT pg.id, s.id, s.name, s.mtu FROM portgroup pg JOIN "
                                   "portset s ON s.id = pg.portset_id WHERE pg.name = ?");
+    enum { kPortgroupId, kPortsetId, kPortsetName, kMtu };
     row.Bind(1, request.portgroupName);
     if (!row.Step())
       throw HostCtlException("Port group " + request.portgroupName + " does not exist");
-    a.portgroupId = row.Int(0);
-    a.portsetId = row.Int(1);
-    a.portsetName = row.Text(2);
-    a.portsetMtu = row.Int(3);
+    a.portgroupId = row.Int(kPortgroupId);
+    a.portsetId = row.Int(kPortsetId);
+    a.portsetName = row.Text(kPortsetName);
+    a.portsetMtu = row.Int(kMtu);
     a.portgroupName = request.portgroupName;
     return a;
   }
   const char* kind = request.kind == ConnectionPoint::CONNECTION_DVPORT ? "dvs" : "opaque";
   Statement row = store.Prepare("SELECT id, mtu FROM portset WHERE name = ? AND kind = ?");
+  enum { kId, kMtu };
   row.BindAll(request.portsetName, kind);
   if (request.portsetName.empty() || !row.Step())
     throw HostCtlException("The switch of the connection point does not exist");
-  a.portsetId = row.Int(0);
-  a.portsetMtu = row.Int(1);
+  a.portsetId = row.Int(kId);
+  a.portsetMtu = row.Int(kMtu);
   a.portsetName = request.portsetName;
   if (request.kind == ConnectionPoint::CONNECTION_DVPORT) {
     a.dvportKey = request.dvport.portId;
@@ -129,8 +131,9 @@ Ip::Attachment Resolve(Store& store, const PointRequest& request) {
 std::string FreeName(Store& store) {
   std::vector<bool> used(256, false);
   Statement rows = store.Prepare("SELECT name FROM tvknic");
+  enum { kName };
   while (rows.Step()) {
-    int number = Ip::TvkNicNumber(rows.Text(0));
+    int number = Ip::TvkNicNumber(rows.Text(kName));
     if (number >= 0)
       used[static_cast<std::size_t>(number)] = true;
   }
@@ -152,9 +155,10 @@ std::unique_ptr<ConnectionPoint> TvkNicImpl::GetConnectionPoint() {
     std::string uuid;
     if (a.kind == 2) {
       Statement row = store.Prepare("SELECT uuid FROM dvswitch WHERE portset_id = ?");
+      enum { kUuid };
       row.Bind(1, a.portsetId);
       if (row.Step())
-        uuid = row.Text(0);
+        uuid = row.Text(kUuid);
     }
     return std::make_unique<TvkNicPointImpl>(std::move(a), std::move(uuid));
   });
@@ -182,10 +186,11 @@ TvKernelNicInfoImpl::AddTvKernelNic(ConnectionPoint* point, const std::string& n
     throw HostCtlException("MAC address " + mac.GetStringAddress() + " is not a unicast address");
   std::string chosen = store.Write([&] {
     Statement stack = store.Prepare("SELECT state FROM netstack WHERE key = ?");
+    enum { kState };
     stack.Bind(1, netstack);
     if (!stack.Step())
       throw HostCtlException("Netstack instance " + netstack + " does not exist");
-    if (stack.Int(0) != HostCtl::Network::NetstackInstance::STATE_ENABLED)
+    if (stack.Int(kState) != HostCtl::Network::NetstackInstance::STATE_ENABLED)
       throw HostCtlException("Netstack instance " + netstack +
                              " is not created in the kernel; enable it first");
     std::string nicName = name.empty() ? FreeName(store) : name;
@@ -207,15 +212,16 @@ TvKernelNicInfoImpl::AddTvKernelNic(ConnectionPoint* point, const std::string& n
         throw HostCtlException("MAC address " + macText +
                                " is already used by another interface or NIC");
     }
-    Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 FROM tvknic");
+    Statement ord = store.Prepare("SELECT coalesce(max(ord), -1) + 1 AS next_ord FROM tvknic");
+    enum { kNextOrd };
     ord.Step();
     store.Prepare("INSERT INTO tvknic(name, ord, netstack, mac, mtu) VALUES(?, ?, ?, ?, ?)")
-        .BindAll(nicName, ord.Int(0), netstack, macText, nicMtu)
+        .BindAll(nicName, ord.Int(kNextOrd), netstack, macText, nicMtu)
         .Run();
     store
-        .Prepare("INSERT INTO tvknic_ext(name, rx_queues, opaque_id, opaque_type, external_id) "
-                 "VALUES(?, ?, ?, ?, ?)")
-        .BindAll(nicName, rxQueues != 0 ? rxQueues : 1u, a.opaqueId, a.opaqueType, a.externalId)
+        .Prepare("UPDATE tvknic SET rx_queues = ?, opaque_id = ?, opaque_type = ?, external_id = ? "
+                 "WHERE name = ?")
+        .BindAll(rxQueues != 0 ? rxQueues : 1u, a.opaqueId, a.opaqueType, a.externalId, nicName)
         .Run();
     int64_t portId = Ip::AttachPort(store, nicName, a, std::nullopt);
     store.Prepare("UPDATE tvknic SET port_id = ? WHERE name = ?").BindAll(portId, nicName).Run();
@@ -235,14 +241,15 @@ void TvKernelNicInfoImpl::RemoveTvKernelNic(ConnectionPoint* point, const std::s
         "SELECT t.name, t.netstack FROM tvknic t JOIN port p ON p.id = t.port_id WHERE "
         "p.portset_id = ? AND ((?2 > 0 AND p.portgroup_id = ?2) OR (?3 <> '' AND p.dvport_key = "
         "?3) OR (?4 = 3 AND p.portgroup_id IS NULL AND p.dvport_key IS NULL))");
+    enum { kName, kNetstack };
     row.BindAll(a.portsetId, a.portgroupId, a.dvportKey, a.kind);
     std::string where = a.kind == 1   ? "port group " + a.portgroupName
                         : a.kind == 2 ? "DVPort " + a.dvportKey + " of " + a.portsetName
                                       : "opaque switch " + a.portsetName;
     while (row.Step()) {
-      if (row.Text(1) != netstack)
+      if (row.Text(kNetstack) != netstack)
         continue;
-      Ip::DeleteInterface(store, row.Text(0));
+      Ip::DeleteInterface(store, row.Text(kName));
       return;
     }
     throw HostCtlException("No Tarvik network interface of netstack " + netstack + " is on " +

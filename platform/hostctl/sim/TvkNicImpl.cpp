@@ -31,66 +31,79 @@ using Model::Store;
 
 /// Reads the attributes of interface \p name; false when there is none.
 bool LoadTvkNicData(Store& store, const std::string& name, TvkNicData& data) {
-  Statement row = store.Prepare(
-      "SELECT t.netstack, t.mac, t.mtu, coalesce(e.tso_mss, 65535), coalesce(e.rx_queues, 1), "
-      "t.enabled, coalesce(t.port_id, 0) FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name "
-      "WHERE t.name = ?");
+  Statement row = store.Prepare("SELECT t.netstack, t.mac, t.mtu, t.tso_mss, t.rx_queues, "
+                                "t.enabled, coalesce(t.port_id, 0) FROM tvknic t "
+                                "WHERE t.name = ?");
+  enum { kNetstack, kMac, kMtu, kTsoMss, kRxQueues, kEnabled, kPortId };
   row.Bind(1, name);
   if (!row.Step())
     return false;
   data.name = name;
-  data.netstack = row.Text(0);
-  data.mac = row.Text(1);
-  data.mtu = static_cast<uint32_t>(row.Int(2));
-  data.tsoMss = static_cast<uint32_t>(row.Int(3));
-  data.rxQueues = static_cast<uint32_t>(row.Int(4));
-  data.enabled = row.Bool(5);
-  data.portId = row.Int(6);
+  data.netstack = row.Text(kNetstack);
+  data.mac = row.Text(kMac);
+  data.mtu = static_cast<uint32_t>(row.Int(kMtu));
+  data.tsoMss = static_cast<uint32_t>(row.Int(kTsoMss));
+  data.rxQueues = static_cast<uint32_t>(row.Int(kRxQueues));
+  data.enabled = row.Bool(kEnabled);
+  data.portId = row.Int(kPortId);
   return true;
 }
 
 /// The running (\p running true) or configured IP configuration of \p name.
 IpConfig ReadIpConfig(Store& store, const std::string& name, bool running) {
-  Statement row = store.Prepare(
-      "SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
-      "coalesce(e.dhcp_dns, 0), coalesce(e.ipv6_enabled, 1), coalesce(e.ipv6_dhcp, 0), "
-      "coalesce(e.ipv6_ra, 0), coalesce(e.ipv6_dhcp_dns, 0), coalesce(e.ipv6_gateway, '::') "
-      "FROM tvknic t LEFT JOIN tvknic_ext e ON e.name = t.name WHERE t.name = ?");
+  Statement row =
+      store.Prepare("SELECT t.ipv4_mode, t.ipv4_address, t.ipv4_netmask, t.ipv4_gateway, "
+                    "t.dhcp_dns, t.ipv6_enabled, t.ipv6_dhcp, "
+                    "t.ipv6_ra, t.ipv6_dhcp_dns, t.ipv6_gateway "
+                    "FROM tvknic t WHERE t.name = ?");
+  enum {
+    kIpv4Mode,
+    kIpv4Address,
+    kIpv4Netmask,
+    kIpv4Gateway,
+    kDhcpDns,
+    kIpv6Enabled,
+    kIpv6Dhcp,
+    kIpv6Ra,
+    kIpv6DhcpDns,
+    kIpv6Gateway
+  };
   row.Bind(1, name);
   if (!row.Step())
     throw HostCtlException("Tarvik network interface " + name + " does not exist");
   IpConfig config;
-  std::string mode = row.Text(0);
+  std::string mode = row.Text(kIpv4Mode);
   if (mode == "dhcp") {
     // The running configuration holds the lease; the configured one asks for
     // DHCP only.
     if (running) {
-      config.SetIpv4Address(Ipv4Address(row.Text(1)));
-      config.SetIpv4Netmask(Ipv4Address(row.Text(2)));
-      config.SetIpv4Gateway(Ipv4Address(row.Text(3)));
+      config.SetIpv4Address(Ipv4Address(row.Text(kIpv4Address)));
+      config.SetIpv4Netmask(Ipv4Address(row.Text(kIpv4Netmask)));
+      config.SetIpv4Gateway(Ipv4Address(row.Text(kIpv4Gateway)));
     }
     config.SetUseDhcp(true);
   } else if (mode == "static") {
-    config.SetIpv4Address(Ipv4Address(row.Text(1)));
-    config.SetIpv4Netmask(Ipv4Address(row.Text(2)));
-    config.SetIpv4Gateway(Ipv4Address(row.Text(3)));
+    config.SetIpv4Address(Ipv4Address(row.Text(kIpv4Address)));
+    config.SetIpv4Netmask(Ipv4Address(row.Text(kIpv4Netmask)));
+    config.SetIpv4Gateway(Ipv4Address(row.Text(kIpv4Gateway)));
   } else {
     config.SetIpv4UseNone();
   }
-  config.SetDhcpDns(row.Bool(4));
-  config.SetUseIpv6(row.Bool(5));
-  config.SetUseIpv6Dhcp(row.Bool(6));
-  config.SetUseIpv6RouterAdvertised(row.Bool(7));
-  config.SetIpv6DhcpDns(row.Bool(8));
-  config.SetIpv6Gateway(Ipv6Address(row.Text(9)));
+  config.SetDhcpDns(row.Bool(kDhcpDns));
+  config.SetUseIpv6(row.Bool(kIpv6Enabled));
+  config.SetUseIpv6Dhcp(row.Bool(kIpv6Dhcp));
+  config.SetUseIpv6RouterAdvertised(row.Bool(kIpv6Ra));
+  config.SetIpv6DhcpDns(row.Bool(kIpv6DhcpDns));
+  config.SetIpv6Gateway(Ipv6Address(row.Text(kIpv6Gateway)));
   std::vector<Ipv6Network> networks;
   Statement v6 = store.Prepare(
       "SELECT address, prefix, type, status FROM tvknic_ipv6 WHERE nic = ? ORDER BY ord");
+  enum { kAddress, kPrefix, kType, kStatus };
   v6.Bind(1, name);
   while (v6.Step()) {
-    Ipv6Network network(Ipv6Address(v6.Text(0)), static_cast<int>(v6.Int(1)));
-    network.SetIpv6AddressType(static_cast<int>(v6.Int(2)));
-    network.SetIpv6AddressStatus(static_cast<int>(v6.Int(3)));
+    Ipv6Network network(Ipv6Address(v6.Text(kAddress)), static_cast<int>(v6.Int(kPrefix)));
+    network.SetIpv6AddressType(static_cast<int>(v6.Int(kType)));
+    network.SetIpv6AddressStatus(static_cast<int>(v6.Int(kStatus)));
     networks.push_back(network);
   }
   config.SetIpv6Networks(std::move(networks));
@@ -100,11 +113,12 @@ IpConfig ReadIpConfig(Store& store, const std::string& name, bool running) {
 /// Applies \p config to interface \p name (inside a write transaction).
 void WriteIpConfig(Store& store, const std::string& name, const IpConfig& config) {
   Statement nic = store.Prepare("SELECT mac, netstack FROM tvknic WHERE name = ?");
+  enum { kMac, kNetstack };
   nic.Bind(1, name);
   if (!nic.Step())
     throw HostCtlException("Tarvik network interface " + name + " does not exist");
-  std::string mac = nic.Text(0);
-  std::string netstack = nic.Text(1);
+  std::string mac = nic.Text(kMac);
+  std::string netstack = nic.Text(kNetstack);
   uint32_t address = 0, netmask = 0, gateway = 0;
   const char* mode = "none";
   if (config.GetUseDhcp()) {
@@ -127,10 +141,11 @@ void WriteIpConfig(Store& store, const std::string& name, const IpConfig& config
   if (address != 0) {
     Statement clash = store.Prepare("SELECT name FROM tvknic WHERE netstack = ? AND name <> ? "
                                     "AND ipv4_mode <> 'none' AND ipv4_address = ?");
+    enum { kName };
     clash.BindAll(netstack, name, Ipv4Address(address).GetStringAddress());
     if (clash.Step())
       throw HostCtlException("IPv4 address " + Ipv4Address(address).GetStringAddress() +
-                             " is already used by Tarvik network interface " + clash.Text(0));
+                             " is already used by Tarvik network interface " + clash.Text(kName));
   }
   const Ipv6Address& v6Gateway = config.GetIpv6Gateway();
   if (v6Gateway.GetBytes()[0] == 0xff)
@@ -143,9 +158,8 @@ void WriteIpConfig(Store& store, const std::string& name, const IpConfig& config
                Ipv4Address(netmask).GetStringAddress(), Ipv4Address(gateway).GetStringAddress(),
                name)
       .Run();
-  store.Prepare("INSERT OR IGNORE INTO tvknic_ext(name) VALUES(?)").Bind(1, name).Run();
   store
-      .Prepare("UPDATE tvknic_ext SET dhcp_dns = ?, ipv6_enabled = ?, ipv6_dhcp = ?, ipv6_ra = ?, "
+      .Prepare("UPDATE tvknic SET dhcp_dns = ?, ipv6_enabled = ?, ipv6_dhcp = ?, ipv6_ra = ?, "
                "ipv6_dhcp_dns = ?, ipv6_gateway = ? WHERE name = ?")
       .BindAll(config.GetDhcpDns(), config.GetUseIpv6(), config.GetUseIpv6Dhcp(),
                config.GetUseIpv6RouterAdvertised(), config.GetIpv6DhcpDns(),
@@ -361,9 +375,10 @@ void TvkNicImpl::GetTags(std::vector<TvkNicTagType>& tags) {
   store.Read([&] {
     RequireTvkNic(store, data_.name);
     Statement rows = store.Prepare("SELECT tag FROM tvknic_tag WHERE nic = ? ORDER BY ord");
+    enum { kTag };
     rows.Bind(1, data_.name);
     while (rows.Step())
-      tags.push_back(static_cast<TvkNicTagType>(rows.Int(0)));
+      tags.push_back(static_cast<TvkNicTagType>(rows.Int(kTag)));
   });
 }
 
@@ -374,10 +389,11 @@ std::vector<HostCtl::Network::MulticastGroup> TvkNicImpl::GetMulticastGroups() {
   store.Read([&] {
     Statement rows = store.Prepare(
         "SELECT grp, link_layer, refcount FROM tvknic_mcast WHERE nic = ? ORDER BY ord");
+    enum { kGrp, kLinkLayer, kRefcount };
     rows.Bind(1, data_.name);
     while (rows.Step())
-      groups.push_back(
-          {data_.name, rows.Text(0), rows.Text(1), static_cast<uint32_t>(rows.Int(2))});
+      groups.push_back({data_.name, rows.Text(kGrp), rows.Text(kLinkLayer),
+                        static_cast<uint32_t>(rows.Int(kRefcount))});
   });
   return groups;
 }

@@ -23,28 +23,33 @@ using Model::Store;
 
 namespace {
 
+/// The one column that \p sql selects of switch \p id, as text.
 std::string ReadColumn(Store& store, int64_t id, const char* sql) {
   Statement row = store.Prepare(sql);
+  enum { kValue };
   row.Bind(1, id);
   if (!row.Step())
     throw HostCtlException("The virtual switch no longer exists");
-  return row.Text(0);
+  return row.Text(kValue);
 }
 
+/// The one column that \p sql selects of switch \p id, as a number.
 int64_t ReadInt(Store& store, int64_t id, const char* sql) {
   Statement row = store.Prepare(sql);
+  enum { kValue };
   row.Bind(1, id);
   if (!row.Step())
     throw HostCtlException("The virtual switch no longer exists");
-  return row.Int(0);
+  return row.Int(kValue);
 }
 
 std::vector<std::string> Uplinks(Store& store, int64_t id) {
   std::vector<std::string> names;
   Statement rows = store.Prepare("SELECT nic FROM uplink WHERE portset_id = ? ORDER BY ord");
+  enum { kNic };
   rows.Bind(1, id);
   while (rows.Step())
-    names.push_back(rows.Text(0));
+    names.push_back(rows.Text(kNic));
   return names;
 }
 
@@ -193,10 +198,11 @@ std::vector<std::string> VirtualSwitchImpl::GetBeaconRequiredBy() const {
     Statement rows = store.Prepare(
         "SELECT g.name, p.teaming FROM portgroup g JOIN portgroup_policy p ON p.portgroup_id = "
         "g.id WHERE g.portset_id = ? ORDER BY g.ord");
+    enum { kName, kTeaming };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      if (Model::ParseTeaming(rows.Text(1)).MergedOver(own).GetLinkCriteria().IsBeacon())
-        names.push_back(rows.Text(0));
+      if (Model::ParseTeaming(rows.Text(kTeaming)).MergedOver(own).GetLinkCriteria().IsBeacon())
+        names.push_back(rows.Text(kName));
     return names;
   });
 }
@@ -229,9 +235,10 @@ std::vector<std::unique_ptr<PortGroup>> VirtualSwitchImpl::GetPortGroups() const
   return store.Read([&] {
     std::vector<std::unique_ptr<PortGroup>> groups;
     Statement rows = store.Prepare("SELECT name FROM portgroup WHERE portset_id = ? ORDER BY ord");
+    enum { kName };
     rows.Bind(1, data_.id);
     while (rows.Step())
-      groups.push_back(std::make_unique<PortGroupImpl>(rows.Text(0)));
+      groups.push_back(std::make_unique<PortGroupImpl>(rows.Text(kName)));
     return groups;
   });
 }
@@ -248,16 +255,18 @@ void VirtualSwitchImpl::AddUplink(const std::string& name, bool /*teamAdd*/) {
                              ": the host has no physical NIC of that name");
     Statement owner = store.Prepare(
         "SELECT p.name FROM uplink u JOIN portset p ON p.id = u.portset_id WHERE u.nic = ?");
+    enum { kName };
     owner.Bind(1, name);
     if (owner.Step())
       throw HostCtlException("Unable to add uplink " + name + " to " + data_.name +
-                             ": it is already an uplink of " + owner.Text(0));
+                             ": it is already an uplink of " + owner.Text(kName));
     Statement ports = store.Prepare(
-        "SELECT (SELECT count(*) FROM port WHERE portset_id = ?1), num_ports FROM portset "
-        "WHERE id = ?1");
+        "SELECT (SELECT count(*) FROM port WHERE portset_id = ?1) AS used, num_ports FROM "
+        "portset WHERE id = ?1");
+    enum { kUsed, kNumPorts };
     ports.Bind(1, data_.id);
     ports.Step();
-    if (ports.Int(0) >= ports.Int(1))
+    if (ports.Int(kUsed) >= ports.Int(kNumPorts))
       throw HostCtlException("Unable to add uplink " + name + " to " + data_.name +
                              ": all of its ports are in use");
     store
@@ -296,11 +305,12 @@ void VirtualSwitchImpl::RemoveUplink(const std::string& name, bool /*force*/) {
     Statement rows = store.Prepare(
         "SELECT g.id, p.teaming FROM portgroup g JOIN portgroup_policy p ON p.portgroup_id = "
         "g.id WHERE g.portset_id = ?");
+    enum { kId, kTeaming };
     rows.Bind(1, data_.id);
     while (rows.Step()) {
-      NicTeamingPolicy policy = Model::ParseTeaming(rows.Text(1));
+      NicTeamingPolicy policy = Model::ParseTeaming(rows.Text(kTeaming));
       if (DropFromOrder(policy, name))
-        changed.emplace_back(rows.Int(0), std::move(policy));
+        changed.emplace_back(rows.Int(kId), std::move(policy));
     }
     for (const auto& [id, policy] : changed)
       store.Prepare("UPDATE portgroup_policy SET teaming = ? WHERE portgroup_id = ?")
@@ -322,10 +332,11 @@ std::unique_ptr<PortGroup> VirtualSwitchImpl::AddPortGroup(const std::string& na
     RequirePortset(store, data_);
     Statement owner = store.Prepare(
         "SELECT p.name FROM portgroup g JOIN portset p ON p.id = g.portset_id WHERE g.name = ?");
+    enum { kName };
     owner.Bind(1, name);
     if (owner.Step())
       throw HostCtlException("Unable to add port group " + name + " to " + data_.name +
-                             ": a port group of that name already exists on " + owner.Text(0));
+                             ": a port group of that name already exists on " + owner.Text(kName));
     store
         .Prepare("INSERT INTO portgroup(name, portset_id, vlan_id, system, ord) VALUES(?1, ?2, 0, "
                  "0, (SELECT coalesce(max(ord), -1) + 1 FROM portgroup))")
@@ -344,14 +355,15 @@ void VirtualSwitchImpl::RemovePortGroup(const std::string& name) {
   store.Write([&] {
     RequirePortset(store, data_);
     Statement row = store.Prepare(
-        "SELECT id, (SELECT count(*) FROM port WHERE portgroup_id = portgroup.id) FROM portgroup "
-        "WHERE name = ? AND portset_id = ?");
+        "SELECT id, (SELECT count(*) FROM port WHERE portgroup_id = portgroup.id) AS clients "
+        "FROM portgroup WHERE name = ? AND portset_id = ?");
+    enum { kId, kClients };
     row.BindAll(name, data_.id);
     if (!row.Step())
       throw HostCtlException("Unable to remove port group " + name + ": " + data_.name +
                              " has no port group of that name");
-    int64_t id = row.Int(0);
-    int64_t clients = row.Int(1);
+    int64_t id = row.Int(kId);
+    int64_t clients = row.Int(kClients);
     if (clients > 0)
       throw HostCtlException("Unable to remove port group " + name + ": it is in use by " +
                              std::to_string(clients) + (clients == 1 ? " client" : " clients"));
@@ -463,9 +475,11 @@ std::unique_ptr<VirtualSwitch> VirtualSwitchInfoImpl::AddVirtualSwitchWithPolicy
       throw HostCtlException("Unable to add virtual switch " + name +
                              ": a virtual switch of that name already exists");
     Statement used =
-        store.Prepare("SELECT coalesce(sum(num_ports), 0) FROM portset WHERE kind = 'standard'");
+        store.Prepare("SELECT coalesce(sum(num_ports), 0) AS ports FROM portset WHERE kind = "
+                      "'standard'");
+    enum { kPorts };
     used.Step();
-    int64_t allocated = used.Int(0);
+    int64_t allocated = used.Int(kPorts);
     if (allocated + ports > VirtualSwitch::MAX_HOST_PORTS)
       throw HostCtlException("Unable to add virtual switch " + name + " with " +
                              std::to_string(ports) + " ports: " + std::to_string(allocated) +
@@ -510,12 +524,13 @@ void VirtualSwitchInfoImpl::RemoveVirtualSwitch(const std::string& name) {
     Statement clients = store.Prepare(
         "SELECT client_kind, client FROM port WHERE portset_id = ? AND client_kind != 'uplink' "
         "ORDER BY client_kind, client");
+    enum { kClientKind, kClient };
     clients.Bind(1, data->id);
     std::string tvknics;
     std::string vms;
     while (clients.Step()) {
-      std::string& list = clients.Text(0) == "tvknic" ? tvknics : vms;
-      list += (list.empty() ? "" : ", ") + clients.Text(1);
+      std::string& list = clients.Text(kClientKind) == "tvknic" ? tvknics : vms;
+      list += (list.empty() ? "" : ", ") + clients.Text(kClient);
     }
     if (!tvknics.empty())
       throw HostCtlException("Unable to remove virtual switch " + name +
