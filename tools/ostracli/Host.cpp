@@ -404,7 +404,9 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     }
     return ExitOk;
   }
-  if (!global.hostPath.empty() && global.hostPath != Chosen().path)
+  // Chosen anew each time: a process that runs several command lines (the
+  // tests do) may have had its session reset in between.
+  if (!global.hostPath.empty())
     SelectHost(global.hostPath, false);
 
   // Resolve the command path: words up to the first option.
