@@ -74,7 +74,6 @@ std::string ResourceInfoImpl::GetWorldName(int64_t worldId) {
 }
 
 WorldImpl::WorldImpl(int64_t worldId) : worldId_(worldId) {}
-WorldImpl::~WorldImpl() = default;
 
 std::string WorldImpl::GetWorldName() const {
   return HostCtl::Backend::Current().GetWorldName(worldId_);

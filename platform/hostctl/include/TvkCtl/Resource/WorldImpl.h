@@ -10,7 +10,7 @@ namespace TvkCtl::Resource {
 class WorldImpl {
 public:
   explicit WorldImpl(int64_t worldId);
-  ~WorldImpl();
+  ~WorldImpl() = default;
 
   int64_t GetWorldId() const { return worldId_; }
   /// The world's name as the host keeps it; throws HostCtlException when the
