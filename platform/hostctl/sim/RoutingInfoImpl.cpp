@@ -7,6 +7,7 @@
 #include "model/IpServicesModel.h"
 #include "model/Store.h"
 
+#include <algorithm>
 #include <optional>
 #include <type_traits>
 
@@ -95,7 +96,38 @@ void RoutingInfoImpl::SetNetstackInstanceKey(const std::string& key) {
 }
 
 void RoutingInfoImpl::Refresh() {
-  sources_.clear();
+  sources_.Clear();
+}
+
+void RouteSources::Clear() {
+  entries_.clear();
+  entries_.shrink_to_fit();
+  names_.clear();
+  numbers_.clear();
+  sorted_ = true;
+}
+
+void RouteSources::Add(uint64_t key, const std::string& source) {
+  auto [name, added] = numbers_.try_emplace(source, static_cast<uint32_t>(names_.size()));
+  if (added)
+    names_.push_back(source);
+  if (!entries_.empty() && key < entries_.back().first)
+    sorted_ = false;
+  entries_.emplace_back(key, name->second);
+}
+
+const std::string* RouteSources::Find(uint64_t key) {
+  if (!sorted_) {
+    // Stable, so that of the routes of one network the first listed counts.
+    std::stable_sort(entries_.begin(), entries_.end(),
+                     [](const auto& a, const auto& b) { return a.first < b.first; });
+    sorted_ = true;
+  }
+  auto found = std::lower_bound(entries_.begin(), entries_.end(), key,
+                                [](const auto& entry, uint64_t k) { return entry.first < k; });
+  if (found == entries_.end() || found->first != key)
+    return nullptr;
+  return &names_[found->second];
 }
 
 uint64_t RoutingInfoImpl::SourceKey(const Ipv4Network& network) {
@@ -109,7 +141,7 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
   Store& store = Store::Host();
   store.CheckFault("GetCurrentTarvikRoutes", netstack_);
   std::vector<Ipv4Route> routes;
-  sources_.clear();
+  sources_.Clear();
   store.Read([&] {
     IpSvc::RequireNetstack(store, netstack_);
     bool system = selector == HostCtl::Network::PortsetGetSystem;
@@ -126,7 +158,7 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
           !Ipv4Address(mask).IsNetmask())
         continue;
       Ipv4Network network(Ipv4Address(address & mask), Ipv4Address(mask));
-      sources_.emplace(SourceKey(network), SOURCE_CONNECTED);
+      sources_.Add(SourceKey(network), SOURCE_CONNECTED);
       routes.emplace_back(network, Ipv4Address(), nics.Text(kName));
     }
     Statement rows = store.Prepare(
@@ -137,7 +169,7 @@ std::vector<Ipv4Route> RoutingInfoImpl::GetCurrentTarvikRoutes(PortsetGetType se
     while (rows.Step()) {
       Ipv4Network network(IpSvc::Ipv4Column(rows, kNetwork),
                           Ipv4Address::FromPrefixLength(static_cast<int>(rows.Int(kPrefix))));
-      sources_.emplace(SourceKey(network), rows.Text(kSource));
+      sources_.Add(SourceKey(network), rows.Text(kSource));
       routes.emplace_back(network, IpSvc::Ipv4Column(rows, kGateway), rows.Text(kInterface));
     }
   });
@@ -231,9 +263,8 @@ void RoutingInfoImpl::SetTvKernelDefaultGateway(const Ipv4Address& gateway, bool
 std::string RoutingInfoImpl::GetDefaultGatewaySource(const Ipv4Network& network) {
   Store& store = Store::Host();
   store.CheckFault("GetDefaultGatewaySource", netstack_);
-  auto known = sources_.find(SourceKey(network));
-  if (known != sources_.end())
-    return known->second;
+  if (const std::string* known = sources_.Find(SourceKey(network)))
+    return *known;
   return store.Read([&] {
     Statement row = store.Prepare(
         "SELECT source FROM ipsvc_route WHERE netstack = ? AND family = 4 AND network = ? AND "
