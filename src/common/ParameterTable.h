@@ -8,7 +8,7 @@
 //
 // The rows are literal values: a family keeps its tables as constants at file
 // level without running code when the plug-in loads. The texts are referred
-// to, not copied, until the specification is built: a row may name a
+// to, not copied, until MakeInputSpec builds the parameters: a row may name a
 // file-level std::string constant, a literal, or a string that lives until
 // MakeInputSpec returns.
 //
@@ -26,7 +26,7 @@
 namespace CorvexCli::NetworkNamespace {
 
 /// A text a table row refers to: a literal or a std::string constant. The
-/// string is read when the specification is built, so a row may name a
+/// string is read when MakeInputSpec builds the parameters, so a row may name a
 /// constant of another file whatever the order in which files initialize.
 class TextRef {
 public:

@@ -1,7 +1,7 @@
 //===- TableTest.cpp - Parameters and result fields declared as tables -----===//
 //
 // A table row becomes a parameter whose check accepts and refuses what the
-// row says, and whose texts are read when the specification is built, so a
+// row says, and whose texts are read when the parameters are built, so a
 // row may name a string constant that is set after the row was made. A field
 // table becomes a structure of unset fields of the declared kinds, in order.
 //
