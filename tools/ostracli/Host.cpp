@@ -404,8 +404,8 @@ int RunOne(const CommandTree& tree, const std::vector<std::string>& args, std::s
     }
     return ExitOk;
   }
-  // Chosen anew each time: a process that runs several command lines (the
-  // tests do) may have had its session reset in between.
+  // Handed to the session each time (it keeps the host it serves already): a
+  // process that runs several command lines may have reset it in between.
   if (!global.hostPath.empty())
     SelectHost(global.hostPath, false);
 

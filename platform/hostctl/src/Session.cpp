@@ -161,8 +161,14 @@ bool IsSimulatedHost(const std::string& spec) {
 
 void SetHost(const std::string& spec, bool createDemo) {
   State& state = TheState();
-  if ((state.backend || !state.failure.empty()) && state.spec == spec)
-    return;
+  if (state.spec == spec) {
+    // The host in use stays as it is (a batch in progress goes on); one that
+    // was refused is refused again, with the same line.
+    if (!state.failure.empty())
+      throw Lib::HostCtlException(state.failure);
+    if (state.backend)
+      return;
+  }
   state.backend.reset();
   state.spec = spec;
   std::unique_ptr<Backend::Backend> backend;

@@ -38,8 +38,9 @@ std::string DefaultHostPath();
 /// With \p createDemo (the default host), a missing database is created from
 /// the demo profile when it is first used; any other path must exist.
 /// Choosing the host in use again changes nothing (a batch in progress goes
-/// on). Throws HostCtl::Lib::HostCtlException, with one line for the user,
-/// when no backend serves \p spec (the Linux host's module is not installed).
+/// on), and choosing a refused host again refuses it again. Throws HostCtl::Lib::HostCtlException,
+/// with one line for the user, when no backend serves \p spec (the Linux host's module is not
+/// installed).
 void SetHost(const std::string& spec, bool createDemo = false);
 
 /// Whether \p spec names a simulated host's database (not the kernel).
